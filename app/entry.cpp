@@ -1,0 +1,86 @@
+#include "app/entry.h"
+
+#include <memory>
+
+#include "app/single_instance.h"
+#include "app/updater.h"
+#include "app/updater_arguments.h"
+#include "patch/exception.h"
+#include "text/localization.h"
+#include "text/log.h"
+#include "ui/message_box.h"
+
+const char* const kLogFileName = "IronvaleUpdater.log";
+
+namespace {
+
+void ShowBox(const std::wstring& text, MessageIcon icon) {
+    MessageBoxRequest request;
+    request.text = text;
+    request.caption = GetWindowTitle();
+    request.icon = icon;
+    ShowMessageBox(request);
+}
+
+void ReportEscapedException(const Exception& error) {
+    std::wstring text;
+    switch (error.Code()) {
+        case ErrorCode::CorruptData:
+            LOG_AS("Main", Error) << "Corrupt data.";
+            text = Localize("INSTALLER_ERROR_CORRUPT_DATA") + L"\n\n" + Localize("INSTALLER_ERROR_REINSTALL");
+            break;
+        case ErrorCode::CorruptInstallation:
+            LOG_AS("Main", Error) << "Corrupt installation.";
+            text = Localize("INSTALLER_GAME_IS_NOT_INSTALLED");
+            break;
+        case ErrorCode::SteamIncompatible:
+            LOG_AS("Main", Error) << "Incompatible with Steam version.";
+            text = Localize("INSTALLER_INCOMPATIBLE_WITH_STEAM");
+            break;
+        default:
+            LOG_AS("Main", Error) << "Unknown exception type caught:" << error.message;
+            text = Localize("INSTALLER_ERROR_OCCURRED") + L"\n" + error.wideMessage;
+            break;
+    }
+    ShowBox(text, MessageIcon::Error);
+}
+
+}  // namespace
+
+int32_t RunUpdaterProcess(const std::string& commandLine) {
+    Localization::Initialize();
+    try {
+        Log::Open(kLogFileName);
+    } catch (const Exception&) {
+        // No temporary folder: the run goes on without a log.
+    }
+    LOG_AS("Main", Info) << "";
+    LOG_AS("Main", Info) << std::string(103, '-');
+    LOG_AS("Main", Info) << "WinMain Enter";
+    LOG_AS("Main", Info) << "Command line: " << commandLine;
+
+    auto arguments = std::make_unique<UpdaterArguments>();
+    arguments->Parse(commandLine);
+    // The stored language is selected here once the registry access exists.
+    LOG_AS("Main", Info) << arguments->Describe();
+
+    SingleInstance instance;
+    if (!arguments->internallyElevated && !instance.Acquire()) {
+        LOG_AS("Main", Error) << "There is already another updater instance running.";
+        ShowBox(Localize("INSTALLER_INSTANCE_RUNNING"), MessageIcon::Warning);
+        return -1;
+    }
+
+    int32_t exitCode = -1;
+    {
+        auto updater = std::make_unique<Updater>();
+        try {
+            exitCode = updater->Run(*arguments);
+        } catch (const Exception& error) {
+            ReportEscapedException(error);
+        }
+        instance.Release();
+        Log::Close();
+    }
+    return exitCode;
+}

@@ -1,0 +1,7 @@
+#include <windows.h>
+
+#include "app/entry.h"
+
+int WINAPI WinMain(HINSTANCE, HINSTANCE, LPSTR commandLine, int) {
+    return RunUpdaterProcess(commandLine != nullptr ? commandLine : "");
+}

@@ -1,0 +1,23 @@
+#include "app/single_instance.h"
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <unistd.h>
+
+#include "patch/paths.h"
+
+const char* const kInstanceName = "IronvaleUpdater";
+
+bool SingleInstance::Acquire() {
+    const std::string path = PathJoin(GetTempDirectory(), std::string(kInstanceName) + ".lock");
+    const int fd = ::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0644);
+    if (fd < 0) return false;
+    handle = fd;
+    return flock(fd, LOCK_EX | LOCK_NB) == 0;
+}
+
+void SingleInstance::Release() {
+    if (handle == -1) return;
+    ::close(static_cast<int>(handle));
+    handle = -1;
+}

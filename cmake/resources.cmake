@@ -1,0 +1,47 @@
+# The program's resources. The string table is built from the translators'
+# UTF-8 file into the UTF-16 bytes the program reads; Windows gets a real
+# .rc, POSIX the same bytes compiled in.
+
+set(IRONVALE_STRING_TABLE "${CMAKE_CURRENT_BINARY_DIR}/resources/strings.csv")
+add_custom_command(
+  OUTPUT "${IRONVALE_STRING_TABLE}"
+  COMMAND ${CMAKE_COMMAND} -E make_directory "${CMAKE_CURRENT_BINARY_DIR}/resources"
+  COMMAND Python3::Interpreter "${PROJECT_SOURCE_DIR}/cmake/make_string_table.py"
+          "${PROJECT_SOURCE_DIR}/resources/strings.tsv" "${IRONVALE_STRING_TABLE}"
+  DEPENDS "${PROJECT_SOURCE_DIR}/resources/strings.tsv" "${PROJECT_SOURCE_DIR}/cmake/make_string_table.py"
+  COMMENT "Building the string table")
+
+# name type file, for every resource the program reads by name.
+set(IRONVALE_NAMED_RESOURCES IDS_STRINGS CSV "${IRONVALE_STRING_TABLE}")
+
+if(WIN32)
+  enable_language(RC)
+  set(IRONVALE_RC_FILE "${PROJECT_SOURCE_DIR}/resources/ironvale.rc")
+  set_source_files_properties("${IRONVALE_RC_FILE}" PROPERTIES
+    OBJECT_DEPENDS "${IRONVALE_STRING_TABLE};${PROJECT_SOURCE_DIR}/resources/ironvale.ico;${PROJECT_SOURCE_DIR}/resources/IronvaleUpdater.manifest")
+  # windres finds the generated table through the include path.
+  set(CMAKE_RC_FLAGS "${CMAKE_RC_FLAGS} -I${CMAKE_CURRENT_BINARY_DIR}/resources -I${PROJECT_SOURCE_DIR}/resources")
+  add_library(ironvale_resources OBJECT "${IRONVALE_RC_FILE}")
+else()
+  set(embedded "${CMAKE_CURRENT_BINARY_DIR}/resources/embedded_resources.cpp")
+  set(files)
+  list(LENGTH IRONVALE_NAMED_RESOURCES count)
+  math(EXPR last "${count} - 1")
+  foreach(index RANGE 2 ${last} 3)
+    list(GET IRONVALE_NAMED_RESOURCES ${index} file)
+    list(APPEND files "${file}")
+  endforeach()
+  add_custom_command(
+    OUTPUT "${embedded}"
+    COMMAND Python3::Interpreter "${PROJECT_SOURCE_DIR}/cmake/embed_resources.py" "${embedded}" ${IRONVALE_NAMED_RESOURCES}
+    DEPENDS ${files} "${PROJECT_SOURCE_DIR}/cmake/embed_resources.py"
+    COMMENT "Embedding resources")
+  add_library(ironvale_resources OBJECT "${embedded}")
+  target_include_directories(ironvale_resources PRIVATE "${PROJECT_SOURCE_DIR}")
+endif()
+
+# Resources are found by name at run time, never referenced by a symbol, so
+# a static library would drop them: every program links them directly.
+function(ironvale_link_resources target)
+  target_link_libraries(${target} PRIVATE ironvale_resources)
+endfunction()

@@ -1,0 +1,15 @@
+# Collects the .cpp files of the given folders for the platform being built:
+# name.cpp always, name_win.cpp on Windows, name_posix.cpp elsewhere.
+function(ironvale_collect_sources out)
+  set(result)
+  foreach(dir IN LISTS ARGN)
+    file(GLOB found CONFIGURE_DEPENDS "${PROJECT_SOURCE_DIR}/${dir}/*.cpp" "${PROJECT_SOURCE_DIR}/${dir}/*.c")
+    list(APPEND result ${found})
+  endforeach()
+  if(WIN32)
+    list(FILTER result EXCLUDE REGEX "_posix\\.c(pp)?$")
+  else()
+    list(FILTER result EXCLUDE REGEX "_win\\.c(pp)?$")
+  endif()
+  set(${out} ${result} PARENT_SCOPE)
+endfunction()

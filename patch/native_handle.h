@@ -1,0 +1,36 @@
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+// The thin OS layer under FileStream: one open file, closed on destruction.
+// Each operation returns false on failure; FileStream turns that into its
+// own error texts.
+class NativeHandle {
+public:
+    enum class Mode {
+        CreateAlways,  // write, exclusive, truncate or create
+        OpenRead,      // read, shared for reading, must exist
+        OpenAlways,    // write, exclusive, open or create, no truncation
+    };
+
+    NativeHandle() = default;
+    NativeHandle(const NativeHandle&) = delete;
+    NativeHandle& operator=(const NativeHandle&) = delete;
+    ~NativeHandle() { Close(); }
+
+    bool Open(const std::string& path, Mode mode);
+    void Close();
+    bool IsOpen() const;
+
+    bool Seek(int64_t offset, uint32_t origin, int64_t& newPosition);
+    bool Length(int64_t& length);
+    bool Read(void* destination, uint32_t count, uint32_t& done);
+    bool Write(const void* source, uint32_t count, uint32_t& done);
+    bool Flush();
+
+private:
+    // A Win32 HANDLE or a POSIX descriptor; -1 (and on Windows also 0)
+    // means closed.
+    intptr_t value = -1;
+};

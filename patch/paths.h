@@ -1,0 +1,25 @@
+#pragma once
+
+#include <string>
+
+// The separator of file paths: a backslash on Windows, a slash on POSIX.
+// Paths in patch descriptions use backslashes; joining converts them.
+extern const char kPathSeparator;
+
+// The one rule for joining: slashes of the other kind become the separator,
+// trailing separators of both parts and leading ones of the tail are
+// dropped, and exactly one separator is written between them.
+std::string PathJoin(const std::string& base, const std::string& tail, char separator = kPathSeparator);
+
+// Text before the last separator (either slash counts, and the result
+// uses kPathSeparator); empty when there is none.
+std::string GetParentDirectory(const std::string& path);
+// Text after the last separator; the whole path when there is none.
+std::string GetFileName(const std::string& path);
+
+// The user's temporary folder, with its trailing separator.
+std::string GetTempDirectory();
+// Removes a folder: only an empty one, or with everything in it.
+bool DeleteDirectory(const std::string& path, bool recursive);
+// Creates a folder with every missing parent; true when it exists afterwards.
+bool MakeDirectories(const std::string& path);

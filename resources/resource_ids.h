@@ -1,0 +1,4 @@
+#pragma once
+
+// Numeric resource identifiers shared by the .rc and the code.
+#define IDI_IRONVALE 109

@@ -1,0 +1,26 @@
+#pragma once
+
+#include <string>
+
+// A fresh folder under the system's temporary folder, removed with all its
+// contents when the object goes away.
+class TempFolder {
+public:
+    TempFolder();
+    TempFolder(const TempFolder&) = delete;
+    TempFolder& operator=(const TempFolder&) = delete;
+    ~TempFolder();
+
+    const std::string& Path() const { return path; }
+    // Path of a name inside the folder (joined with the platform separator).
+    std::string operator/(const std::string& name) const;
+
+private:
+    std::string path;
+};
+
+// Whole-file helpers for fixtures; they throw std::runtime_error on failure
+// so a broken fixture cannot pass for a product fault.
+void WriteTextFile(const std::string& path, const std::string& content);
+std::string ReadTextFile(const std::string& path);
+bool PathExists(const std::string& path);
