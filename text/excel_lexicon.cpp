@@ -55,11 +55,16 @@ bool EqualsIgnoringCase(const std::string& a, const std::string& b) {
 }
 
 void ReplaceLineBreaks(std::u16string& text) {
-    size_t found = 0;
-    while ((found = text.find(kLineBreakMarker, found)) != std::u16string::npos) {
-        text.replace(found, kLineBreakMarker.size(), u"\n");
-        found += 1;
+    std::u16string result;
+    size_t from = 0;
+    size_t found;
+    while ((found = text.find(kLineBreakMarker, from)) != std::u16string::npos) {
+        result.append(text, from, found - from);
+        result += u'\n';
+        from = found + kLineBreakMarker.size();
     }
+    result.append(text, from, std::u16string::npos);
+    text.swap(result);
 }
 
 }  // namespace

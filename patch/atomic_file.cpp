@@ -1,0 +1,40 @@
+#include "patch/atomic_file.h"
+
+#include <algorithm>
+
+#include "patch/exception.h"
+#include "patch/file_stream.h"
+#include "patch/paths.h"
+
+// Declared here, implemented per platform: move with replace, durable.
+bool MoveReplacingDurably(const std::string& from, const std::string& to);
+void RemoveFileQuietly(const std::string& path);
+
+bool ReplaceFileAtomically(const std::string& path, const std::string& content) {
+    const std::string name = GetFileName(path);
+    const std::string folder = GetParentDirectory(path);
+    const std::string temporary = folder.empty() ? "~" + name + ".tmp" : PathJoin(folder, "~" + name + ".tmp");
+    return ReplaceFileAtomically(path, content, temporary);
+}
+
+bool ReplaceFileAtomically(const std::string& path, const std::string& content, const std::string& temporaryPath) {
+    try {
+        FileStream file;
+        file.Create(temporaryPath);
+        size_t done = 0;
+        while (done < content.size()) {
+            const size_t piece = std::min<size_t>(content.size() - done, 1u << 30);
+            done += file.Write(content.data() + done, static_cast<uint32_t>(piece));
+        }
+        file.Flush();
+        file.Close();
+    } catch (const Exception&) {
+        RemoveFileQuietly(temporaryPath);
+        return false;
+    }
+    if (!MoveReplacingDurably(temporaryPath, path)) {
+        RemoveFileQuietly(temporaryPath);
+        return false;
+    }
+    return true;
+}

@@ -1,0 +1,14 @@
+#pragma once
+
+#include <string>
+
+// Replaces the file at path with content so that a crash or power cut at
+// any moment leaves either the old file or the new one, never a torn mix:
+// the content goes to a temporary file in the same folder, is flushed to
+// disk, and then takes the old file's place in one rename. Returns false
+// (leaving the old file as it was) when any step fails.
+bool ReplaceFileAtomically(const std::string& path, const std::string& content);
+
+// The same with the temporary name chosen by the caller (it must lie in the
+// same folder as path).
+bool ReplaceFileAtomically(const std::string& path, const std::string& content, const std::string& temporaryPath);
