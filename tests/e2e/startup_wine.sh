@@ -2,9 +2,9 @@
 # IronvaleUpdater.exe under Wine: the opening log lines and exit code, and
 # the instance-running box of a second start, answered by dialog_answer.
 set -euo pipefail
-program=$1
-holder_exe=$2
-answer_exe=$3
+program=$(realpath "$1")
+holder_exe=$(realpath "$2")
+answer_exe=$(realpath "$3")
 here=$(cd "$(dirname "$0")" && pwd)
 root=$(cd "$here/../.." && pwd)
 source "$here/log_format.sh"
