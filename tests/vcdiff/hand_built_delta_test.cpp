@@ -1,0 +1,176 @@
+// What xdelta3 never writes, built by hand: application-defined code tables,
+// target segments, every address mode, RUN and copies that overlap their
+// own output.
+#include <gtest/gtest.h>
+
+#include "patch/checksum.h"
+#include "patch/code_table.h"
+#include "patch/exception.h"
+#include "patch/file_stream.h"
+#include "patch/memory_stream.h"
+#include "patch/vcdiff_decoder.h"
+#include "tests/support/test_files.h"
+#include "tests/vcdiff/delta_builder.h"
+
+namespace {
+
+WindowSpec Adding(const std::string& text) {
+    WindowSpec spec;
+    spec.targetLength = static_cast<uint32_t>(text.size());
+    spec.data = text;
+    spec.instructions = AddOp(spec.targetLength);
+    return spec;
+}
+
+uint32_t ChecksumOf(const std::string& text) {
+    return Checksum(reinterpret_cast<const uint8_t*>(text.data()), static_cast<int64_t>(text.size()));
+}
+
+TEST(VcdiffHandBuilt, HeaderAloneAndSkippedApplicationDataGiveEmptyTargets) {
+    for (const std::string& delta : {Header(), Header(0x04) + Varint(3) + "abc"}) {
+        const DecodeResult result = DecodeInMemory("", delta);
+        EXPECT_EQ(result.error, "");
+        EXPECT_EQ(result.target, "");
+    }
+    // The skipped bytes really are skipped: a window follows them.
+    EXPECT_EQ(DecodeInMemory("", Header(0x04) + Varint(3) + "abc" + Window(Adding("xyz"))).target, "xyz");
+}
+
+TEST(VcdiffHandBuilt, RunRepeatsOneDataByte) {
+    WindowSpec spec;
+    spec.targetLength = 7;
+    spec.data = "abx";
+    spec.instructions = AddOp(2) + RunOp(5);
+    EXPECT_EQ(DecodeInMemory("", Header() + Window(spec)).target, "abxxxxx");
+}
+
+TEST(VcdiffHandBuilt, OverlappingCopiesRepeatTheirPeriod) {
+    struct Case {
+        std::string seed;
+        uint32_t size;
+    };
+    for (const Case& c : {Case{"z", 10}, Case{"abc", 10}, Case{"abcdefg", 1000}, Case{"ab", 2}}) {
+        WindowSpec spec;
+        spec.targetLength = static_cast<uint32_t>(c.seed.size()) + c.size;
+        spec.data = c.seed;
+        spec.instructions = AddOp(static_cast<uint32_t>(c.seed.size())) + CopyOp(c.size, 1);
+        spec.addresses = Varint(static_cast<uint32_t>(c.seed.size()));  // back to offset 0
+        std::string expected = c.seed;
+        for (uint32_t i = 0; i < c.size; ++i) expected += expected[i];
+        EXPECT_EQ(DecodeInMemory("", Header() + Window(spec)).target, expected) << c.seed << " " << c.size;
+    }
+}
+
+TEST(VcdiffHandBuilt, EveryAddressModeOfTheDefaultCache) {
+    WindowSpec spec;
+    spec.indicator = 0x01;
+    spec.segmentLength = 16;
+    spec.targetLength = 20;
+    spec.instructions = CopyOp(4, 0) + CopyOp(4, 2) + CopyOp(4, 3) + CopyOp(4, 6) + CopyOp(4, 1);
+    spec.addresses = Varint(2)       // self: 2
+                     + Varint(4)     // near slot 0 (2) + 4 = 6
+                     + Varint(0)     // near slot 1 (6) + 0 = 6
+                     + "\x02"        // same block 0, byte 2: address 2
+                     + Varint(20);   // here (16 + 16) - 20 = 12
+    const DecodeResult result = DecodeInMemory("0123456789ABCDEF", Header() + Window(spec));
+    EXPECT_EQ(result.error, "");
+    EXPECT_EQ(result.target, "2345678967892345CDEF");
+}
+
+TEST(VcdiffHandBuilt, SourceSegmentStartsAtItsPosition) {
+    WindowSpec spec;
+    spec.indicator = 0x05;  // source and checksum
+    spec.segmentLength = 4;
+    spec.segmentPosition = 6;
+    spec.targetLength = 4;
+    spec.instructions = CopyOp(4, 0);
+    spec.addresses = Varint(0);
+    spec.checksum = ChecksumOf("6789");
+    EXPECT_EQ(DecodeInMemory("0123456789", Header() + Window(spec)).target, "6789");
+}
+
+TEST(VcdiffHandBuilt, TargetSegmentCopiesFromEarlierWindows) {
+    WindowSpec again;
+    again.indicator = 0x02;
+    again.segmentLength = 5;
+    again.segmentPosition = 6;
+    again.targetLength = 6;
+    again.data = "!";
+    again.instructions = CopyOp(5, 0) + AddOp(1);
+    again.addresses = Varint(0);
+    const std::string delta = Header() + Window(Adding("hello world")) + Window(again) + Window(Adding("."));
+    const DecodeResult result = DecodeInMemory("", delta);
+    EXPECT_EQ(result.error, "");
+    EXPECT_EQ(result.target, "hello worldworld!.");
+
+    // A target file open only for writing cannot give the segment back.
+    TempFolder folder;
+    FileStream source;
+    FileStream deltaFile;
+    FileStream target;
+    WriteTextFile(folder / "source", "");
+    WriteTextFile(folder / "delta", delta);
+    source.Open(folder / "source");
+    deltaFile.Open(folder / "delta");
+    target.Create(folder / "target");
+    try {
+        VcdiffDecoder::Decode(&source, &deltaFile, &target);
+        FAIL() << "a target segment read from a write-only file";
+    } catch (const Exception& error) {
+        EXPECT_EQ(error.message, "Failed to read data from file.");
+    }
+}
+
+TEST(VcdiffHandBuilt, ApplicationDefinedCodeTableAndCacheSizes) {
+    // Near cache 1, same cache 1: modes 0 self, 1 here, 2 near, 3 same.
+    CodeTable::Encoded table = CodeTable::Default().Encode();
+    auto set = [&table](int index, int row, uint8_t value) { table[row * 256 + index] = value; };
+    set(0, 0, kAdd), set(0, 2, 3);                   // entry 0: ADD 3,
+    set(0, 1, kCopy), set(0, 3, 3), set(0, 5, 1);    //          COPY 3 in mode here
+    set(1, 0, kCopy), set(1, 2, 0), set(1, 4, 3);    // entry 1: COPY (size follows) in mode same
+    set(1, 1, kNoop), set(1, 3, 0), set(1, 5, 0);
+    set(2, 0, kNoop), set(2, 2, 0), set(2, 4, 0);    // entry 2: nothing at all
+    WindowSpec spec;
+    spec.targetLength = 8;
+    spec.data = "abc";
+    spec.instructions = std::string("\x00\x02\x01", 3) + Varint(2);
+    spec.addresses = Varint(3) + std::string(1, '\0');
+    const std::string header =
+        Header(0x02) + CodeTableSection(std::string(table.begin(), table.end()), 1, 1);
+    const DecodeResult result = DecodeInMemory("", header + Window(spec));
+    EXPECT_EQ(result.error, "");
+    EXPECT_EQ(result.target, "abcabcab");
+}
+
+TEST(VcdiffHandBuilt, WindowWithBadChecksumIsWrittenThenRejected) {
+    WindowSpec good = Adding("abc");
+    good.indicator = 0x04;
+    good.checksum = ChecksumOf("abc");
+    WindowSpec bad = Adding("def");
+    bad.indicator = 0x04;
+    bad.checksum = ChecksumOf("abc");
+    const DecodeResult result = DecodeInMemory("", Header() + Window(good) + Window(bad) + Window(Adding("ghi")));
+    EXPECT_EQ(result.error, "Invalid Checksum after decoding window");
+    EXPECT_EQ(result.code, 0);
+    EXPECT_EQ(result.target, "abcdef");
+}
+
+TEST(VcdiffHandBuilt, SourceSegmentWithoutSourceStreamIsRefused) {
+    WindowSpec spec;
+    spec.indicator = 0x01;
+    const std::string text = Header() + Window(spec);
+    std::vector<uint8_t> bytes(text.begin(), text.end());
+    MemoryStream delta;
+    MemoryStream target;
+    delta.Attach(bytes.data(), static_cast<int32_t>(bytes.size()));
+    VcdiffDecoder decoder(nullptr, &delta, &target);
+    decoder.ReadHeader();
+    try {
+        decoder.DecodeWindow();
+        FAIL() << "decoded without a source";
+    } catch (const Exception& error) {
+        EXPECT_EQ(error.message, "Source stream requested by delta but not provided by caller.");
+    }
+}
+
+}  // namespace
