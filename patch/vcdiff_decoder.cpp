@@ -98,7 +98,8 @@ void VcdiffDecoder::ReadHeader() {
         throw Exception(
             "VcdiffDecoder->ReadHeader: VcdiffDecoder does not handle delta stream using secondary compressors");
     }
-    if (indicator & 0xF8) throw Exception("VcdiffDecoder->ReadHeader: Invalid header indicator - bits 3-7 not all zero.");
+    if (indicator & 0xF8)
+        throw Exception("VcdiffDecoder->ReadHeader: Invalid header indicator - bits 3-7 not all zero.");
     if (indicator & kCodeTable) ReadCodeTable();
     if (indicator & kApplicationData) SkipDeltaBytes(ReadBigEndian7BitEncodedInt(delta));
 }
@@ -215,7 +216,8 @@ void VcdiffDecoder::ReadWindowHeader(uint8_t indicator, Window& window) {
     if (window.hasChecksum) {
         uint8_t bytes[4];
         CheckedReadBytes(delta, bytes, 4);
-        window.expectedChecksum = uint32_t{bytes[0]} << 24 | uint32_t{bytes[1]} << 16 | uint32_t{bytes[2]} << 8 | bytes[3];
+        window.expectedChecksum =
+            uint32_t{bytes[0]} << 24 | uint32_t{bytes[1]} << 16 | uint32_t{bytes[2]} << 8 | bytes[3];
     }
     const uint64_t counted = static_cast<uint64_t>(Tell(delta) - encodingStart) + window.dataLength +
                              window.instructionsLength + window.addressesLength;

@@ -44,7 +44,8 @@ std::string CodeTableSection(const std::string& table, uint8_t nearSize, uint8_t
     for (size_t i = 0; i < table.size();) {
         const bool same = i < standard.size() && static_cast<uint8_t>(table[i]) == standard[i];
         size_t end = i;
-        while (end < table.size() && (end < standard.size() && static_cast<uint8_t>(table[end]) == standard[end]) == same) {
+        while (end < table.size() &&
+               (end < standard.size() && static_cast<uint8_t>(table[end]) == standard[end]) == same) {
             ++end;
         }
         const uint32_t length = static_cast<uint32_t>(end - i);

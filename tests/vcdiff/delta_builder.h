@@ -24,7 +24,7 @@ struct WindowSpec {
     std::string data;
     std::string instructions;
     std::string addresses;
-    uint32_t checksum = 0;           // written when the indicator has bit 2
+    uint32_t checksum = 0;            // written when the indicator has bit 2
     int32_t encodingLengthError = 0;  // added to the true delta encoding length
 };
 std::string Window(const WindowSpec& spec);

@@ -67,11 +67,11 @@ TEST(VcdiffHandBuilt, EveryAddressModeOfTheDefaultCache) {
     spec.segmentLength = 16;
     spec.targetLength = 20;
     spec.instructions = CopyOp(4, 0) + CopyOp(4, 2) + CopyOp(4, 3) + CopyOp(4, 6) + CopyOp(4, 1);
-    spec.addresses = Varint(2)       // self: 2
-                     + Varint(4)     // near slot 0 (2) + 4 = 6
-                     + Varint(0)     // near slot 1 (6) + 0 = 6
-                     + "\x02"        // same block 0, byte 2: address 2
-                     + Varint(20);   // here (16 + 16) - 20 = 12
+    spec.addresses = Varint(2)      // self: 2
+                     + Varint(4)    // near slot 0 (2) + 4 = 6
+                     + Varint(0)    // near slot 1 (6) + 0 = 6
+                     + "\x02"       // same block 0, byte 2: address 2
+                     + Varint(20);  // here (16 + 16) - 20 = 12
     const DecodeResult result = DecodeInMemory("0123456789ABCDEF", Header() + Window(spec));
     EXPECT_EQ(result.error, "");
     EXPECT_EQ(result.target, "2345678967892345CDEF");
@@ -125,18 +125,16 @@ TEST(VcdiffHandBuilt, ApplicationDefinedCodeTableAndCacheSizes) {
     // Near cache 1, same cache 1: modes 0 self, 1 here, 2 near, 3 same.
     CodeTable::Encoded table = CodeTable::Default().Encode();
     auto set = [&table](int index, int row, uint8_t value) { table[row * 256 + index] = value; };
-    set(0, 0, kAdd), set(0, 2, 3);                   // entry 0: ADD 3,
-    set(0, 1, kCopy), set(0, 3, 3), set(0, 5, 1);    //          COPY 3 in mode here
-    set(1, 0, kCopy), set(1, 2, 0), set(1, 4, 3);    // entry 1: COPY (size follows) in mode same
-    set(1, 1, kNoop), set(1, 3, 0), set(1, 5, 0);
-    set(2, 0, kNoop), set(2, 2, 0), set(2, 4, 0);    // entry 2: nothing at all
+    set(0, 0, kAdd), set(0, 2, 3);                 // entry 0: ADD 3,
+    set(0, 1, kCopy), set(0, 3, 3), set(0, 5, 1);  //          COPY 3 in mode here
+    set(1, 0, kCopy), set(1, 2, 0), set(1, 4, 3);  // entry 1: COPY (size follows) in mode same
+    set(2, 0, kNoop), set(2, 2, 0), set(2, 4, 0);  // entry 2: nothing at all
     WindowSpec spec;
     spec.targetLength = 8;
     spec.data = "abc";
     spec.instructions = std::string("\x00\x02\x01", 3) + Varint(2);
     spec.addresses = Varint(3) + std::string(1, '\0');
-    const std::string header =
-        Header(0x02) + CodeTableSection(std::string(table.begin(), table.end()), 1, 1);
+    const std::string header = Header(0x02) + CodeTableSection(std::string(table.begin(), table.end()), 1, 1);
     const DecodeResult result = DecodeInMemory("", header + Window(spec));
     EXPECT_EQ(result.error, "");
     EXPECT_EQ(result.target, "abcabcab");

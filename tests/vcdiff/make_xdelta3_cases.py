@@ -63,25 +63,29 @@ def with_runs(rng, size):
     return bytes(out[:size])
 
 
-def pairs(rng, scale):
-    """(name, source, target, extra xdelta3 options) for every case."""
-    base = rng.randbytes(256 * KIB * scale)
-    other = rng.randbytes(200 * KIB * scale)
-    several = rng.randbytes(2 * MIB * scale)
-    runs = with_runs(rng, 300 * KIB * scale)
+def pairs(rng, unit):
+    """(name, source, target, extra xdelta3 options) for every case; unit is
+    1 KiB for the interop cases and a few bytes for fuzz seeds."""
+    def count(n):
+        return max(1, n * unit // KIB)
+
+    base = rng.randbytes(256 * unit)
+    other = rng.randbytes(200 * unit)
+    several = rng.randbytes(2048 * unit)
+    runs = with_runs(rng, 300 * unit)
     yield "empty", b"", b"", []
-    yield "empty-source", b"", rng.randbytes(50 * KIB * scale), []
+    yield "empty-source", b"", rng.randbytes(50 * unit), []
     yield "empty-target", base, b"", []
     yield "identical", base, base, []
     yield "unrelated", base, other, []
-    yield "small-edits", base, edit(rng, base, 300 * scale, 4, ["replace"]), []
-    yield "inserts", base, edit(rng, base, 60 * scale, 2000, ["insert"]), []
-    yield "deletes", base, edit(rng, base, 60 * scale, 2000, ["delete"]), []
-    yield "moved-blocks", base, moved_blocks(rng, edit(rng, base, 20, 50, ["replace"]), 8 * KIB), []
-    yield "runs", runs, edit(rng, runs, 100 * scale, 100, ["replace", "insert", "delete"]), []
+    yield "small-edits", base, edit(rng, base, count(300), 4, ["replace"]), []
+    yield "inserts", base, edit(rng, base, count(60), 2 * unit, ["insert"]), []
+    yield "deletes", base, edit(rng, base, count(60), 2 * unit, ["delete"]), []
+    yield "moved-blocks", base, moved_blocks(rng, edit(rng, base, count(20), 50, ["replace"]), 8 * unit), []
+    yield "runs", runs, edit(rng, runs, count(100), 100, ["replace", "insert", "delete"]), []
     # Windows of 16 KiB against source windows of 512 KiB: many windows,
     # each with its own segment somewhere inside the source.
-    yield "several-windows", several, edit(rng, moved_blocks(rng, several, 64 * KIB), 200 * scale, 300,
+    yield "several-windows", several, edit(rng, moved_blocks(rng, several, 64 * unit), count(200), 300,
                                            ["replace", "insert", "delete"]), ["-W", "16384", "-B", "524288"]
 
 
@@ -98,7 +102,7 @@ def make_cases(outdir):
     rng = random.Random(20240611)
     os.makedirs(outdir, exist_ok=True)
     lines = []
-    for name, source, target, options in pairs(rng, 1):
+    for name, source, target, options in pairs(rng, KIB):
         write(os.path.join(outdir, name + ".source"), source)
         write(os.path.join(outdir, name + ".target"), target)
         for suffix, extra in (("", []), (".n", ["-n"])):
@@ -134,9 +138,7 @@ def make_fuzz_seeds(outdir):
     os.makedirs(outdir, exist_ok=True)
     scratch = os.path.join(outdir, "scratch")
     os.makedirs(scratch, exist_ok=True)
-    for name, source, target, options in pairs(rng, 1):
-        source, target = source[:6000], target[:6000]
-        options = ["-W", "16384"] if options else []
+    for name, source, target, options in pairs(rng, 8):
         for suffix, extra in (("", []), (".n", ["-n"])):
             write(os.path.join(scratch, "s"), source)
             write(os.path.join(scratch, "t"), target)

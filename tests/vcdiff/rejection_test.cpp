@@ -51,7 +51,8 @@ std::vector<Row> Rows() {
          "VcdiffDecoder->ReadHeader: VcdiffDecoder can only read delta streams of version 0"},
         {"secondary compressor, bits 3-7 set too", Header(0xF9),
          "VcdiffDecoder->ReadHeader: VcdiffDecoder does not handle delta stream using secondary compressors"},
-        {"header bits 3-7", Header(0x08), "VcdiffDecoder->ReadHeader: Invalid header indicator - bits 3-7 not all zero."},
+        {"header bits 3-7", Header(0x08),
+         "VcdiffDecoder->ReadHeader: Invalid header indicator - bits 3-7 not all zero."},
         {"truncated magic", "\xD6\xC3",
          "CheckedReadBytes: End of stream reached with bytes left to read. File:  Size: 2"},
         {"code table length 1", Header(0x02) + Varint(1),
@@ -100,21 +101,21 @@ std::vector<Row> Rows() {
          window + "RUN runs past the end of the data section."},
         {"instruction size over the window", OneWindow([](WindowSpec& s) { s.targetLength = 2; }),
          window + "Instruction size 3 overflows the target window (2 bytes left)."},
-        {"COPY past the segment",
-         OneWindow([](WindowSpec& s) {
+        {"COPY past the segment", OneWindow([](WindowSpec& s) {
              s.indicator = 1, s.segmentLength = 4, s.data = "", s.instructions = CopyOp(3, 0), s.addresses = Varint(2);
          }),
          window + "COPY of 3 bytes at 2 runs past the end of the segment (4 bytes)."},
-        {"COPY at the current position",
-         OneWindow([](WindowSpec& s) { s.data = "a", s.instructions = AddOp(1) + CopyOp(2, 0), s.addresses = Varint(1); }),
+        {"COPY at the current position", OneWindow([](WindowSpec& s) {
+             s.data = "a", s.instructions = AddOp(1) + CopyOp(2, 0), s.addresses = Varint(1);
+         }),
          "VcdiffDecoder: COPY address 1 is at or after the current position 1."},
-        {"COPY from a near slot past the position",
-         OneWindow([](WindowSpec& s) {
+        {"COPY from a near slot past the position", OneWindow([](WindowSpec& s) {
              s.data = "a", s.instructions = AddOp(1) + CopyOp(2, 2), s.addresses = Varint(0xFFFFFFFF);
          }),
          "VcdiffDecoder: COPY address 4294967295 is at or after the current position 1."},
-        {"COPY before the start",
-         OneWindow([](WindowSpec& s) { s.data = "a", s.instructions = AddOp(1) + CopyOp(2, 1), s.addresses = Varint(2); }),
+        {"COPY before the start", OneWindow([](WindowSpec& s) {
+             s.data = "a", s.instructions = AddOp(1) + CopyOp(2, 1), s.addresses = Varint(2);
+         }),
          "VcdiffDecoder: COPY address lies 2 bytes back from position 1, before the start of the segment."},
         {"same-cache mode past the slots", TableWithEntry0(kCopy, 1, 9) + WindowOnly([](WindowSpec& s) {
                                                s.data = "a", s.instructions = AddOp(1) + '\0' + AddOp(1);
