@@ -89,6 +89,42 @@ TEST(VcdiffHandBuilt, SourceSegmentStartsAtItsPosition) {
     EXPECT_EQ(DecodeInMemory("0123456789", Header() + Window(spec)).target, "6789");
 }
 
+// A 3 GiB source without the disk space: the byte at p is p % 251.
+class LargeSource : public FileStream {
+public:
+    int64_t Seek(int64_t offset, uint32_t) override { return position = offset; }
+    int64_t GetLength() override { return int64_t{3} << 30; }
+    uint32_t Read(void* destination, uint32_t count) override {
+        for (uint32_t i = 0; i < count; ++i) static_cast<uint8_t*>(destination)[i] = (position + i) % 251;
+        position += count;
+        return count;
+    }
+
+private:
+    int64_t position = 0;
+};
+
+TEST(VcdiffHandBuilt, SegmentPositionsAbove2GiBAreUnsigned) {
+    const uint32_t at = 0x80000005u;
+    WindowSpec spec;
+    spec.indicator = 0x01;
+    spec.segmentLength = 4;
+    spec.segmentPosition = at;
+    spec.targetLength = 4;
+    spec.instructions = CopyOp(4, 0);
+    spec.addresses = Varint(0);
+    const std::string text = Header() + Window(spec);
+    std::vector<uint8_t> bytes(text.begin(), text.end());
+    std::vector<uint8_t> out(4);
+    LargeSource source;
+    MemoryStream delta;
+    MemoryStream target;
+    delta.Attach(bytes.data(), static_cast<int32_t>(bytes.size()));
+    target.Attach(out.data(), 4);
+    VcdiffDecoder::Decode(&source, &delta, &target);
+    for (uint32_t i = 0; i < 4; ++i) EXPECT_EQ(out[i], (uint64_t{at} + i) % 251) << i;
+}
+
 TEST(VcdiffHandBuilt, TargetSegmentCopiesFromEarlierWindows) {
     WindowSpec again;
     again.indicator = 0x02;
