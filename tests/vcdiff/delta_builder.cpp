@@ -19,28 +19,29 @@ std::string AddOp(uint32_t size) { return "\x01" + Varint(size); }
 std::string RunOp(uint32_t size) { return std::string(1, '\0') + Varint(size); }
 std::string CopyOp(uint32_t size, uint8_t mode) { return static_cast<char>(19 + 16 * mode) + Varint(size); }
 
-std::string Window(const WindowSpec& spec) {
-    std::string body = Varint(spec.targetLength) + static_cast<char>(spec.deltaIndicator) +
-                       Varint(static_cast<uint32_t>(spec.data.size())) +
-                       Varint(static_cast<uint32_t>(spec.instructions.size())) +
-                       Varint(static_cast<uint32_t>(spec.addresses.size()));
-    if (spec.indicator & 0x04) {
-        for (int shift = 24; shift >= 0; shift -= 8) body += static_cast<char>((spec.checksum >> shift) & 0xFF);
+std::string Window(const WindowLayout& layout) {
+    std::string body = Varint(layout.targetLength) + static_cast<char>(layout.deltaIndicator) +
+                       Varint(static_cast<uint32_t>(layout.data.size())) +
+                       Varint(static_cast<uint32_t>(layout.instructions.size())) +
+                       Varint(static_cast<uint32_t>(layout.addresses.size()));
+    if (layout.indicator & 0x04) {
+        for (int shift = 24; shift >= 0; shift -= 8) body += static_cast<char>((layout.checksum >> shift) & 0xFF);
     }
-    body += spec.data + spec.instructions + spec.addresses;
-    std::string window(1, static_cast<char>(spec.indicator));
-    if (spec.indicator & 0x03) window += Varint(spec.segmentLength) + Varint(spec.segmentPosition);
-    return window + Varint(static_cast<uint32_t>(static_cast<int32_t>(body.size()) + spec.encodingLengthError)) + body;
+    body += layout.data + layout.instructions + layout.addresses;
+    std::string window(1, static_cast<char>(layout.indicator));
+    if (layout.indicator & 0x03) window += Varint(layout.segmentLength) + Varint(layout.segmentPosition);
+    return window + Varint(static_cast<uint32_t>(static_cast<int32_t>(body.size()) + layout.encodingLengthError)) +
+           body;
 }
 
 std::string CodeTableSection(const std::string& table, uint8_t nearSize, uint8_t sameSize) {
     // Runs that match the default table are copied from it (the source of
     // the table's own delta); the rest is added.
     const CodeTable::Encoded standard = CodeTable::Default().Encode();
-    WindowSpec spec;
-    spec.indicator = 0x01;
-    spec.segmentLength = CodeTable::kEncodedSize;
-    spec.targetLength = static_cast<uint32_t>(table.size());
+    WindowLayout layout;
+    layout.indicator = 0x01;
+    layout.segmentLength = CodeTable::kEncodedSize;
+    layout.targetLength = static_cast<uint32_t>(table.size());
     for (size_t i = 0; i < table.size();) {
         const bool same = i < standard.size() && static_cast<uint8_t>(table[i]) == standard[i];
         size_t end = i;
@@ -50,15 +51,15 @@ std::string CodeTableSection(const std::string& table, uint8_t nearSize, uint8_t
         }
         const uint32_t length = static_cast<uint32_t>(end - i);
         if (same) {
-            spec.instructions += CopyOp(length, 0);
-            spec.addresses += Varint(static_cast<uint32_t>(i));
+            layout.instructions += CopyOp(length, 0);
+            layout.addresses += Varint(static_cast<uint32_t>(i));
         } else {
-            spec.instructions += AddOp(length);
-            spec.data += table.substr(i, length);
+            layout.instructions += AddOp(length);
+            layout.data += table.substr(i, length);
         }
         i = end;
     }
-    const std::string compressed = Header() + Window(spec);
+    const std::string compressed = Header() + Window(layout);
     return Varint(static_cast<uint32_t>(compressed.size() + 2)) + static_cast<char>(nearSize) +
            static_cast<char>(sameSize) + compressed;
 }

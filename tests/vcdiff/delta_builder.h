@@ -15,7 +15,7 @@ std::string AddOp(uint32_t size);
 std::string RunOp(uint32_t size);
 std::string CopyOp(uint32_t size, uint8_t mode);
 
-struct WindowSpec {
+struct WindowLayout {
     uint8_t indicator = 0;
     uint32_t segmentLength = 0;
     uint32_t segmentPosition = 0;
@@ -27,7 +27,7 @@ struct WindowSpec {
     uint32_t checksum = 0;            // written when the indicator has bit 2
     int32_t encodingLengthError = 0;  // added to the true delta encoding length
 };
-std::string Window(const WindowSpec& spec);
+std::string Window(const WindowLayout& layout);
 
 // The header bytes that bring an application-defined code table (its six
 // rows), sent as a delta against the default table.

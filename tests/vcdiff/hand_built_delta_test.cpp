@@ -14,12 +14,12 @@
 
 namespace {
 
-WindowSpec Adding(const std::string& text) {
-    WindowSpec spec;
-    spec.targetLength = static_cast<uint32_t>(text.size());
-    spec.data = text;
-    spec.instructions = AddOp(spec.targetLength);
-    return spec;
+WindowLayout Adding(const std::string& text) {
+    WindowLayout layout;
+    layout.targetLength = static_cast<uint32_t>(text.size());
+    layout.data = text;
+    layout.instructions = AddOp(layout.targetLength);
+    return layout;
 }
 
 uint32_t ChecksumOf(const std::string& text) {
@@ -37,11 +37,11 @@ TEST(VcdiffHandBuilt, HeaderAloneAndSkippedApplicationDataGiveEmptyTargets) {
 }
 
 TEST(VcdiffHandBuilt, RunRepeatsOneDataByte) {
-    WindowSpec spec;
-    spec.targetLength = 7;
-    spec.data = "abx";
-    spec.instructions = AddOp(2) + RunOp(5);
-    EXPECT_EQ(DecodeInMemory("", Header() + Window(spec)).target, "abxxxxx");
+    WindowLayout layout;
+    layout.targetLength = 7;
+    layout.data = "abx";
+    layout.instructions = AddOp(2) + RunOp(5);
+    EXPECT_EQ(DecodeInMemory("", Header() + Window(layout)).target, "abxxxxx");
 }
 
 TEST(VcdiffHandBuilt, OverlappingCopiesRepeatTheirPeriod) {
@@ -50,43 +50,43 @@ TEST(VcdiffHandBuilt, OverlappingCopiesRepeatTheirPeriod) {
         uint32_t size;
     };
     for (const Case& c : {Case{"z", 10}, Case{"abc", 10}, Case{"abcdefg", 1000}, Case{"ab", 2}}) {
-        WindowSpec spec;
-        spec.targetLength = static_cast<uint32_t>(c.seed.size()) + c.size;
-        spec.data = c.seed;
-        spec.instructions = AddOp(static_cast<uint32_t>(c.seed.size())) + CopyOp(c.size, 1);
-        spec.addresses = Varint(static_cast<uint32_t>(c.seed.size()));  // back to offset 0
+        WindowLayout layout;
+        layout.targetLength = static_cast<uint32_t>(c.seed.size()) + c.size;
+        layout.data = c.seed;
+        layout.instructions = AddOp(static_cast<uint32_t>(c.seed.size())) + CopyOp(c.size, 1);
+        layout.addresses = Varint(static_cast<uint32_t>(c.seed.size()));  // back to offset 0
         std::string expected = c.seed;
         for (uint32_t i = 0; i < c.size; ++i) expected += expected[i];
-        EXPECT_EQ(DecodeInMemory("", Header() + Window(spec)).target, expected) << c.seed << " " << c.size;
+        EXPECT_EQ(DecodeInMemory("", Header() + Window(layout)).target, expected) << c.seed << " " << c.size;
     }
 }
 
 TEST(VcdiffHandBuilt, EveryAddressModeOfTheDefaultCache) {
-    WindowSpec spec;
-    spec.indicator = 0x01;
-    spec.segmentLength = 16;
-    spec.targetLength = 20;
-    spec.instructions = CopyOp(4, 0) + CopyOp(4, 2) + CopyOp(4, 3) + CopyOp(4, 6) + CopyOp(4, 1);
-    spec.addresses = Varint(2)      // self: 2
-                     + Varint(4)    // near slot 0 (2) + 4 = 6
-                     + Varint(0)    // near slot 1 (6) + 0 = 6
-                     + "\x02"       // same block 0, byte 2: address 2
-                     + Varint(20);  // here (16 + 16) - 20 = 12
-    const DecodeResult result = DecodeInMemory("0123456789ABCDEF", Header() + Window(spec));
+    WindowLayout layout;
+    layout.indicator = 0x01;
+    layout.segmentLength = 16;
+    layout.targetLength = 20;
+    layout.instructions = CopyOp(4, 0) + CopyOp(4, 2) + CopyOp(4, 3) + CopyOp(4, 6) + CopyOp(4, 1);
+    layout.addresses = Varint(2)      // self: 2
+                       + Varint(4)    // near slot 0 (2) + 4 = 6
+                       + Varint(0)    // near slot 1 (6) + 0 = 6
+                       + "\x02"       // same block 0, byte 2: address 2
+                       + Varint(20);  // here (16 + 16) - 20 = 12
+    const DecodeResult result = DecodeInMemory("0123456789ABCDEF", Header() + Window(layout));
     EXPECT_EQ(result.error, "");
     EXPECT_EQ(result.target, "2345678967892345CDEF");
 }
 
 TEST(VcdiffHandBuilt, SourceSegmentStartsAtItsPosition) {
-    WindowSpec spec;
-    spec.indicator = 0x05;  // source and checksum
-    spec.segmentLength = 4;
-    spec.segmentPosition = 6;
-    spec.targetLength = 4;
-    spec.instructions = CopyOp(4, 0);
-    spec.addresses = Varint(0);
-    spec.checksum = ChecksumOf("6789");
-    EXPECT_EQ(DecodeInMemory("0123456789", Header() + Window(spec)).target, "6789");
+    WindowLayout layout;
+    layout.indicator = 0x05;  // source and checksum
+    layout.segmentLength = 4;
+    layout.segmentPosition = 6;
+    layout.targetLength = 4;
+    layout.instructions = CopyOp(4, 0);
+    layout.addresses = Varint(0);
+    layout.checksum = ChecksumOf("6789");
+    EXPECT_EQ(DecodeInMemory("0123456789", Header() + Window(layout)).target, "6789");
 }
 
 // A 3 GiB source without the disk space: the byte at p is p % 251.
@@ -106,14 +106,14 @@ private:
 
 TEST(VcdiffHandBuilt, SegmentPositionsAbove2GiBAreUnsigned) {
     const uint32_t at = 0x80000005u;
-    WindowSpec spec;
-    spec.indicator = 0x01;
-    spec.segmentLength = 4;
-    spec.segmentPosition = at;
-    spec.targetLength = 4;
-    spec.instructions = CopyOp(4, 0);
-    spec.addresses = Varint(0);
-    const std::string text = Header() + Window(spec);
+    WindowLayout layout;
+    layout.indicator = 0x01;
+    layout.segmentLength = 4;
+    layout.segmentPosition = at;
+    layout.targetLength = 4;
+    layout.instructions = CopyOp(4, 0);
+    layout.addresses = Varint(0);
+    const std::string text = Header() + Window(layout);
     std::vector<uint8_t> bytes(text.begin(), text.end());
     std::vector<uint8_t> out(4);
     LargeSource source;
@@ -126,7 +126,7 @@ TEST(VcdiffHandBuilt, SegmentPositionsAbove2GiBAreUnsigned) {
 }
 
 TEST(VcdiffHandBuilt, TargetSegmentCopiesFromEarlierWindows) {
-    WindowSpec again;
+    WindowLayout again;
     again.indicator = 0x02;
     again.segmentLength = 5;
     again.segmentPosition = 6;
@@ -165,22 +165,22 @@ TEST(VcdiffHandBuilt, ApplicationDefinedCodeTableAndCacheSizes) {
     set(0, 1, kCopy), set(0, 3, 3), set(0, 5, 1);  //          COPY 3 in mode here
     set(1, 0, kCopy), set(1, 2, 0), set(1, 4, 3);  // entry 1: COPY (size follows) in mode same
     set(2, 0, kNoop), set(2, 2, 0), set(2, 4, 0);  // entry 2: nothing at all
-    WindowSpec spec;
-    spec.targetLength = 8;
-    spec.data = "abc";
-    spec.instructions = std::string("\x00\x02\x01", 3) + Varint(2);
-    spec.addresses = Varint(3) + std::string(1, '\0');
+    WindowLayout layout;
+    layout.targetLength = 8;
+    layout.data = "abc";
+    layout.instructions = std::string("\x00\x02\x01", 3) + Varint(2);
+    layout.addresses = Varint(3) + std::string(1, '\0');
     const std::string header = Header(0x02) + CodeTableSection(std::string(table.begin(), table.end()), 1, 1);
-    const DecodeResult result = DecodeInMemory("", header + Window(spec));
+    const DecodeResult result = DecodeInMemory("", header + Window(layout));
     EXPECT_EQ(result.error, "");
     EXPECT_EQ(result.target, "abcabcab");
 }
 
 TEST(VcdiffHandBuilt, WindowWithBadChecksumIsWrittenThenRejected) {
-    WindowSpec good = Adding("abc");
+    WindowLayout good = Adding("abc");
     good.indicator = 0x04;
     good.checksum = ChecksumOf("abc");
-    WindowSpec bad = Adding("def");
+    WindowLayout bad = Adding("def");
     bad.indicator = 0x04;
     bad.checksum = ChecksumOf("abc");
     const DecodeResult result = DecodeInMemory("", Header() + Window(good) + Window(bad) + Window(Adding("ghi")));
@@ -190,9 +190,9 @@ TEST(VcdiffHandBuilt, WindowWithBadChecksumIsWrittenThenRejected) {
 }
 
 TEST(VcdiffHandBuilt, SourceSegmentWithoutSourceStreamIsRefused) {
-    WindowSpec spec;
-    spec.indicator = 0x01;
-    const std::string text = Header() + Window(spec);
+    WindowLayout layout;
+    layout.indicator = 0x01;
+    const std::string text = Header() + Window(layout);
     std::vector<uint8_t> bytes(text.begin(), text.end());
     MemoryStream delta;
     MemoryStream target;

@@ -13,16 +13,16 @@ namespace {
 const std::string kSource = "0123456789";
 
 // A window that adds "abc", changed as a row needs.
-std::string WindowOnly(const std::function<void(WindowSpec&)>& change) {
-    WindowSpec spec;
-    spec.targetLength = 3;
-    spec.data = "abc";
-    spec.instructions = AddOp(3);
-    change(spec);
-    return Window(spec);
+std::string WindowOnly(const std::function<void(WindowLayout&)>& change) {
+    WindowLayout layout;
+    layout.targetLength = 3;
+    layout.data = "abc";
+    layout.instructions = AddOp(3);
+    change(layout);
+    return Window(layout);
 }
 
-std::string OneWindow(const std::function<void(WindowSpec&)>& change) { return Header() + WindowOnly(change); }
+std::string OneWindow(const std::function<void(WindowLayout&)>& change) { return Header() + WindowOnly(change); }
 
 // A header with the default table except entry 0 (first instruction only).
 std::string TableWithEntry0(uint8_t type, uint8_t size, uint8_t mode, size_t length = CodeTable::kEncodedSize) {
@@ -68,74 +68,74 @@ std::vector<Row> Rows() {
         {"window bits 3-7", Header() + "\x0C", "Invalid window indicator - bits 3-7 not all zero."},
         {"truncated window", Header() + std::string(1, '\0'),
          "ReadBigEndian7BitEncodedInt: End of stream reached with bytes left to read. File:  Size: 6"},
-        {"compressed sections", OneWindow([](WindowSpec& s) { s.deltaIndicator = 1; }),
+        {"compressed sections", OneWindow([](WindowLayout& s) { s.deltaIndicator = 1; }),
          "VcdiffDecoder is unable to handle compressed delta sections."},
         {"segment over the limit",
-         OneWindow([](WindowSpec& s) { s.indicator = 1, s.segmentLength = VcdiffDecoder::kMaxSegmentLength + 1; }),
+         OneWindow([](WindowLayout& s) { s.indicator = 1, s.segmentLength = VcdiffDecoder::kMaxSegmentLength + 1; }),
          window + "Segment length " + limit(VcdiffDecoder::kMaxSegmentLength + 1) + " exceeds the limit of " +
              limit(VcdiffDecoder::kMaxSegmentLength) + " bytes."},
         {"source segment past the source",
-         OneWindow([](WindowSpec& s) { s.indicator = 1, s.segmentLength = 5, s.segmentPosition = 6; }),
+         OneWindow([](WindowLayout& s) { s.indicator = 1, s.segmentLength = 5, s.segmentPosition = 6; }),
          window + "Source segment of 5 bytes at 6 runs past the end of the source (10 bytes)."},
         {"source segment at a position above 2 GiB",
-         OneWindow([](WindowSpec& s) { s.indicator = 1, s.segmentLength = 1, s.segmentPosition = 0xFFFFFFFF; }),
+         OneWindow([](WindowLayout& s) { s.indicator = 1, s.segmentLength = 1, s.segmentPosition = 0xFFFFFFFF; }),
          window + "Source segment of 1 bytes at 4294967295 runs past the end of the source (10 bytes)."},
         {"target segment past the bytes written",
-         OneWindow([](WindowSpec& s) { s.indicator = 2, s.segmentLength = 1; }),
+         OneWindow([](WindowLayout& s) { s.indicator = 2, s.segmentLength = 1; }),
          window + "Target segment of 1 bytes at 0 runs past the 0 bytes written so far."},
         {"target window over the limit",
-         OneWindow([](WindowSpec& s) { s.targetLength = VcdiffDecoder::kMaxTargetWindowLength + 1; }),
+         OneWindow([](WindowLayout& s) { s.targetLength = VcdiffDecoder::kMaxTargetWindowLength + 1; }),
          window + "Target window length " + limit(VcdiffDecoder::kMaxTargetWindowLength + 1) +
              " exceeds the limit of " + limit(VcdiffDecoder::kMaxTargetWindowLength) + " bytes."},
         {"delta encoding over the limit",
-         OneWindow([](WindowSpec& s) { s.encodingLengthError = VcdiffDecoder::kMaxDeltaEncodingLength; }),
+         OneWindow([](WindowLayout& s) { s.encodingLengthError = VcdiffDecoder::kMaxDeltaEncodingLength; }),
          window + "Delta encoding length " + limit(VcdiffDecoder::kMaxDeltaEncodingLength + 10) +
              " exceeds the limit of " + limit(VcdiffDecoder::kMaxDeltaEncodingLength) + " bytes."},
-        {"delta encoding longer than the delta", OneWindow([](WindowSpec& s) { s.encodingLengthError = 1; }),
+        {"delta encoding longer than the delta", OneWindow([](WindowLayout& s) { s.encodingLengthError = 1; }),
          "VcdiffDecoder: Delta encoding of 11 bytes is longer than the 10 bytes left in the delta."},
-        {"sections that do not add up", OneWindow([](WindowSpec& s) { s.encodingLengthError = -1; }),
+        {"sections that do not add up", OneWindow([](WindowLayout& s) { s.encodingLengthError = -1; }),
          window + "Section lengths add up to 10 bytes, but the delta encoding length is 9."},
-        {"ADD past the data section", OneWindow([](WindowSpec& s) { s.data = "ab"; }),
+        {"ADD past the data section", OneWindow([](WindowLayout& s) { s.data = "ab"; }),
          window + "ADD of 3 bytes runs past the end of the data section."},
-        {"RUN past the data section", OneWindow([](WindowSpec& s) { s.data = "", s.instructions = RunOp(3); }),
+        {"RUN past the data section", OneWindow([](WindowLayout& s) { s.data = "", s.instructions = RunOp(3); }),
          window + "RUN runs past the end of the data section."},
-        {"instruction size over the window", OneWindow([](WindowSpec& s) { s.targetLength = 2; }),
+        {"instruction size over the window", OneWindow([](WindowLayout& s) { s.targetLength = 2; }),
          window + "Instruction size 3 overflows the target window (2 bytes left)."},
-        {"COPY past the segment", OneWindow([](WindowSpec& s) {
+        {"COPY past the segment", OneWindow([](WindowLayout& s) {
              s.indicator = 1, s.segmentLength = 4, s.data = "", s.instructions = CopyOp(3, 0), s.addresses = Varint(2);
          }),
          window + "COPY of 3 bytes at 2 runs past the end of the segment (4 bytes)."},
-        {"COPY at the current position", OneWindow([](WindowSpec& s) {
+        {"COPY at the current position", OneWindow([](WindowLayout& s) {
              s.data = "a", s.instructions = AddOp(1) + CopyOp(2, 0), s.addresses = Varint(1);
          }),
          "VcdiffDecoder: COPY address 1 is at or after the current position 1."},
-        {"COPY from a near slot past the position", OneWindow([](WindowSpec& s) {
+        {"COPY from a near slot past the position", OneWindow([](WindowLayout& s) {
              s.data = "a", s.instructions = AddOp(1) + CopyOp(2, 2), s.addresses = Varint(0xFFFFFFFF);
          }),
          "VcdiffDecoder: COPY address 4294967295 is at or after the current position 1."},
-        {"COPY before the start", OneWindow([](WindowSpec& s) {
+        {"COPY before the start", OneWindow([](WindowLayout& s) {
              s.data = "a", s.instructions = AddOp(1) + CopyOp(2, 1), s.addresses = Varint(2);
          }),
          "VcdiffDecoder: COPY address lies 2 bytes back from position 1, before the start of the segment."},
-        {"same-cache mode past the slots", TableWithEntry0(kCopy, 1, 9) + WindowOnly([](WindowSpec& s) {
+        {"same-cache mode past the slots", TableWithEntry0(kCopy, 1, 9) + WindowOnly([](WindowLayout& s) {
                                                s.data = "a", s.instructions = AddOp(1) + '\0' + AddOp(1);
                                            }),
          "VcdiffDecoder: COPY address mode 9 is past the 4 near and 3 same cache slots."},
-        {"instruction type 4", TableWithEntry0(4, 1, 0) + WindowOnly([](WindowSpec& s) { s.instructions = '\0'; }),
+        {"instruction type 4", TableWithEntry0(4, 1, 0) + WindowOnly([](WindowLayout& s) { s.instructions = '\0'; }),
          "Invalid instruction type found."},
-        {"missing instruction size", OneWindow([](WindowSpec& s) { s.instructions = "\x01"; }),
+        {"missing instruction size", OneWindow([](WindowLayout& s) { s.instructions = "\x01"; }),
          "ReadBigEndian7BitEncodedInt: End of stream reached with bytes left to read. File:  Size: 1"},
-        {"missing address", OneWindow([](WindowSpec& s) { s.data = "", s.instructions = CopyOp(1, 0); }),
+        {"missing address", OneWindow([](WindowLayout& s) { s.data = "", s.instructions = CopyOp(1, 0); }),
          "ReadBigEndian7BitEncodedInt: End of stream reached with bytes left to read. File:  Size: 0"},
-        {"window not filled", OneWindow([](WindowSpec& s) { s.targetLength = 5; }),
+        {"window not filled", OneWindow([](WindowLayout& s) { s.targetLength = 5; }),
          window + "Instructions produced 3 of the 5 bytes of the target window."},
-        {"data left over", OneWindow([](WindowSpec& s) { s.data = "abcd"; }),
+        {"data left over", OneWindow([](WindowLayout& s) { s.data = "abcd"; }),
          window + "1 bytes of the data section were not used."},
-        {"addresses left over", OneWindow([](WindowSpec& s) { s.addresses = Varint(0); }),
+        {"addresses left over", OneWindow([](WindowLayout& s) { s.addresses = Varint(0); }),
          window + "1 bytes of the addresses section were not used."},
-        {"bad checksum", OneWindow([](WindowSpec& s) { s.indicator = 4, s.checksum = 1; }),
+        {"bad checksum", OneWindow([](WindowLayout& s) { s.indicator = 4, s.checksum = 1; }),
          "Invalid Checksum after decoding window", "abc"},
-        {"target without room", OneWindow([](WindowSpec&) {}),
+        {"target without room", OneWindow([](WindowLayout&) {}),
          window + "The target took only 2 of the 3 bytes of the window.", "ab", 2},
     };
 }
