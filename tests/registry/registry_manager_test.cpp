@@ -65,16 +65,6 @@ TEST(RegistryManagerTest, LocateTakesTheFirstHiveThatNamesAnInstallation) {
     }
 }
 
-TEST(RegistryManagerTest, LocatePassesOverAMachineKeyWithoutInstallDir) {
-    RegistrySandbox sandbox;
-    RegistryManager(RegistryHive::LocalMachine, sandbox.KeyPath()).SetLanguage("French");
-    RegistryManager(RegistryHive::CurrentUser, sandbox.KeyPath()).SetInstallDir("D:\\Games\\Ironvale");
-    RegistryManager registry;
-    ASSERT_TRUE(registry.Locate(sandbox.KeyPath(), ""));
-    EXPECT_EQ(registry.GetHive(), RegistryHive::CurrentUser);
-    EXPECT_EQ(registry.GetLanguage(), "");
-}
-
 TEST(RegistryManagerTest, InstallDirIsTrimmedAndLanguageIsNot) {
     RegistrySandbox sandbox;
     const RegistryManager registry(RegistryHive::CurrentUser, sandbox.KeyPath());
