@@ -6,6 +6,8 @@
 #include "app/updater.h"
 #include "app/updater_arguments.h"
 #include "patch/exception.h"
+#include "state/configuration.h"
+#include "state/registry_manager.h"
 #include "text/localization.h"
 #include "text/log.h"
 #include "ui/message_box.h"
@@ -61,7 +63,16 @@ int32_t RunUpdaterProcess(const std::string& commandLine) {
 
     auto arguments = std::make_unique<UpdaterArguments>();
     arguments->Parse(commandLine);
-    // The stored language is selected here once the registry access exists.
+    {
+        // Before any box can appear, so that every later text is in the
+        // player's language.
+        Configuration configuration;
+        configuration.SetDefaults();
+        RegistryManager registry;
+        registry.Locate(configuration.GetRegistryKey(), arguments->sid);
+        const std::string language = registry.GetLanguage();
+        if (!language.empty()) Localization::SetLanguage(language);
+    }
     LOG_AS("Main", Info) << arguments->Describe();
 
     SingleInstance instance;

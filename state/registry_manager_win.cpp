@@ -1,0 +1,78 @@
+#include <windows.h>
+
+#include <vector>
+
+#include "state/registry_manager.h"
+
+namespace {
+
+HKEY RootKey(RegistryHive hive) {
+    switch (hive) {
+        case RegistryHive::LocalMachine:
+            return HKEY_LOCAL_MACHINE;
+        case RegistryHive::CurrentUser:
+            return HKEY_CURRENT_USER;
+        case RegistryHive::Users:
+            return HKEY_USERS;
+        case RegistryHive::None:
+            break;
+    }
+    return nullptr;
+}
+
+// An open key, closed on every way out.
+class OpenKey {
+public:
+    OpenKey() = default;
+    OpenKey(const OpenKey&) = delete;
+    OpenKey& operator=(const OpenKey&) = delete;
+    ~OpenKey() {
+        if (key != nullptr) RegCloseKey(key);
+    }
+    HKEY key = nullptr;
+};
+
+}  // namespace
+
+namespace RegistryPlatform {
+
+bool QueryValue(RegistryHive hive, const std::string& keyPath, const std::string& valueName, std::string& data) {
+    const HKEY root = RootKey(hive);
+    if (root == nullptr) return false;
+    OpenKey opened;
+    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_READ, &opened.key) != ERROR_SUCCESS) return false;
+    DWORD size = 0;
+    if (RegQueryValueExA(opened.key, valueName.c_str(), nullptr, nullptr, nullptr, &size) != ERROR_SUCCESS ||
+        size == 0) {
+        return false;
+    }
+    std::vector<BYTE> buffer(size);
+    if (RegQueryValueExA(opened.key, valueName.c_str(), nullptr, nullptr, buffer.data(), &size) != ERROR_SUCCESS) {
+        return false;
+    }
+    data.assign(reinterpret_cast<const char*>(buffer.data()), size);
+    return size != 0;
+}
+
+bool CreateKey(RegistryHive hive, const std::string& keyPath) {
+    const HKEY root = RootKey(hive);
+    if (root == nullptr) return false;
+    OpenKey created;
+    DWORD disposition = 0;
+    const LONG result = RegCreateKeyExA(root, keyPath.c_str(), 0, nullptr, REG_OPTION_NON_VOLATILE, KEY_WRITE, nullptr,
+                                        &created.key, &disposition);
+    return result == ERROR_SUCCESS && (disposition == REG_CREATED_NEW_KEY || disposition == REG_OPENED_EXISTING_KEY);
+}
+
+bool SetStringValue(RegistryHive hive, const std::string& keyPath, const std::string& valueName,
+                    const std::string& text) {
+    const HKEY root = RootKey(hive);
+    if (root == nullptr) return false;
+    OpenKey opened;
+    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_WRITE, &opened.key) != ERROR_SUCCESS) return false;
+    const DWORD size = static_cast<DWORD>(text.size() + 1);
+    return RegSetValueExA(opened.key, valueName.c_str(), 0, REG_SZ, reinterpret_cast<const BYTE*>(text.c_str()),
+                          size) == ERROR_SUCCESS;
+}
+
+}  // namespace RegistryPlatform
