@@ -1,0 +1,118 @@
+#include "net/http_downloader.h"
+
+#include <chrono>
+
+#include "net/file_copy.h"
+#include "net/http_transfer.h"
+#include "net/location.h"
+#include "net/sign_url.h"
+#include "patch/exception.h"
+#include "patch/paths.h"
+#include "text/log.h"
+
+HttpDownloader::~HttpDownloader() {
+    RequestStop();
+    if (worker.joinable()) worker.join();
+}
+
+void HttpDownloader::Start(const std::list<DownloadEntry>& list, bool sign) {
+    {
+        std::unique_lock<std::mutex> lock(workerMutex);
+        if (!workerEnded.wait_for(lock, std::chrono::milliseconds(100), [this] { return !workerRunning; })) {
+            throw Exception("Downloader is busy.");
+        }
+    }
+    if (list.empty()) throw Exception("No files to download.");
+    if (worker.joinable()) worker.join();
+    if (&list != &entries) entries = list;
+    for (DownloadEntry& entry : entries) entry.status = DownloadStatus::Pending;
+    signUrls = sign;
+    stopRequested = false;
+    {
+        std::lock_guard<std::mutex> lock(workerMutex);
+        workerRunning = true;
+    }
+    worker = std::thread(&HttpDownloader::Run, this);
+}
+
+void HttpDownloader::Download(const std::string& url, const std::string& localPath, bool sign) {
+    Start(std::list<DownloadEntry>{DownloadEntry(url, localPath)}, sign);
+}
+
+void HttpDownloader::RequestStop() {
+    stopRequested = true;
+    wakeEvent.Signal();
+}
+
+bool HttpDownloader::WorkerEnded() {
+    std::lock_guard<std::mutex> lock(workerMutex);
+    return !workerRunning;
+}
+
+bool HttpDownloader::WaitForWorker() {
+    std::unique_lock<std::mutex> lock(workerMutex);
+    if (!worker.joinable()) return false;
+    workerEnded.wait(lock, [this] { return !workerRunning; });
+    return true;
+}
+
+DownloadStatus HttpDownloader::WaitForFile(const std::string& fileName) {
+    if (!worker.joinable()) throw Exception("HttpDownloader not started.");
+    const DownloadEntry* wanted = nullptr;
+    for (const DownloadEntry& entry : entries) {
+        if (GetFileName(entry.localPath) == fileName) {
+            wanted = &entry;
+            break;
+        }
+    }
+    const auto outcome = [wanted] { return wanted != nullptr ? wanted->status.load() : DownloadStatus::Pending; };
+    for (;;) {
+        const DownloadStatus status = outcome();
+        if (status != DownloadStatus::Pending) return status;
+        if (WorkerEnded()) {
+            // The entry may have been settled just before the worker ended.
+            const DownloadStatus last = outcome();
+            return last != DownloadStatus::Pending ? last : DownloadStatus::Failed;
+        }
+        if (stopRequested) return DownloadStatus::Cancelled;
+        // The worker signals after each file and once more after it has
+        // ended; a stop request signals too.
+        wakeEvent.Wait();
+    }
+}
+
+void HttpDownloader::Run() {
+    for (DownloadEntry& entry : entries) {
+        if (stopRequested) break;
+        Fetch(entry);
+        wakeEvent.Signal();
+        if (entry.status != DownloadStatus::Done) break;
+    }
+    {
+        std::lock_guard<std::mutex> lock(workerMutex);
+        workerRunning = false;
+    }
+    workerEnded.notify_all();
+    wakeEvent.Signal();
+}
+
+void HttpDownloader::Fetch(DownloadEntry& entry) {
+    LOG(Trace) << "Downloading file: " << entry.url;
+    switch (ClassifyLocation(entry.url)) {
+        case LocationKind::Http:
+            entry.status = HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry.localPath, stopRequested,
+                                        statusView);
+            break;
+        case LocationKind::Relative:
+            entry.url = PathJoin(GetProgramFolder(), entry.url);
+            entry.status = FileCopyTransfer(entry.url, entry.localPath, stopRequested, statusView);
+            break;
+        case LocationKind::FileCopy:
+            entry.status = FileCopyTransfer(entry.url, entry.localPath, stopRequested, statusView);
+            break;
+        case LocationKind::Unsupported:
+            LOG(Error) << "Download error, protocol not supported. URL: " << entry.url;
+            entry.status = DownloadStatus::Unsupported;
+            break;
+    }
+}

@@ -1,0 +1,72 @@
+#pragma once
+
+#include <atomic>
+#include <condition_variable>
+#include <list>
+#include <mutex>
+#include <string>
+#include <thread>
+
+#include "app/status_interfaces.h"
+#include "net/auto_reset_event.h"
+#include "net/download_entry.h"
+
+// Fetches an ordered list of files on a worker thread of its own, so the
+// caller can work on each file as soon as it has arrived. A location is an
+// "http://" address, a "file://" address, a UNC path or a path relative to
+// the program's folder. The first file that does not arrive ends the list.
+class HttpDownloader {
+public:
+    HttpDownloader() = default;
+    HttpDownloader(const HttpDownloader&) = delete;
+    HttpDownloader& operator=(const HttpDownloader&) = delete;
+    // Stops the worker and waits for it.
+    virtual ~HttpDownloader();
+
+    // Fetches list (every status reset to Pending) on a new worker; with
+    // signUrls set, HTTP addresses are signed. Throws "Downloader is busy."
+    // when the previous worker is still running after 100 ms and "No files
+    // to download." for an empty list.
+    void Start(const std::list<DownloadEntry>& list, bool signUrls);
+    // Start with a list of one.
+    void Download(const std::string& url, const std::string& localPath, bool signUrls);
+
+    // Blocks until the first entry whose local file name equals fileName
+    // (exactly) has an outcome, the worker has ended, or a stop was
+    // requested. A name the list does not hold gives Failed once the worker
+    // has ended; a stop gives Cancelled. Throws "HttpDownloader not started."
+    // before the first Start.
+    DownloadStatus WaitForFile(const std::string& fileName);
+
+    // Ends the transfer in progress and the rest of the list, and wakes a
+    // caller blocked in WaitForFile. Safe from any thread.
+    void RequestStop();
+
+    // Blocks until the worker of the last Start has ended; false when none
+    // was ever started. Read the outcomes from Entries() afterwards.
+    bool WaitForWorker();
+    // The list of the last Start with the worker's outcomes. The statuses
+    // may be read at any time; the rest only once the worker has ended.
+    const std::list<DownloadEntry>& Entries() const { return entries; }
+
+    // Receives progress from the worker thread; not owned, may be null.
+    // Set it before Start.
+    void SetStatusView(IStatusView* view) { statusView = view; }
+
+private:
+    void Run();
+    void Fetch(DownloadEntry& entry);
+    bool WorkerEnded();
+
+    bool signUrls = false;
+    std::atomic<bool> stopRequested{false};
+    std::thread worker;
+    AutoResetEvent wakeEvent;
+    std::list<DownloadEntry> entries;
+    IStatusView* statusView = nullptr;
+
+    // Whether the worker of the last Start is still running.
+    std::mutex workerMutex;
+    std::condition_variable workerEnded;
+    bool workerRunning = false;
+};

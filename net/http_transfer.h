@@ -1,0 +1,13 @@
+#pragma once
+
+#include <atomic>
+#include <string>
+
+#include "app/status_interfaces.h"
+#include "net/download_entry.h"
+
+// Fetches address into localPath over HTTP, reporting progress after every
+// piece to statusView (may be null) and checking stopRequested before each
+// read. Only 200 is accepted. Anything but Done leaves no file at localPath.
+DownloadStatus HttpTransfer(const std::string& address, const std::string& localPath,
+                            const std::atomic<bool>& stopRequested, IStatusView* statusView);

@@ -1,0 +1,55 @@
+#include <windows.h>
+#include <wininet.h>
+
+#include "net/http_transport.h"
+
+namespace {
+
+class InternetHandle {
+public:
+    explicit InternetHandle(HINTERNET value) : handle(value) {}
+    InternetHandle(const InternetHandle&) = delete;
+    InternetHandle& operator=(const InternetHandle&) = delete;
+    ~InternetHandle() {
+        if (handle != nullptr) InternetCloseHandle(handle);
+    }
+    HINTERNET get() const { return handle; }
+
+private:
+    HINTERNET handle;
+};
+
+const char kAgent[] = "IronvaleUpdater";
+const char kHeaders[] = "Accept: */*\r\n\r\n";
+const DWORD kHeadersLength = 15;
+// WinINet reads in these pieces; progress is reported after every one.
+const DWORD kReadSize = 1000;
+
+}  // namespace
+
+HttpOutcome HttpGet(const std::string& address, HttpResponseSink& sink) {
+    InternetHandle session(InternetOpenA(kAgent, INTERNET_OPEN_TYPE_PRECONFIG, nullptr, nullptr, 0));
+    if (session.get() == nullptr) return HttpOutcome::NoSession;
+    InternetHandle request(
+        InternetOpenUrlA(session.get(), address.c_str(), kHeaders, kHeadersLength, INTERNET_FLAG_RELOAD, 0));
+    if (request.get() == nullptr) return HttpOutcome::NoResponse;
+
+    char status[32] = {};
+    DWORD size = sizeof(status);
+    std::string statusText;
+    if (HttpQueryInfoA(request.get(), HTTP_QUERY_STATUS_CODE, status, &size, nullptr)) statusText.assign(status, size);
+    DWORD length = 0;
+    size = sizeof(length);
+    const bool lengthKnown =
+        HttpQueryInfoA(request.get(), HTTP_QUERY_CONTENT_LENGTH | HTTP_QUERY_FLAG_NUMBER, &length, &size, nullptr);
+    if (!sink.OnResponse(statusText, lengthKnown != FALSE, length)) return HttpOutcome::Abandoned;
+
+    char buffer[kReadSize];
+    while (sink.KeepReading()) {
+        DWORD read = 0;
+        if (!InternetReadFile(request.get(), buffer, kReadSize, &read)) return HttpOutcome::ReadFailed;
+        if (read == 0) return HttpOutcome::Complete;
+        if (!sink.OnData(buffer, read)) return HttpOutcome::Abandoned;
+    }
+    return HttpOutcome::Stopped;
+}
