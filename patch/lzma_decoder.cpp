@@ -35,16 +35,6 @@ private:
     CLzmaDec state;
 };
 
-uint32_t ReadFully(FileStream& input, uint8_t* buffer, uint32_t count) {
-    uint32_t done = 0;
-    while (done < count) {
-        const uint32_t n = input.Read(buffer + done, count - done);
-        if (n == 0) break;
-        done += n;
-    }
-    return done;
-}
-
 // Cuts the dictionary the header asks for to the unpacked size, when that
 // is given; false when what remains is beyond kMaximumLzmaDictionarySize.
 bool LimitDictionary(uint8_t* properties, bool sizeKnown, uint64_t unpackedSize) {
@@ -93,7 +83,7 @@ void DecodeLzma(FileStream& input, FileStream& output) {
     uint8_t header[kHeaderSize];
     // A stream too short to hold its own header is missing data, not a
     // header of zeros.
-    if (ReadFully(input, header, kHeaderSize) < kHeaderSize) throw Exception(LzmaResultText(SZ_ERROR_INPUT_EOF));
+    if (input.Read(header, kHeaderSize) < kHeaderSize) throw Exception(LzmaResultText(SZ_ERROR_INPUT_EOF));
     uint64_t unpackedSize = 0;
     bool sizeKnown = false;
     for (int i = 0; i < 8; ++i) {

@@ -2,34 +2,25 @@
 
 #include "patch/exception.h"
 #include "patch/lzma_decoder.h"
+#include "patch/stream_readers.h"
 #include "text/log.h"
 
 namespace {
 
 constexpr int kSizeBytes = 5;
 
-uint32_t ReadUpTo(FileStream& stream, uint8_t* buffer, uint32_t count) {
-    uint32_t done = 0;
-    while (done < count) {
-        const uint32_t n = stream.Read(buffer + done, count - done);
-        if (n == 0) break;
-        done += n;
-    }
-    return done;
-}
-
 }  // namespace
 
 bool ReadArchiveMember(FileStream& archive, int64_t offset, int64_t length, ArchiveMember& member) {
     if (offset < 0 || length - offset < 1 + kSizeBytes) return false;
+    // Every read below is checked against the length first, so the exact
+    // readers can only fail if the file shrinks under us.
     archive.Seek(offset, 0);
-    uint8_t nameLength = 0;
-    if (ReadUpTo(archive, &nameLength, 1) != 1) return false;
+    const uint8_t nameLength = CheckedReadByte(&archive);
     const int64_t dataOffset = offset + 1 + nameLength + kSizeBytes;
     if (dataOffset > length) return false;
     uint8_t rest[255 + kSizeBytes];
-    const uint32_t restLength = nameLength + kSizeBytes;
-    if (ReadUpTo(archive, rest, restLength) != restLength) return false;
+    CheckedReadBytes(&archive, rest, nameLength + kSizeBytes);
     int64_t dataSize = 0;
     for (int i = kSizeBytes - 1; i >= 0; --i) dataSize = (dataSize << 8) | rest[nameLength + i];
     if (dataSize > length - dataOffset) return false;

@@ -29,7 +29,8 @@ bool ParseXml(std::string text, TiXmlDocument& document) {
     if (text.find('\0') != std::string::npos) return false;
     if (text.compare(0, 3, "\xEF\xBB\xBF") == 0) text.erase(0, 3);
     text = NormaliseLineBreaks(text);
-    if (MeasureXmlNesting(text, kMaximumXmlNesting) < 0) return false;
+    int64_t nodes = 0;
+    if (MeasureXmlNesting(text, kMaximumXmlNesting, nodes) < 0 || nodes > kMaximumXmlNodes) return false;
     // Legacy encoding: TinyXML's UTF-8 mode would take a code-page byte
     // such as 0xE9 as the lead of a three-byte character and swallow the
     // quote after it (or step past the end of the text).

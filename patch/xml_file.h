@@ -15,6 +15,10 @@ constexpr int64_t kMaximumXmlFileSize = 64 * 1024 * 1024;
 // Our documents nest three levels deep; anything deeper is refused before
 // TinyXML's recursive parser sees it.
 constexpr int kMaximumXmlNesting = 32;
+// TinyXML spends a hundred bytes and more on every node and attribute, so
+// a few bytes of "<a/>" each would cost far more memory than disk. A
+// million is several times the uninstall record of a complete build.
+constexpr int64_t kMaximumXmlNodes = 1000000;
 
 // The line break TinyXML's SaveFile produces on this platform (it writes
 // through a text-mode stream, so CR LF on Windows).
@@ -24,7 +28,8 @@ extern const char kXmlLineBreak[];
 // skipped, CR LF and lone CR read as LF) but byte for byte: names and
 // values are narrow strings in the system code page, so no byte is taken
 // as the start of a multi-byte character. False when the text is too
-// deep, holds a NUL, does not parse or has no root element.
+// deep or has too many nodes, holds a NUL, does not parse or has no root
+// element.
 bool ParseXml(std::string text, TiXmlDocument& document);
 // Reads and parses a file; false on any failure (missing, unreadable, too
 // large, or as ParseXml).

@@ -22,6 +22,8 @@ class Scanner {
 public:
     explicit Scanner(const std::string& text) : p(text.data()), end(text.data() + text.size()) {}
 
+    int64_t Nodes() const { return nodes; }
+
     int Run(int limit) {
         int depth = 0;
         int deepest = 0;
@@ -32,6 +34,7 @@ public:
                 // Outside the root the parser stops at text; inside an
                 // element the text runs to the next tag.
                 if (depth == 0) return deepest;
+                ++nodes;
                 p = std::find(p, end, '<');
                 if (p == end) return -1;
                 continue;
@@ -39,7 +42,10 @@ public:
             if (depth > 0 && StartsWith("</")) {
                 if (!SkipPast(">")) return -1;
                 --depth;
-            } else if (StartsWith("<?xml", true)) {
+                continue;
+            }
+            ++nodes;
+            if (StartsWith("<?xml", true)) {
                 p += 5;
                 if (!Declaration()) return -1;
             } else if (StartsWith("<!--")) {
@@ -91,6 +97,7 @@ private:
 
     // name = "value", name = 'value' or name = value (no quotes in it).
     bool Attribute() {
+        ++nodes;
         SkipSpace();
         if (!Name()) return false;
         SkipSpace();
@@ -154,8 +161,14 @@ private:
 
     const char* p;
     const char* end;
+    int64_t nodes = 0;
 };
 
 }  // namespace
 
-int MeasureXmlNesting(const std::string& text, int limit) { return Scanner(text).Run(limit); }
+int MeasureXmlNesting(const std::string& text, int limit, int64_t& nodes) {
+    Scanner scanner(text);
+    const int depth = scanner.Run(limit);
+    nodes = scanner.Nodes();
+    return depth;
+}

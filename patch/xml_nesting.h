@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <string>
 
 // TinyXML parses nested elements by recursion, so a downloaded file of a
@@ -13,4 +14,8 @@
 // makes the parse fail anyway (an unterminated tag, comment or section).
 // Where TinyXML would stop with an error, the scanner may go on; its
 // result is then still an upper bound of what TinyXML reached.
-int MeasureXmlNesting(const std::string& text, int limit);
+//
+// nodes receives an upper bound of the nodes and attributes TinyXML would
+// build: each costs it a hundred bytes or more, so the caller can refuse a
+// file that is small on disk but huge in memory.
+int MeasureXmlNesting(const std::string& text, int limit, int64_t& nodes);

@@ -33,14 +33,18 @@ TEST(MeasureXmlNesting, CountsOpenElementsTheWayTheParserSeesThem) {
         {"<a b=\"unterminated></a>", -1},
         {"<a b=c\"d\"></a>", -1},                               // quote in an unquoted value
     };
+    int64_t nodes = 0;
     for (const auto& c : cases) {
         SCOPED_TRACE(c.text);
-        EXPECT_EQ(MeasureXmlNesting(c.text, 10), c.depth);
+        EXPECT_EQ(MeasureXmlNesting(c.text, 10, nodes), c.depth);
     }
-    EXPECT_EQ(MeasureXmlNesting("<a><b><c></c></b></a>", 2), -1);
+    EXPECT_EQ(MeasureXmlNesting("<a><b><c></c></b></a>", 2, nodes), -1);
+    // Elements, attributes, text and comments each count.
+    EXPECT_EQ(MeasureXmlNesting("<a x='1' y='2'>t<b/><!-- c --></a>", 10, nodes), 1);
+    EXPECT_EQ(nodes, 6);
 }
 
-TEST(ParseXml, RefusesDeepNestingWithoutOverflowingTheStack) {
+TEST(ParseXml, RefusesDeepNestingAndMassesOfTinyNodes) {
     std::string deep;
     for (int i = 0; i < 200000; ++i) deep += "<a>";
     TiXmlDocument document;
@@ -48,6 +52,9 @@ TEST(ParseXml, RefusesDeepNestingWithoutOverflowingTheStack) {
     std::string hidden = "<r>";
     for (int i = 0; i < 200000; ++i) hidden += "<a x='/>'><!-- </a> -->";
     EXPECT_FALSE(ParseXml(hidden, document));
+    std::string flat = "<r>";
+    for (int64_t i = 0; i < kMaximumXmlNodes; ++i) flat += "<a/>";
+    EXPECT_FALSE(ParseXml(flat + "</r>", document));
 }
 
 TEST(ParseXml, KeepsCodePageBytesAndReadsLikeLoadFile) {

@@ -8,6 +8,7 @@
 #include "patch/exception.h"
 #include "patch/file_stream.h"
 #include "patch/patch_archive.h"
+#include "patch/stream_readers.h"
 #include "tools/ironvale_patch/command.h"
 #include "tools/publisher/archive_writer.h"
 
@@ -22,12 +23,7 @@ int64_t UnpackedSize(FileStream& archive, const ArchiveMember& member) {
     if (member.dataSize < 13) return -1;
     archive.Seek(member.dataOffset + 5, 0);
     uint8_t size[8];
-    uint32_t done = 0;
-    while (done < 8) {
-        const uint32_t n = archive.Read(size + done, 8 - done);
-        if (n == 0) return -1;
-        done += n;
-    }
+    CheckedReadBytes(&archive, size, 8);
     uint64_t value = 0;
     for (int i = 7; i >= 0; --i) value = (value << 8) | size[i];
     return value > static_cast<uint64_t>(INT64_MAX) ? -1 : static_cast<int64_t>(value);
