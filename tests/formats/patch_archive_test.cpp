@@ -121,23 +121,4 @@ TEST(PatchArchive, ReportsMissingArchivesAndCorruptMembers) {
               "Data error, please verify that downloaded files are complete and correct!");
 }
 
-TEST(ReadArchiveMember, DescribesEachMemberAndStopsAtTheEnd) {
-    TempFolder folder;
-    const std::string data = EncodeLzma("payload");
-    WriteTextFile(folder / "a.pak", Member("first", data) + Member("second", ""));
-    FileStream file;
-    file.Open(folder / "a.pak");
-    const int64_t length = file.GetLength();
-    ArchiveMember member;
-    ASSERT_TRUE(ReadArchiveMember(file, 0, length, member));
-    EXPECT_EQ(member.name, "first");
-    EXPECT_EQ(member.dataOffset, 11);
-    EXPECT_EQ(member.dataSize, static_cast<int64_t>(data.size()));
-    const int64_t next = member.dataOffset + member.dataSize;
-    ASSERT_TRUE(ReadArchiveMember(file, next, length, member));
-    EXPECT_EQ(member.name, "second");
-    EXPECT_EQ(member.dataSize, 0);
-    EXPECT_FALSE(ReadArchiveMember(file, member.dataOffset, length, member));
-}
-
 }  // namespace
