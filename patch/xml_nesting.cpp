@@ -35,8 +35,7 @@ public:
                 // element the text runs to the next tag.
                 if (depth == 0) return deepest;
                 ++nodes;
-                p = std::find(p, end, '<');
-                if (p == end) return -1;
+                if (!Text('<')) return -1;
                 continue;
             }
             if (depth > 0 && StartsWith("</")) {
@@ -89,6 +88,31 @@ private:
         return true;
     }
 
+    // Text or a quoted value up to (not past) terminator. A numeric
+    // character reference is where the parser strays: it jumps from "&#"
+    // to the first ';' anywhere after it, over tags and quotes alike, as
+    // long as what precedes that ';' back to the last 'x' (or '#') is
+    // digits; otherwise the parse fails.
+    bool Text(char terminator) {
+        while (p < end && *p != terminator) {
+            if (*p != '&' || end - p < 3 || p[1] != '#') {
+                ++p;
+                continue;
+            }
+            const bool hex = p[2] == 'x';
+            if (hex && end - p < 4) return false;
+            const char* semicolon = std::find(p + (hex ? 3 : 2), end, ';');
+            if (semicolon == end) return false;
+            for (const char* q = semicolon - 1; *q != (hex ? 'x' : '#'); --q) {
+                if (!(hex ? std::isxdigit(static_cast<unsigned char>(*q)) : std::isdigit(static_cast<unsigned char>(*q)))) {
+                    return false;
+                }
+            }
+            p = semicolon + 1;
+        }
+        return p < end;
+    }
+
     bool Name() {
         if (p == end || !IsNameStart(*p)) return false;
         while (p < end && IsNameChar(*p)) ++p;
@@ -107,8 +131,7 @@ private:
         if (p == end) return false;
         if (*p == '"' || *p == '\'') {
             const char quote = *p++;
-            p = std::find(p, end, quote);
-            if (p == end) return false;
+            if (!Text(quote)) return false;
             ++p;
             return p < end;
         }
