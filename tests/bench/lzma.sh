@@ -8,7 +8,7 @@
 # memory the same for both member sizes (buffers and dictionary only).
 #   tests/bench/lzma.sh ROOT BUILD_DIR [RUNS]
 set -euo pipefail
-root=$1
+# $1 is the source tree; everything here lives in the build folder.
 build=$2
 runs=${3:-7}
 tool=$build/tools/ironvale-patch
@@ -49,23 +49,35 @@ for size in 16 256; do
   fi
 done
 
-median() {  # hyperfine JSON file -> median seconds
-  python3 -c 'import json,sys; print(json.load(open(sys.argv[1]))["results"][0]["median"])' "$1"
-}
 peak_kib() {  # COMMAND... -> peak resident set in KiB
   /usr/bin/time -f %M "$@" 2>&1 >/dev/null | tail -1
+}
+# Runs both tools in turn (ours, xz, ours, xz, ...) so that whatever else
+# the machine does weighs on both alike; prints both medians in seconds.
+medians() {  # SIZE
+  python3 - "$tool" "$1" "$runs" <<'PY'
+import statistics, subprocess, sys, time
+tool, size, runs = sys.argv[1], sys.argv[2], int(sys.argv[3])
+ours = [tool, "archive", "extract", "member-%s.pak" % size, "member.bin", "out-ours.bin"]
+def xz():
+    with open("out-xz.bin", "wb") as out:
+        subprocess.run(["xz", "--format=lzma", "-dc", "member-%s.lzma" % size], stdout=out, check=True)
+times = {"ours": [], "xz": []}
+for i in range(runs + 1):
+    for name, run in (("ours", lambda: subprocess.run(ours, check=True)), ("xz", xz)):
+        start = time.perf_counter()
+        run()
+        if i > 0:  # the first round only warms the caches
+            times[name].append(time.perf_counter() - start)
+print(statistics.median(times["ours"]), statistics.median(times["xz"]))
+PY
 }
 
 printf '%-8s %10s %14s %12s %8s %16s %12s\n' member packed_MiB ironvale_med_s xz_median_s ratio ironvale_peak_KiB xz_peak_KiB
 for size in 16 256; do
-  ours="$tool archive extract member-$size.pak member.bin out-ours.bin"
-  theirs="xz --format=lzma -dc member-$size.lzma > out-xz.bin"
-  hyperfine --style none --warmup 1 --runs "$runs" --export-json ours-$size.json "$ours" >/dev/null
-  hyperfine --style none --warmup 1 --runs "$runs" --export-json xz-$size.json "$theirs" >/dev/null
+  read -r ours_s xz_s < <(medians $size)
   cmp -s out-ours.bin data-$size.bin || { echo "ironvale-patch produced wrong data" >&2; exit 1; }
   cmp -s out-xz.bin data-$size.bin || { echo "xz produced wrong data" >&2; exit 1; }
-  ours_s=$(median ours-$size.json)
-  xz_s=$(median xz-$size.json)
   ours_kib=$(peak_kib $tool archive extract member-$size.pak member.bin out-ours.bin)
   xz_kib=$(peak_kib sh -c "exec xz --format=lzma -dc member-$size.lzma > out-xz.bin")
   ratio=$(python3 -c "print('%.3f' % ($ours_s / $xz_s))")
