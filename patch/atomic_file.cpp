@@ -3,12 +3,9 @@
 #include <algorithm>
 
 #include "patch/exception.h"
+#include "patch/file_operations.h"
 #include "patch/file_stream.h"
 #include "patch/paths.h"
-
-// Declared here, implemented per platform: move with replace, durable.
-bool MoveReplacingDurably(const std::string& from, const std::string& to);
-void RemoveFileQuietly(const std::string& path);
 
 bool ReplaceFileAtomically(const std::string& path, const std::string& content) {
     const std::string name = GetFileName(path);
@@ -29,12 +26,13 @@ bool ReplaceFileAtomically(const std::string& path, const std::string& content, 
         file.Flush();
         file.Close();
     } catch (const Exception&) {
-        RemoveFileQuietly(temporaryPath);
+        RemoveFile(temporaryPath);
         return false;
     }
-    if (!MoveReplacingDurably(temporaryPath, path)) {
-        RemoveFileQuietly(temporaryPath);
+    if (!MoveFileReplacing(temporaryPath, path)) {
+        RemoveFile(temporaryPath);
         return false;
     }
+    SyncFolder(GetParentDirectory(path));
     return true;
 }

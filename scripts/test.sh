@@ -10,7 +10,7 @@ fuzz_seconds=${FUZZ_SECONDS:-20}
 jobs=${JOBS:-$(nproc)}
 
 needed=(/usr/bin/x86_64-w64-mingw32-g++-posix /usr/lib/wine/wine64 /usr/bin/xdelta3 /usr/bin/clang++
-        /usr/bin/Xvfb /usr/include/tinyxml.h /usr/include/lzma/LzmaDec.c /usr/include/curl/curl.h
+        /usr/bin/Xvfb /usr/include/tinyxml.h /usr/include/lzma/LzmaDec.c /usr/include/x86_64-linux-gnu/curl/curl.h
         /usr/src/googletest/CMakeLists.txt /usr/bin/ninja /usr/sbin/nginx /opt/ironvale-deps/tinyxml/tinyxml.h)
 for f in "${needed[@]}"; do
   if [ ! -e "$f" ]; then

@@ -5,6 +5,8 @@
 #include <string>
 #include <vector>
 
+#include "patch/file_operations.h"  // FileExists
+
 // Facts about the machine, the user's rights and the operating system that
 // the environment checks rest on.
 
@@ -15,7 +17,6 @@ struct OsInfo {
     std::string osName;
 };
 
-bool FileExists(const std::string& path);
 // User Account Control is switched on ("EnableLUA" not 0).
 bool IsUacEnabled();
 // The process token's elevation type: 1 default, 2 full, 3 limited; 0 when

@@ -8,11 +8,6 @@
 // No UAC, no token elevation and no Windows version numbers here; rights
 // mean being able to write where the update writes.
 
-bool FileExists(const std::string& path) {
-    struct stat info;
-    return ::stat(path.c_str(), &info) == 0;
-}
-
 bool IsUacEnabled() { return false; }
 
 int32_t GetElevationType() { return 0; }

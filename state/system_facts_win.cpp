@@ -32,8 +32,6 @@ bool IsMemberOfBuiltinGroup(DWORD alias) {
 
 }  // namespace
 
-bool FileExists(const std::string& path) { return PathFileExistsA(path.c_str()) == TRUE; }
-
 bool IsUacEnabled() {
     HKEY key = nullptr;
     if (RegOpenKeyExA(HKEY_LOCAL_MACHINE, "SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Policies\\System", 0, KEY_READ,

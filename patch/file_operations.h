@@ -1,0 +1,25 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+// Single-file operations on the installation's records. Each reports
+// failure by returning false; none throws.
+
+// True when a file or folder exists at path.
+bool FileExists(const std::string& path);
+// Deletes one file (not a folder).
+bool RemoveFile(const std::string& path);
+// Renames a file; fails when something already exists at the new path.
+bool RenameFile(const std::string& from, const std::string& to);
+// Moves a file over whatever is at the new path. On Windows the move is
+// written through to the disk before it returns; on POSIX call SyncFolder
+// on the destination folder to make it durable.
+bool MoveFileReplacing(const std::string& from, const std::string& to);
+// Makes the entries of a folder (renames, new files) durable. Nothing to do
+// on Windows, where moves are written through.
+void SyncFolder(const std::string& folder);
+// Appends the full path of every file below folder: the folder's own files
+// first, then everything below each subfolder, in the order the file system
+// lists them. A folder that cannot be listed adds nothing.
+void CollectFiles(const std::string& folder, std::vector<std::string>& list);

@@ -1,0 +1,142 @@
+#include "patch/patch_info_file.h"
+
+#include <sstream>
+
+#include "patch/exception.h"
+#include "patch/xml_file.h"
+
+namespace {
+
+struct CursorList {
+    const char* list;
+    const char* item;
+};
+
+// In the order of PatchInfoFile::Cursor.
+const CursorList kCursorLists[] = {
+    {"FileChanges", "diff"},
+    {"FileChanges", "new"},
+    {"FileChanges", "delete"},
+    {"DirectoryChanges", "delete"},
+    {"DirectoryChanges", "new"},
+    {"RegistryChanges", "delete"},
+    {"RegistryChanges", "new"},
+    {"RegistryGroupChanges", "delete"},
+    {"RegistryGroupChanges", "new"},
+};
+
+int32_t CountElements(const TiXmlElement* list) {
+    int32_t count = 0;
+    for (const TiXmlElement* item = list == nullptr ? nullptr : list->FirstChildElement(); item != nullptr;
+         item = item->NextSiblingElement()) {
+        ++count;
+    }
+    return count;
+}
+
+std::string AttributeOrEmpty(const TiXmlElement* element, const char* name) {
+    const char* value = element->Attribute(name);
+    return value == nullptr ? std::string() : std::string(value);
+}
+
+void AppendList(TiXmlElement& root, const char* name, const std::vector<std::string>& paths) {
+    TiXmlNode* list = root.InsertEndChild(TiXmlElement(name));
+    TiXmlElement item("new");
+    for (const std::string& path : paths) {
+        item.SetAttribute("Path", path);
+        list->InsertEndChild(item);
+    }
+}
+
+}  // namespace
+
+void PatchInfoFile::Load(const std::string& path) {
+    root = nullptr;
+    for (const TiXmlElement*& cursor : cursors) cursor = nullptr;
+    hive = RegistryHive::LocalMachine;
+    registryPath.clear();
+    spaceRequirement = -1;
+
+    if (!LoadXmlFile(path, document)) throw Exception("Failed to load patch info file.");
+    root = document.RootElement();
+
+    std::string text;
+    if (ReadElementText(root, "RegistryHive", text)) hive = ParseHive(text);
+    if (ReadElementText(root, "RegistryPath", text)) registryPath = text;
+    if (ReadElementText(root, "SpaceRequirement", text)) {
+        std::istringstream number(text);
+        int64_t value = 0;
+        if (number >> value) spaceRequirement = value;
+    }
+}
+
+void PatchInfoFile::ResetIterators() {
+    for (int i = 0; i < kCursorCount; ++i) {
+        const TiXmlElement* list = root == nullptr ? nullptr : root->FirstChildElement(kCursorLists[i].list);
+        cursors[i] = list == nullptr ? nullptr : list->FirstChildElement(kCursorLists[i].item);
+    }
+}
+
+int32_t PatchInfoFile::CountFileAndDirectoryChanges() const {
+    if (root == nullptr) return 0;
+    return CountElements(root->FirstChildElement("FileChanges")) +
+           CountElements(root->FirstChildElement("DirectoryChanges"));
+}
+
+bool PatchInfoFile::Next(Cursor cursor, std::string& path, std::string* archive) {
+    path.clear();
+    if (archive != nullptr) archive->clear();
+    const TiXmlElement* item = cursors[cursor];
+    if (item == nullptr) return false;
+    path = AttributeOrEmpty(item, "Path");
+    if (archive != nullptr) *archive = AttributeOrEmpty(item, "File");
+    cursors[cursor] = item->NextSiblingElement(kCursorLists[cursor].item);
+    return true;
+}
+
+bool PatchInfoFile::NextDiffFile(std::string& path, std::string& archive) { return Next(kDiffFile, path, &archive); }
+bool PatchInfoFile::NextNewFile(std::string& path, std::string& archive) { return Next(kNewFile, path, &archive); }
+bool PatchInfoFile::NextDeletedFile(std::string& path) { return Next(kDeletedFile, path, nullptr); }
+bool PatchInfoFile::NextDeletedDirectory(std::string& path) { return Next(kDeletedDirectory, path, nullptr); }
+bool PatchInfoFile::NextNewDirectory(std::string& path) { return Next(kNewDirectory, path, nullptr); }
+bool PatchInfoFile::NextDeletedRegistryKey(std::string& path) { return Next(kDeletedRegistryKey, path, nullptr); }
+bool PatchInfoFile::NextNewRegistryKey(std::string& path) { return Next(kNewRegistryKey, path, nullptr); }
+bool PatchInfoFile::NextDeletedRegistryGroup(std::string& path) { return Next(kDeletedRegistryGroup, path, nullptr); }
+bool PatchInfoFile::NextNewRegistryGroup(std::string& path) { return Next(kNewRegistryGroup, path, nullptr); }
+
+bool PatchInfoFile::Save(const std::string& path, const std::vector<std::string>& files,
+                         const std::vector<std::string>& directories, const std::vector<std::string>& registryKeys,
+                         const std::vector<std::string>& registryGroups, RegistryHive hive,
+                         const std::string& registryPath) {
+    const std::string hiveName = HiveName(hive);
+    TiXmlDocument document;
+    StartXmlDocument(document);
+    TiXmlElement* root = document.InsertEndChild(TiXmlElement("IronvaleWestPatch"))->ToElement();
+    AppendList(*root, "FileChanges", files);
+    AppendList(*root, "DirectoryChanges", directories);
+    AppendList(*root, "RegistryChanges", registryKeys);
+    AppendList(*root, "RegistryGroupChanges", registryGroups);
+    AppendTextElement(root, "RegistryHive", hiveName);
+    AppendTextElement(root, "RegistryPath", registryPath);
+    return SaveXmlFile(document, path);
+}
+
+RegistryHive PatchInfoFile::ParseHive(const std::string& text) {
+    if (text == "HKEY_LOCAL_MACHINE") return RegistryHive::LocalMachine;
+    if (text == "HKEY_CURRENT_USER") return RegistryHive::CurrentUser;
+    if (text == "HKEY_USERS") return RegistryHive::Users;
+    throw Exception("Hive not recognized");
+}
+
+std::string PatchInfoFile::HiveName(RegistryHive hive) {
+    switch (hive) {
+        case RegistryHive::LocalMachine:
+            return "HKEY_LOCAL_MACHINE";
+        case RegistryHive::CurrentUser:
+            return "HKEY_CURRENT_USER";
+        case RegistryHive::Users:
+            return "HKEY_USERS";
+        default:
+            throw Exception("Hive not supported");
+    }
+}

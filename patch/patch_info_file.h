@@ -1,0 +1,86 @@
+#pragma once
+
+#include <tinyxml.h>
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+#include "state/registry_hive.h"
+
+// The patch description ("patchinfo.xml"): which files a patch rebuilds
+// from deltas, adds or deletes, which directories, registry keys and
+// groups it adds or removes, where the game's registry key lives and how
+// much space the patch needs. The lists are handed out item by item
+// through nine cursors. The same schema, with "new" items only, is the
+// uninstall record, written by Save.
+class PatchInfoFile {
+public:
+    PatchInfoFile() = default;
+    PatchInfoFile(const PatchInfoFile&) = delete;
+    PatchInfoFile& operator=(const PatchInfoFile&) = delete;
+    virtual ~PatchInfoFile() = default;
+
+    // Parses the file and reads the hive, registry path and space
+    // requirement. Throws "Failed to load patch info file." when it cannot
+    // be read, and "Hive not recognized" for an unknown hive name. The
+    // cursors are left at their ends until ResetIterators.
+    void Load(const std::string& path);
+    // Puts every cursor on the first item of its list.
+    void ResetIterators();
+    // Items of FileChanges plus items of DirectoryChanges, of every kind.
+    int32_t CountFileAndDirectoryChanges() const;
+
+    // Each fills its outputs from the current item and moves on; false
+    // once the list is exhausted. A missing attribute reads as empty.
+    bool NextDiffFile(std::string& path, std::string& archive);
+    bool NextNewFile(std::string& path, std::string& archive);
+    bool NextDeletedFile(std::string& path);
+    bool NextDeletedDirectory(std::string& path);
+    bool NextNewDirectory(std::string& path);
+    bool NextDeletedRegistryKey(std::string& path);
+    bool NextNewRegistryKey(std::string& path);
+    bool NextDeletedRegistryGroup(std::string& path);
+    bool NextNewRegistryGroup(std::string& path);
+
+    RegistryHive GetHive() const { return hive; }
+    std::string GetRegistryPath() const { return registryPath; }
+    // Bytes the patch needs; -1 when the description does not say.
+    int64_t GetSpaceRequirement() const { return spaceRequirement; }
+
+    // Writes a description holding one "new" item per entry of each list,
+    // then the hive and registry path. Throws "Hive not supported" for a
+    // hive outside the three; a failed write is logged and returns false,
+    // leaving any earlier file intact.
+    static bool Save(const std::string& path, const std::vector<std::string>& files,
+                     const std::vector<std::string>& directories, const std::vector<std::string>& registryKeys,
+                     const std::vector<std::string>& registryGroups, RegistryHive hive,
+                     const std::string& registryPath);
+
+    // "HKEY_LOCAL_MACHINE", "HKEY_CURRENT_USER", "HKEY_USERS", exactly.
+    static RegistryHive ParseHive(const std::string& text);
+    static std::string HiveName(RegistryHive hive);
+
+private:
+    enum Cursor {
+        kDiffFile,
+        kNewFile,
+        kDeletedFile,
+        kDeletedDirectory,
+        kNewDirectory,
+        kDeletedRegistryKey,
+        kNewRegistryKey,
+        kDeletedRegistryGroup,
+        kNewRegistryGroup,
+        kCursorCount,
+    };
+
+    bool Next(Cursor cursor, std::string& path, std::string* archive);
+
+    TiXmlDocument document;
+    const TiXmlElement* root = nullptr;
+    const TiXmlElement* cursors[kCursorCount] = {};
+    RegistryHive hive = RegistryHive::LocalMachine;
+    std::string registryPath;
+    int64_t spaceRequirement = -1;
+};

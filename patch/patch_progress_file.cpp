@@ -1,0 +1,113 @@
+#include "patch/patch_progress_file.h"
+
+#include <cerrno>
+#include <climits>
+#include <cstdlib>
+
+#include "patch/exception.h"
+#include "patch/file_operations.h"
+#include "patch/paths.h"
+#include "patch/xml_file.h"
+#include "text/log.h"
+
+namespace {
+
+const char kLoadFailure[] = "Failed to load PatchProgressFile file.";
+
+// The whole attribute must be a decimal number that fits: "12abc" is as
+// unreadable as "abc".
+bool ParseActionIndex(const char* text, int32_t& value) {
+    if (text == nullptr || *text == '\0') return false;
+    char* end = nullptr;
+    errno = 0;
+    const long number = std::strtol(text, &end, 10);
+    if (errno != 0 || *end != '\0' || number < INT32_MIN || number > INT32_MAX) return false;
+    value = static_cast<int32_t>(number);
+    return true;
+}
+
+// An element whose text is empty is printed as <X></X> and reads back with
+// no text node; that, like a missing element, is an empty value.
+std::string TextOrEmpty(const TiXmlElement* root, const char* name) {
+    std::string text;
+    ReadElementText(root, name, text);
+    return text;
+}
+
+}  // namespace
+
+void PatchProgressFile::SetDirectory(const std::string& directory) {
+    folder = directory;
+    recordPath = PathJoin(folder, "PPF.xml");
+    alternativeRecordPath = PathJoin(folder, "_PPF.xml");
+}
+
+void PatchProgressFile::LoadRecord(const std::string& path) {
+    TiXmlDocument document;
+    if (!LoadXmlFile(path, document)) throw Exception(kLoadFailure);
+    const TiXmlElement* root = document.RootElement();
+    const TiXmlElement* status = root->FirstChildElement("PatchStatus");
+    int32_t action = -1;
+    if (status == nullptr || !ParseActionIndex(status->Attribute("action"), action)) throw Exception(kLoadFailure);
+    const char* statusFile = status->Attribute("file");
+
+    patchPath = TextOrEmpty(root, "PatchPath");
+    patchedFilesPath = TextOrEmpty(root, "PatchedFilesPath");
+    patchUri = TextOrEmpty(root, "PatchURI");
+    actionIndex = action;
+    file = statusFile == nullptr ? std::string() : std::string(statusFile);
+    version = TextOrEmpty(root, "Version");
+}
+
+bool PatchProgressFile::TryLoad(const std::string& path) {
+    try {
+        LoadRecord(path);
+        return true;
+    } catch (const Exception&) {
+        return false;
+    }
+}
+
+bool PatchProgressFile::Recover() {
+    const bool recordExists = FileExists(recordPath);
+    const bool alternativeExists = FileExists(alternativeRecordPath);
+    const Exception unrecoverable("Unrecoverable interrupted batch, reinstall necessary.",
+                                  ErrorCode::ReinstallRequired);
+    if (recordExists) {
+        if (TryLoad(recordPath)) {
+            // A "_PPF.xml" beside a readable record is a write that did not
+            // reach its rename: the record it would have replaced is older
+            // but names an action that is safe to repeat.
+            if (alternativeExists) RemoveFile(alternativeRecordPath);
+            return true;
+        }
+        LOG(Error) << "Unreadable patch progress record: " << recordPath;
+        RemoveFile(recordPath);
+        if (!alternativeExists) throw unrecoverable;
+    }
+    if (alternativeExists) {
+        if (!TryLoad(alternativeRecordPath)) {
+            LOG(Error) << "Unreadable patch progress record: " << alternativeRecordPath;
+            RemoveFile(alternativeRecordPath);
+            throw unrecoverable;
+        }
+        RenameFile(alternativeRecordPath, recordPath);
+        return true;
+    }
+    return false;
+}
+
+bool PatchProgressFile::WriteRecord() {
+    TiXmlDocument document;
+    StartXmlDocument(document);
+    TiXmlNode* root = document.InsertEndChild(TiXmlElement("WestPatchStatus"));
+    AppendTextElement(root, "PatchPath", patchPath);
+    AppendTextElement(root, "PatchedFilesPath", patchedFilesPath);
+    AppendTextElement(root, "PatchURI", patchUri);
+    TiXmlElement status("PatchStatus");
+    status.SetAttribute("action", actionIndex);
+    status.SetAttribute("file", file);
+    root->InsertEndChild(status);
+    AppendTextElement(root, "Version", version);
+    return SaveXmlFile(document, recordPath, alternativeRecordPath);
+}

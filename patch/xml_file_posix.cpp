@@ -1,0 +1,3 @@
+#include "patch/xml_file.h"
+
+const char kXmlLineBreak[] = "\n";

@@ -1,0 +1,28 @@
+#pragma once
+
+#include <unistd.h>
+
+#include <cstdint>
+#include <cstdlib>
+#include <string>
+
+#include "patch/file_stream.h"
+#include "patch/paths.h"
+
+// A folder of this fuzzing process for the files the loaders read.
+inline const std::string& FuzzFolder() {
+    static const std::string folder = PathJoin(GetTempDirectory(), "ivl-fuzz-" + std::to_string(getpid()));
+    // Registered after the string exists, so it runs before the string goes.
+    static const bool made = MakeDirectories(folder) && std::atexit([] { DeleteDirectory(FuzzFolder(), true); }) == 0;
+    (void)made;
+    return folder;
+}
+
+// Writes the input to a file of that folder and returns its path.
+inline std::string WriteFuzzFile(const std::string& name, const uint8_t* data, size_t size) {
+    const std::string path = PathJoin(FuzzFolder(), name);
+    FileStream file;
+    file.Create(path);
+    if (size > 0) file.Write(data, static_cast<uint32_t>(size));
+    return path;
+}
