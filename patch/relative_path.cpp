@@ -9,7 +9,12 @@ bool IsContainedRelativePath(const std::string& path) {
     while (start <= path.size()) {
         size_t end = path.find_first_of("/\\", start);
         if (end == std::string::npos) end = path.size();
-        if (path.compare(start, end - start, "..") == 0) return false;
+        // ".." and, because Windows drops trailing dots and spaces from a
+        // name, anything made of dots and spaces only (".. ", "...").
+        const std::string component = path.substr(start, end - start);
+        if (!component.empty() && component.find_first_not_of(". ") == std::string::npos && component != ".") {
+            return false;
+        }
         start = end + 1;
     }
     return true;

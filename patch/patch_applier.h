@@ -1,0 +1,66 @@
+#pragma once
+
+#include <atomic>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+class HttpDownloader;
+class IStatusView;
+class PatchInfoFile;
+class PatchProgressFile;
+
+// Carries out one patch in two stages, so the installation is touched only
+// once everything it needs is on disk. PreparePatch builds every patched
+// and new file in the patched-files folder while the archives arrive;
+// ApplyPatch deletes, creates folders and moves the prepared files in,
+// recording each deletion and folder action beforehand so that a run cut
+// short at any moment is finished by the next one.
+class PatchApplier {
+public:
+    PatchApplier() = default;
+    PatchApplier(const PatchApplier&) = delete;
+    PatchApplier& operator=(const PatchApplier&) = delete;
+    virtual ~PatchApplier() = default;
+
+    // Keeps the arguments (none owned), clears a cancel request and counts
+    // the batch's items. The downloader may be null for a resumed batch.
+    void Init(PatchInfoFile* patchInfo, PatchProgressFile* progressFile, const std::string& installationFolder,
+              const std::string& patchedFilesFolder, const std::string& patchFolder, IStatusView* statusView,
+              HttpDownloader* downloader);
+    bool IsInitialised() const { return initialised; }
+
+    // Stage one. Throws Exception on every failure; the installation is
+    // not changed.
+    void PreparePatch();
+    // Stage two. Throws Exception when a prepared file cannot be moved and
+    // the user gives up.
+    void ApplyPatch();
+
+    // From the window's thread: stage one stops at its next check.
+    void RequestCancel() { cancelRequested = true; }
+
+private:
+    void CheckCancel() const;
+    void ReportProgress(const std::string& path) const;
+    void WaitForArchive(const std::string& archiveName) const;
+    bool ShouldApply(const std::string& path);
+    void MoveWithRetry(const std::string& source, const std::string& destination) const;
+    void CheckItemPaths();
+    void PrepareDiffFile(const std::string& path, const std::string& archive);
+    void PrepareNewFile(const std::string& path, const std::string& archive);
+    std::string DestinationOf(const std::string& preparedFile) const;
+
+    PatchInfoFile* patchInfo = nullptr;
+    PatchProgressFile* progressFile = nullptr;
+    std::string installationFolder;
+    std::string patchedFilesFolder;
+    std::string patchFolder;
+    IStatusView* statusView = nullptr;
+    HttpDownloader* downloader = nullptr;
+    int32_t filesDone = 0;
+    int32_t filesTotal = 0;
+    std::atomic<bool> cancelRequested{false};
+    int32_t actionCounter = 0;
+    bool initialised = false;
+};
