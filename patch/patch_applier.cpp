@@ -223,6 +223,11 @@ std::string PatchApplier::DestinationOf(const std::string& preparedFile) const {
 }
 
 void PatchApplier::MoveWithRetry(const std::string& source, const std::string& destination) const {
+    // A prepared file's folder normally exists by now (a "new" folder item,
+    // or an earlier file); when a description forgot it, make it rather
+    // than ask the player to fix what they cannot.
+    const std::string folder = GetParentDirectory(destination);
+    if (!folder.empty() && !FileExists(folder)) MakeDirectories(folder);
     while (!MoveFileReplacing(source, destination)) {
         MessageBoxRequest question;
         question.text = Localize("INSTALLER_FAILED_TO_MOVE_THE_FILE") + L"\n\n" + WidenFromCodePage(source) + L"\n\n" +

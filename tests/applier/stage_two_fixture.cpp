@@ -1,0 +1,142 @@
+#include "tests/applier/stage_two_fixture.h"
+
+#include <filesystem>
+#include <stdexcept>
+
+#include "patch/file_operations.h"
+#include "patch/patch_applier.h"
+#include "patch/patch_info_file.h"
+#include "patch/patch_progress_file.h"
+#include "patch/paths.h"
+#include "state/installation_data.h"
+#include "tests/support/test_files.h"
+
+namespace fs = std::filesystem;
+
+namespace {
+
+void Put(const std::string& root, const std::string& relative, const std::string& content) {
+    const std::string path = PathJoin(root, relative);
+    MakeDirectories(GetParentDirectory(path));
+    WriteTextFile(path, content);
+}
+
+const char kPatchInfo[] = R"(<?xml version="1.0" ?>
+<IronvaleWestPatch>
+    <FileChanges>
+        <delete Path="remove me.txt" />
+        <delete Path="sub\gone.dat" />
+        <delete Path="already gone.txt" />
+    </FileChanges>
+    <DirectoryChanges>
+        <delete Path="old" />
+        <delete Path="cfg" />
+        <new Path="cfg" />
+        <new Path="data" />
+        <new Path="data\nested deep" />
+    </DirectoryChanges>
+</IronvaleWestPatch>
+)";
+
+}  // namespace
+
+int StageTwoActionCount() { return 8; }
+
+bool RunStageTwo(const StageTwoBatch& batch, IStatusView* view) {
+    // The installed version says where a run stands: the old one before the
+    // batch, "-1" while it is under way, the new one once it is done.
+    InstallationData installed;
+    installed.Load(batch.installation);
+    if (installed.currentVersion == "2") {
+        // Stopped between storing the new version and removing the record:
+        // the batch is complete and the record a leftover.
+        RemoveFile(PathJoin(batch.installation, "PPF.xml"));
+        return true;
+    }
+    installed.currentVersion = "-1";
+    installed.Save();
+
+    PatchInfoFile info;
+    info.Load(batch.patchInfo);
+    PatchProgressFile progress;
+    progress.SetDirectory(batch.installation);
+    progress.resuming = progress.Recover();
+    if (!progress.resuming) {
+        // No record yet means no action was carried out yet.
+        progress.SetPatchPath(batch.patchFolder);
+        progress.SetPatchedFilesPath(batch.patchedFiles);
+        progress.SetActionIndex(-1);
+        progress.SetFile("");
+        progress.WriteRecord();
+    }
+    PatchApplier applier;
+    applier.Init(&info, &progress, batch.installation, batch.patchedFiles, batch.patchFolder, view, nullptr);
+    try {
+        applier.ApplyPatch();
+    } catch (const std::runtime_error&) {
+        return false;
+    }
+    installed.currentVersion = "2";
+    installed.Save();
+    RemoveFile(progress.GetRecordPath());
+    return true;
+}
+
+StageTwoBatch MakeStageTwoBatch(const std::string& root) {
+    StageTwoBatch batch;
+    batch.installation = PathJoin(root, "Ironvale");
+    batch.patchFolder = PathJoin(batch.installation, "tempPatch");
+    batch.patchedFiles = PathJoin(batch.patchFolder, "patched");
+    batch.patchInfo = PathJoin(batch.patchFolder, "patchinfo.xml");
+
+    const std::string& game = batch.installation;
+    Put(game, "game.exe", "old game");
+    Put(game, "remove me.txt", "x");
+    Put(game, "sub\\gone.dat", "y");
+    Put(game, "sub\\kept.dat", "kept");
+    Put(game, "old\\a.txt", "a");
+    Put(game, "old\\deeper\\b.txt", "b");
+    Put(game, "cfg\\stale.ini", "stale");
+    Put(game, "cfg\\user.ini", "old settings");
+
+    const std::string& prepared = batch.patchedFiles;
+    Put(prepared, "game.exe", "new game");
+    Put(prepared, "cfg\\user.ini", "new settings");
+    Put(prepared, "data\\nested deep\\level.bin", std::string("\0\1\2", 3));
+    Put(prepared, "data\\empty.txt", "");
+    Put(prepared, "readme.txt", "new readme");
+    WriteTextFile(batch.patchInfo, kPatchInfo);
+    WriteTextFile(PathJoin(game, "InstallationData.xml"),
+                  "<InstallationData><CurrentVersion>1</CurrentVersion><PatcherVersion>3</PatcherVersion>"
+                  "</InstallationData>");
+    return batch;
+}
+
+std::map<std::string, std::string> ListTree(const std::string& folder) {
+    std::map<std::string, std::string> tree;
+    for (auto it = fs::recursive_directory_iterator(folder); it != fs::recursive_directory_iterator(); ++it) {
+        const std::string relative = fs::relative(it->path(), folder).generic_string();
+        if (relative == "tempPatch" && it->is_directory()) {
+            it.disable_recursion_pending();
+            continue;
+        }
+        if (relative == "InstallationData.xml") continue;
+        tree[relative] = it->is_directory() ? "<dir>" : ReadTextFile(it->path().string());
+    }
+    return tree;
+}
+
+std::map<std::string, std::string> ExpectedTree() {
+    return {
+        {"game.exe", "new game"},
+        {"sub", "<dir>"},
+        {"sub/kept.dat", "kept"},
+        {"cfg", "<dir>"},
+        {"cfg/user.ini", "new settings"},
+        {"data", "<dir>"},
+        {"data/empty.txt", ""},
+        {"data/nested deep", "<dir>"},
+        {"data/nested deep/level.bin", std::string("\0\1\2", 3)},
+        {"readme.txt", "new readme"},
+    };
+}
