@@ -129,14 +129,7 @@ RegistryHive PatchInfoFile::ParseHive(const std::string& text) {
 }
 
 std::string PatchInfoFile::HiveName(RegistryHive hive) {
-    switch (hive) {
-        case RegistryHive::LocalMachine:
-            return "HKEY_LOCAL_MACHINE";
-        case RegistryHive::CurrentUser:
-            return "HKEY_CURRENT_USER";
-        case RegistryHive::Users:
-            return "HKEY_USERS";
-        default:
-            throw Exception("Hive not supported");
-    }
+    const std::string name = RegistryHiveName(hive);
+    if (name.empty()) throw Exception("Hive not supported");
+    return name;
 }

@@ -18,19 +18,6 @@ std::string TrimBlanks(const std::string& text) {
 
 }  // namespace
 
-const char* HiveFolderName(RegistryHive hive) {
-    switch (hive) {
-        case RegistryHive::LocalMachine:
-            return "HKEY_LOCAL_MACHINE";
-        case RegistryHive::CurrentUser:
-            return "HKEY_CURRENT_USER";
-        case RegistryHive::Users:
-            return "HKEY_USERS";
-        case RegistryHive::None:
-            break;
-    }
-    return "";
-}
 
 RegistryManager::RegistryManager(RegistryHive root, const std::string& path) : hive(root), keyPath(path) {}
 

@@ -40,8 +40,6 @@ private:
     std::string keyPath;
 };
 
-// "HKEY_LOCAL_MACHINE", "HKEY_CURRENT_USER", "HKEY_USERS"; empty for None.
-const char* HiveFolderName(RegistryHive hive);
 
 // The platform's registry, narrowed to what the manager needs. Key paths
 // are backslash-separated, value names and key names ignore case.

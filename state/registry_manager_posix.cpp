@@ -107,7 +107,7 @@ bool FindChild(const std::string& parent, const std::string& folderName, std::st
 // The folder of hive\keyPath; with create, missing keys are made.
 bool KeyFolder(RegistryHive hive, const std::string& keyPath, bool create, std::string& folder) {
     const std::string root = StoreRoot();
-    const std::string hiveName = HiveFolderName(hive);
+    const std::string hiveName = RegistryHiveName(hive);
     if (root.empty() || hiveName.empty()) return false;
     folder = PathJoin(root, hiveName);
     if (create && !MakeDirectories(folder)) return false;
