@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include <ostream>
+
 #include <functional>
 
 #include "tests/applier/batch_fixture.h"
@@ -98,6 +100,9 @@ const BatchCase kCases[] = {
      },
      ByFirstLetter},
 };
+
+// Failures name the case, not its bytes.
+void PrintTo(const BatchCase& value, std::ostream* out) { *out << value.name; }
 
 class BatchTest : public ::testing::TestWithParam<BatchCase> {};
 

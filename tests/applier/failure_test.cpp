@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include <ostream>
+
 #include <cstdio>
 
 #include "patch/exception.h"
@@ -139,6 +141,9 @@ const HostileItem kHostileItems[] = {
     {"NewFolderEscapes", {"DirectoryChanges", "new", "..\\elsewhere", ""}},
     {"EmptyPath", {"DirectoryChanges", "delete", "", ""}},
 };
+
+// Failures name the case, not its bytes.
+void PrintTo(const HostileItem& value, std::ostream* out) { *out << value.name; }
 
 class HostileDescription : public ::testing::TestWithParam<HostileItem> {};
 
