@@ -77,7 +77,8 @@ TEST(DownloadOverlap, EachArchiveIsPreparedWhileTheNextOneDownloads) {
     for (const std::string& event : events) order += event + "; ";
     for (int k = 1; k <= 2; ++k) {
         const std::string next = std::to_string(k + 1);
-        EXPECT_LT(timeline.IndexOf("done archive" + std::to_string(k) + ".dat"), timeline.IndexOf("apply k" + next + ".dat"))
+        EXPECT_LT(timeline.IndexOf("done archive" + std::to_string(k) + ".dat"),
+                  timeline.IndexOf("done archive" + next + ".dat"))
             << order;
         EXPECT_LT(timeline.IndexOf("apply k" + next + ".dat"), timeline.IndexOf("done archive" + next + ".dat"))
             << order;
