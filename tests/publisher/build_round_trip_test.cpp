@@ -70,6 +70,35 @@ TEST(CompleteBuild, AppliedToAnEmptyFolderGivesTheTree) {
     }
 }
 
+// The round trips above are only worth something if verify sees a wrong
+// result: compare a build's result with trees that differ from it.
+TEST(Verify, ListsEveryDifferenceFromTheExpectedTree) {
+    TempFolder temp;
+    for (const char* folder : {"game/data/maps", "game/docs", "empty"}) std::filesystem::create_directories(temp / folder);
+    WriteTextFile(temp / "game/data/maps/a.map", "map a");
+    WriteTextFile(temp / "game/docs/readme.txt", "read me");
+    WriteTextFile(temp / "game/top.txt", "top");
+    BuildOptions options;
+    options.toDir = temp / "game";
+    options.version = "4";
+    options.outDir = temp / "out";
+    const std::string build = BuildPatch(options);
+    ASSERT_EQ("", JoinLines(VerifyPatch(build, temp / "empty", temp / "game")));
+
+    std::filesystem::copy(temp / "game", temp / "other", std::filesystem::copy_options::recursive);
+    WriteTextFile(temp / "other/top.txt", "tip");
+    std::filesystem::remove_all(temp / "other/docs");
+    std::filesystem::create_directories(temp / "other/saves");
+    WriteTextFile(temp / "other/data/extra.pak", "x");
+    EXPECT_EQ(
+        "missing folder: saves\n"
+        "unexpected folder: docs\n"
+        "missing file: data\\extra.pak\n"
+        "different content: top.txt\n"
+        "unexpected file: docs\\readme.txt\n",
+        JoinLines(VerifyPatch(build, temp / "empty", temp / "other")));
+}
+
 TEST(Determinism, TwoBuildsOfTheSameInputAreIdentical) {
     const bool patches = CanRunXdelta3();
     TempFolder temp;
