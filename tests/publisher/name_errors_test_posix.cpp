@@ -10,6 +10,24 @@
 
 namespace {
 
+// (Windows itself refuses folder paths this long to the tool's file calls.)
+TEST(BuildErrors, PathsLongerThanAnArchiveNameAreRefused) {
+    TempFolder temp;
+    std::string relative = std::string(60, 'd');
+    while (relative.size() < 256) relative += "/" + std::string(60, 'd');
+    std::filesystem::create_directories(temp / ("tree/" + relative));
+    BuildOptions options;
+    options.toDir = temp / "tree";
+    options.version = "2";
+    options.outDir = temp / "out";
+    try {
+        BuildPatch(options);
+        ADD_FAILURE() << "no exception";
+    } catch (const Exception& error) {
+        EXPECT_NE(std::string::npos, error.message.find("longer than 255 bytes")) << error.message;
+    }
+}
+
 TEST(BuildErrors, NamesWindowsCannotHoldAreRefused) {
     const struct {
         const char* name;
