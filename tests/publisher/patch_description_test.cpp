@@ -132,20 +132,22 @@ TEST(BuildErrors, UnusableInputsFailClearlyAndLeaveNothing) {
     WriteTextFile(PathJoin(temp / "tree", "a.txt"), "a");
     struct Case {
         const char* what;
-        std::string from, to, version, xdelta3, expected;
+        std::string from, to, version, xdelta3, expected, out;
     } cases[] = {
-        {"missing old tree", temp / "nowhere", temp / "tree", "2", "xdelta3", "Not a readable folder"},
-        {"missing new tree", "", temp / "nowhere", "2", "xdelta3", "Not a readable folder"},
-        {"missing xdelta3", temp / "tree", temp / "tree", "2", "no-such-xdelta3-here", "xdelta3"},
-        {"version with a space", "", temp / "tree", "2 beta", "xdelta3", "Not a usable version"},
-        {"version with a slash", "", temp / "tree", "../2", "xdelta3", "Not a usable version"},
+        {"missing old tree", temp / "nowhere", temp / "tree", "2", "xdelta3", "Not a readable folder", ""},
+        {"missing new tree", "", temp / "nowhere", "2", "xdelta3", "Not a readable folder", ""},
+        {"missing xdelta3", temp / "tree", temp / "tree", "2", "no-such-xdelta3-here", "xdelta3", ""},
+        {"version with a space", "", temp / "tree", "2 beta", "xdelta3", "Not a usable version", ""},
+        {"version with a slash", "", temp / "tree", "../2", "xdelta3", "Not a usable version", ""},
+        {"output inside the new tree", "", temp / "tree", "2", "xdelta3", "lies inside the game tree",
+         temp / "tree/sub"},
     };
     for (const Case& test : cases) {
         BuildOptions options;
         options.fromDir = test.from;
         options.toDir = test.to;
         options.version = test.version;
-        options.outDir = temp / "out";
+        options.outDir = test.out.empty() ? temp / "out" : test.out;
         options.xdelta3 = test.xdelta3;
         try {
             BuildPatch(options);

@@ -164,6 +164,21 @@ void BuildInto(const BuildOptions& options, const std::string& folder, const std
     description.spaceRequirement = archivesSize + filesSize + largestDelta;
 }
 
+// A patch written into the tree it describes would list its own archives.
+void CheckOutsideTree(const std::string& outDir, const std::string& tree) {
+    if (tree.empty()) return;
+    std::error_code error;
+    const auto out = std::filesystem::weakly_canonical(ToFileSystemPath(outDir), error);
+    const auto root = std::filesystem::weakly_canonical(ToFileSystemPath(tree), error);
+    if (error) return;  // ListTree reports an unreadable tree
+    auto outPart = out.begin();
+    for (auto rootPart = root.begin(); rootPart != root.end(); ++rootPart, ++outPart) {
+        if (rootPart->empty()) break;  // a trailing separator
+        if (outPart == out.end() || *outPart != *rootPart) return;
+    }
+    throw Exception("The output folder " + outDir + " lies inside the game tree " + tree);
+}
+
 }  // namespace
 
 std::string PatchFolderName(const std::string& version) { return kPatchBase + version; }
@@ -181,6 +196,8 @@ void CheckVersionText(const std::string& version) {
 std::string BuildPatch(const BuildOptions& options) {
     CheckVersionText(options.version);
     if (options.maxArchiveSize <= 0) throw Exception("The maximum archive size must be positive.");
+    CheckOutsideTree(options.outDir, options.fromDir);
+    CheckOutsideTree(options.outDir, options.toDir);
     const bool complete = options.fromDir.empty();
     const std::string name = complete ? BuildFolderName(options.version) : PatchFolderName(options.version);
     const std::string finalFolder = PathJoin(options.outDir, name);
