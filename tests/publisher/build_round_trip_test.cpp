@@ -49,9 +49,8 @@ TEST_P(RoundTrip, PatchTurnsOldTreeIntoNewTree) {
 
 // Small archive limits split the members over many archives.
 INSTANTIATE_TEST_SUITE_P(Seeds, RoundTrip,
-                         testing::Values(RoundTripCase{1, 64 << 20}, RoundTripCase{2, 64 << 20},
-                                         RoundTripCase{3, 4096}, RoundTripCase{4, 1},
-                                         RoundTripCase{5, 64 << 20}, RoundTripCase{6, 20000}));
+                         testing::Values(RoundTripCase{1, 64 << 20}, RoundTripCase{2, 64 << 20}, RoundTripCase{3, 4096},
+                                         RoundTripCase{4, 1}, RoundTripCase{5, 64 << 20}, RoundTripCase{6, 20000}));
 
 TEST(CompleteBuild, AppliedToAnEmptyFolderGivesTheTree) {
     for (uint32_t seed : {11u, 12u}) {
@@ -74,7 +73,8 @@ TEST(CompleteBuild, AppliedToAnEmptyFolderGivesTheTree) {
 // result: compare a build's result with trees that differ from it.
 TEST(Verify, ListsEveryDifferenceFromTheExpectedTree) {
     TempFolder temp;
-    for (const char* folder : {"game/data/maps", "game/docs", "empty"}) std::filesystem::create_directories(temp / folder);
+    for (const char* folder : {"game/data/maps", "game/docs", "empty"})
+        std::filesystem::create_directories(temp / folder);
     WriteTextFile(temp / "game/data/maps/a.map", "map a");
     WriteTextFile(temp / "game/docs/readme.txt", "read me");
     WriteTextFile(temp / "game/top.txt", "top");

@@ -116,9 +116,9 @@ TEST(PatchDescription, CompleteBuildHoldsEveryFileAndFolderInOneArchive) {
     PatchInfoFile info;
     const ReadBack items = Read(build, info);
     EXPECT_TRUE(items.diff.empty());
-    EXPECT_EQ((Items{"data\\extra.pak", "data\\level.pak", "game.exe", "maps\\north\\map.dat", "notes.txt",
-                     "same.txt"}),
-              items.added);
+    EXPECT_EQ(
+        (Items{"data\\extra.pak", "data\\level.pak", "game.exe", "maps\\north\\map.dat", "notes.txt", "same.txt"}),
+        items.added);
     EXPECT_EQ(Items(6, "patch0.lzma"), items.addedArchives);
     EXPECT_EQ((Items{"data", "maps", "maps\\north", "saves"}), items.newFolders);
     EXPECT_TRUE(items.deleted.empty() && items.deletedFolders.empty());

@@ -44,8 +44,10 @@ std::string Edit(std::string content, std::mt19937& random) {
                 content.erase(at, random() % 100);
                 break;
             default:
-                if (!content.empty()) content[at] = static_cast<char>(content[at] + 1);
-                else content = "x";
+                if (!content.empty())
+                    content[at] = static_cast<char>(content[at] + 1);
+                else
+                    content = "x";
         }
     }
     return content;

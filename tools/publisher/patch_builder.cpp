@@ -186,9 +186,8 @@ std::string PatchFolderName(const std::string& version) { return kPatchBase + ve
 std::string BuildFolderName(const std::string& version) { return "build_" + version; }
 
 void CheckVersionText(const std::string& version) {
-    if (version.empty() || version.size() > 64 ||
-        version.find_first_of(" \t\r\n\\/:*?\"<>|") != std::string::npos || version == "." || version == ".." ||
-        version == "-1") {
+    if (version.empty() || version.size() > 64 || version.find_first_of(" \t\r\n\\/:*?\"<>|") != std::string::npos ||
+        version == "." || version == ".." || version == "-1") {
         throw Exception("Not a usable version text: \"" + version + "\"");
     }
 }

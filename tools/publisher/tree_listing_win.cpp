@@ -22,4 +22,6 @@ std::string NarrowEntryName(const std::filesystem::path& name, const std::string
     return narrow;
 }
 
-std::filesystem::path ToFileSystemPath(const std::string& path) { return std::filesystem::path(WidenFromCodePage(path)); }
+std::filesystem::path ToFileSystemPath(const std::string& path) {
+    return std::filesystem::path(WidenFromCodePage(path));
+}
