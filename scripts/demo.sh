@@ -1,11 +1,52 @@
 #!/usr/bin/env bash
-# Builds what is missing and runs the updater once with a sample command
-# line: the Windows program under Wine when Wine is installed, the native
-# build otherwise. Prints the log the run wrote.
+# Builds what is missing, makes a sample game of version 1 and 2 with the
+# version file, the patch from 1 to 2 and the complete build of 2 (with the
+# publisher's ironvale-patch), prints the patch description and checks the
+# patch with the updater's own applier. Then runs the updater once with a
+# sample command line: the Windows program under Wine when Wine is
+# installed, the native build otherwise, and prints the log the run wrote.
 set -euo pipefail
 root=$(cd "$(dirname "$0")/.." && pwd)
 cd "$root"
 command -v cmake >/dev/null && [ -e /usr/include/tinyxml.h ] || bash scripts/setup.sh
+
+echo "== building the publisher's tool"
+cmake --preset native >/dev/null
+cmake --build --preset native --target ironvale-patch -j2 >/dev/null
+tool=$root/build/native/tools/ironvale-patch
+
+demo=$root/build/demo
+echo "== making a sample game of version 1 and 2 in $demo"
+rm -rf "$demo"
+mkdir -p "$demo/v1/data/levels" "$demo/v1/data/old_voices" "$demo/v1/docs"
+head -c 200000 /dev/urandom >"$demo/v1/Ironvale.exe"
+for i in 1 2 3; do seq 1 4000 | sed "s/^/level $i row /" >"$demo/v1/data/levels/level$i.map"; done
+echo "hello" >"$demo/v1/data/old_voices/hello.ogg"
+echo "Ironvale version 1" >"$demo/v1/docs/readme.txt"
+echo "removed in 2" >"$demo/v1/docs/changes_1.txt"
+cp -r "$demo/v1" "$demo/v2"
+# Version 2: an edited program and level, a new level in a new folder, a
+# new empty folder, a removed file and a removed folder.
+printf 'patched bytes' | dd of="$demo/v2/Ironvale.exe" bs=1 seek=1000 conv=notrunc 2>/dev/null
+sed -i 's/level 2 row 17$/level 2 row 17 (fixed)/' "$demo/v2/data/levels/level2.map"
+mkdir -p "$demo/v2/data/levels/north" "$demo/v2/saves"
+seq 1 3000 | sed 's/^/north row /' >"$demo/v2/data/levels/north/level4.map"
+echo "Ironvale version 2" >"$demo/v2/docs/readme.txt"
+rm -r "$demo/v2/data/old_voices" "$demo/v2/docs/changes_1.txt"
+
+echo "== ironvale-patch version, build (patch), build --complete"
+"$tool" version --out "$demo/server" 2
+"$tool" build --from "$demo/v1" --to "$demo/v2" --version 2 --out "$demo/server" --max-archive-size 100000
+"$tool" build --complete --to "$demo/v2" --version 2 --out "$demo/server"
+echo "== $demo/server"
+(cd "$demo/server" && find . -type f | sort | xargs ls -l | awk '{print $5, $9}')
+echo "== patch_515195_2/patchinfo.xml"
+cat "$demo/server/patch_515195_2/patchinfo.xml"
+echo "== ironvale-patch verify (the patch on version 1, the complete build on an empty folder)"
+mkdir -p "$demo/empty"
+"$tool" verify "$demo/server/patch_515195_2" "$demo/v1" "$demo/v2"
+"$tool" verify "$demo/server/build_2" "$demo/empty" "$demo/v2"
+
 sample=(-latestVersion 2 -hostname demo.ironvale.test -serverDeltaTime 5)
 
 if [ -x /usr/lib/wine/wine64 ] && command -v x86_64-w64-mingw32-g++-posix >/dev/null; then

@@ -1,6 +1,7 @@
 #include "tools/publisher/archive_writer.h"
 
 #include <algorithm>
+#include <vector>
 
 #include "patch/exception.h"
 
@@ -54,6 +55,19 @@ void ArchiveWriter::AddMember(const std::string& name, FileStream& source, const
 void ArchiveWriter::AddStoredMember(const std::string& name, const std::string& data) {
     WriteHeader(name, data.size());
     WriteBytes(data.data(), data.size());
+}
+
+void ArchiveWriter::AddStoredMember(const std::string& name, FileStream& data) {
+    const int64_t length = data.GetLength();
+    data.Seek(0, 0);
+    WriteHeader(name, static_cast<uint64_t>(length));
+    std::vector<uint8_t> buffer(1 << 16);
+    for (int64_t left = length; left > 0;) {
+        const uint32_t read = data.Read(buffer.data(), static_cast<uint32_t>(std::min<int64_t>(left, buffer.size())));
+        if (read == 0) throw Exception("Failed to read data from file.");
+        WriteBytes(buffer.data(), read);
+        left -= read;
+    }
 }
 
 void ArchiveWriter::Close() { archive.Close(); }

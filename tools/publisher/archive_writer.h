@@ -23,6 +23,11 @@ public:
     // Stores already compressed data (a stand-alone LZMA stream, or
     // anything at all for tests of broken archives) as the member.
     void AddStoredMember(const std::string& name, const std::string& data);
+    // The same for data held in a file (its whole content), copied in
+    // pieces so a large member never sits in memory.
+    void AddStoredMember(const std::string& name, FileStream& data);
+    // Bytes written so far.
+    int64_t Size() const { return position; }
     void Close();
 
 private:

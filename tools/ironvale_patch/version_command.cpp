@@ -1,0 +1,26 @@
+// ironvale-patch version: the latest-version file the updater reads first.
+#include <string>
+#include <vector>
+
+#include "patch/atomic_file.h"
+#include "patch/exception.h"
+#include "patch/paths.h"
+#include "tools/ironvale_patch/command.h"
+#include "tools/publisher/patch_builder.h"
+
+namespace {
+
+const char kUsage[] = "version --out DIR V";
+
+int Run(const std::vector<std::string>& args) {
+    if (args.size() != 3 || args[0] != "--out") return UsageError(kUsage);
+    CheckVersionText(args[2]);
+    if (!MakeDirectories(args[1])) throw Exception("Cannot create " + args[1]);
+    const std::string path = PathJoin(args[1], "version.txt");
+    if (!ReplaceFileAtomically(path, args[2] + "\n")) throw Exception("Failed to write " + path);
+    return 0;
+}
+
+const CommandRegistration registration("version", kUsage, Run);
+
+}  // namespace
