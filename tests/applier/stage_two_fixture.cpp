@@ -3,6 +3,7 @@
 #include <filesystem>
 #include <stdexcept>
 
+#include "patch/exception.h"
 #include "patch/file_operations.h"
 #include "patch/patch_applier.h"
 #include "patch/patch_info_file.h"
@@ -60,7 +61,14 @@ bool RunStageTwo(const StageTwoBatch& batch, IStatusView* view) {
     info.Load(batch.patchInfo);
     PatchProgressFile progress;
     progress.SetDirectory(batch.installation);
-    progress.resuming = progress.Recover();
+    try {
+        progress.resuming = progress.Recover();
+    } catch (const Exception& error) {
+        // Only a record cut short while it was first written is unreadable:
+        // no action had been carried out, so the batch starts afresh here
+        // (the updater reinstalls the complete build instead).
+        if (error.Code() != ErrorCode::ReinstallRequired) throw;
+    }
     if (!progress.resuming) {
         // No record yet means no action was carried out yet.
         progress.SetPatchPath(batch.patchFolder);
