@@ -1,6 +1,5 @@
 #include "tests/applier/stage_two_fixture.h"
 
-#include <filesystem>
 #include <stdexcept>
 
 #include "patch/exception.h"
@@ -10,9 +9,8 @@
 #include "patch/patch_progress_file.h"
 #include "patch/paths.h"
 #include "state/installation_data.h"
+#include "tests/applier/batch_fixture.h"
 #include "tests/support/test_files.h"
-
-namespace fs = std::filesystem;
 
 namespace {
 
@@ -121,15 +119,18 @@ StageTwoBatch MakeStageTwoBatch(const std::string& root) {
 }
 
 std::map<std::string, std::string> ListTree(const std::string& folder) {
+    // The updater's own work folder and version record are not part of the
+    // game's files.
+    const Tree read = ReadTree(folder);
     std::map<std::string, std::string> tree;
-    for (auto it = fs::recursive_directory_iterator(folder); it != fs::recursive_directory_iterator(); ++it) {
-        const std::string relative = fs::relative(it->path(), folder).generic_string();
-        if (relative == "tempPatch" && it->is_directory()) {
-            it.disable_recursion_pending();
-            continue;
-        }
-        if (relative == "InstallationData.xml") continue;
-        tree[relative] = it->is_directory() ? "<dir>" : ReadTextFile(it->path().string());
+    const auto isOwn = [](const std::string& path) {
+        return path == "InstallationData.xml" || path == "tempPatch" || path.rfind("tempPatch/", 0) == 0;
+    };
+    for (const std::string& path : read.folders) {
+        if (!isOwn(path)) tree[path] = "<dir>";
+    }
+    for (const auto& file : read.files) {
+        if (!isOwn(file.first)) tree[file.first] = file.second;
     }
     return tree;
 }

@@ -29,7 +29,8 @@ bool RunStageTwo(const StageTwoBatch& batch, IStatusView* view);
 int StageTwoActionCount();
 
 // Relative path (with '/') to content of every file, and "<dir>" for every
-// folder, below folder, leaving out the names in ignore.
+// folder, below folder, leaving out the updater's tempPatch folder and its
+// InstallationData.xml.
 std::map<std::string, std::string> ListTree(const std::string& folder);
 
 // The installation as the finished batch leaves it (without tempPatch).

@@ -8,15 +8,9 @@ set -euo pipefail
 program=$(realpath "$1")
 holder_exe=$(realpath "$2")
 answer_exe=$(realpath "$3")
-here=$(cd "$(dirname "$0")" && pwd)
-root=$(cd "$here/../.." && pwd)
-source "$here/log_format.sh"
-run="$root/scripts/wine-run.sh"
-
+source "$(dirname "$0")/wine_session.sh"
 # The prefix is shared with the other start-up test, which expects English:
 # every value set here is removed again on the way out.
-export WINEPREFIX="$(dirname "$program")/wineprefix"
-"$run" "$holder_exe" 0 >/dev/null 2>&1 || true
 user_key='HKCU\Software\Halvard\Ironvale'
 sid='S-1-5-21-4242-4242-4242-1001'
 sid_key="HKU\\$sid"
@@ -33,11 +27,7 @@ table_text() {  # KEY COLUMN
   awk -F'\t' -v key="$1" -v column="$2" '$1 == key { print $column }' "$root/resources/strings.tsv"
 }
 
-display=:$((90 + RANDOM % 100))
-Xvfb "$display" -screen 0 1024x768x24 -nolisten tcp >/dev/null 2>&1 &
-xvfb=$!
-export DISPLAY=$display
-sleep 1
+start_display
 
 # second_start LANGUAGE COLUMN [ARGS...]: starts the updater while another
 # process holds the single-instance guard and checks the box it shows.

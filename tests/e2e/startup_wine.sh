@@ -5,24 +5,9 @@ set -euo pipefail
 program=$(realpath "$1")
 holder_exe=$(realpath "$2")
 answer_exe=$(realpath "$3")
-here=$(cd "$(dirname "$0")" && pwd)
-root=$(cd "$here/../.." && pwd)
-source "$here/log_format.sh"
-run="$root/scripts/wine-run.sh"
-
-# One prefix per build folder, created by the wrapper on first use.
-export WINEPREFIX="$(dirname "$program")/wineprefix"
-"$run" "$holder_exe" 0 >/dev/null 2>&1 || true
-log="$WINEPREFIX/drive_c/users/$(id -un)/Temp/IronvaleUpdater.log"
-[ -d "$(dirname "$log")" ] || log="$WINEPREFIX/drive_c/users/$(id -un)/AppData/Local/Temp/IronvaleUpdater.log"
-
-# Message boxes need a display.
-display=:$((90 + RANDOM % 100))
-Xvfb "$display" -screen 0 1024x768x24 -nolisten tcp >/dev/null 2>&1 &
-xvfb=$!
+source "$(dirname "$0")/wine_session.sh"
+start_display
 trap 'kill $xvfb 2>/dev/null || true' EXIT
-export DISPLAY=$display
-sleep 1
 
 set +e
 "$run" "$program" -serverDeltaTime -3.7 -hostname "test host"
