@@ -5,11 +5,11 @@
 #include "app/single_instance.h"
 #include "app/updater.h"
 #include "app/updater_arguments.h"
-#include "patch/exception.h"
+#include "base/exception.h"
 #include "state/configuration.h"
 #include "state/registry_manager.h"
 #include "text/localization.h"
-#include "text/log.h"
+#include "base/log.h"
 #include "ui/message_box.h"
 
 const char* const kLogFileName = "IronvaleUpdater.log";

@@ -4,7 +4,7 @@
 #include <sys/file.h>
 #include <unistd.h>
 
-#include "patch/paths.h"
+#include "base/paths.h"
 
 const char* const kInstanceName = "IronvaleUpdater";
 

@@ -1,6 +1,6 @@
 #include "app/updater.h"
 
-#include "text/log.h"
+#include "base/log.h"
 
 Updater::Updater() { configuration.SetDefaults(); }
 

@@ -6,22 +6,11 @@
 #include <vector>
 
 #include "app/command_line.h"
+#include "base/string_helpers.h"
 
 const char* const kDefaultHostName = "updates.ironvale-game.com";
 
 namespace {
-
-bool EqualsIgnoringCase(const std::string& a, const char* b) {
-    size_t i = 0;
-    for (; i < a.size() && b[i] != '\0'; ++i) {
-        char x = a[i];
-        char y = b[i];
-        if (x >= 'A' && x <= 'Z') x = static_cast<char>(x - 'A' + 'a');
-        if (y >= 'A' && y <= 'Z') y = static_cast<char>(y - 'A' + 'a');
-        if (x != y) return false;
-    }
-    return i == a.size() && b[i] == '\0';
-}
 
 // Stream extraction of a single-precision number, truncated toward zero.
 // Values outside the 32-bit range saturate instead of overflowing.

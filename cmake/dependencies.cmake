@@ -1,7 +1,14 @@
 # Third-party code is installed by scripts/setup.sh and built or linked here;
 # none of it lives in the repository.
 
-set(IRONVALE_DEPS_DIR "/opt/ironvale-deps" CACHE PATH "Sources unpacked by scripts/setup.sh")
+# The same folder scripts/setup.sh unpacks into: IRONVALE_DEPS_DIR from the
+# environment, else its default.
+if(DEFINED ENV{IRONVALE_DEPS_DIR} AND NOT "$ENV{IRONVALE_DEPS_DIR}" STREQUAL "")
+  set(deps_dir_default "$ENV{IRONVALE_DEPS_DIR}")
+else()
+  set(deps_dir_default "/opt/ironvale-deps")
+endif()
+set(IRONVALE_DEPS_DIR "${deps_dir_default}" CACHE PATH "Sources unpacked by scripts/setup.sh")
 set(IRONVALE_LZMA_SDK_DIR "/usr/include/lzma" CACHE PATH "LZMA SDK C sources (Debian lzma-dev)")
 
 # LZMA SDK: the decoder goes into the program, the encoder into the tools

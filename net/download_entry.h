@@ -2,8 +2,10 @@
 
 #include <atomic>
 #include <cstdint>
+#include <list>
 #include <string>
 #include <utility>
+#include <vector>
 
 enum class DownloadStatus : int32_t {
     Pending = 0,      // not finished; also an HTTP transfer whose read failed part-way
@@ -33,3 +35,8 @@ struct DownloadEntry {
     std::string localPath;
     std::atomic<DownloadStatus> status{DownloadStatus::Pending};
 };
+
+// One entry per name, in order: fetched from the location joined with the
+// name (JoinLocation), saved in folder under the same name.
+std::list<DownloadEntry> MakeDownloadList(const std::vector<std::string>& names, const std::string& location,
+                                          const std::string& folder);

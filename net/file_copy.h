@@ -5,7 +5,7 @@
 #include <functional>
 #include <string>
 
-#include "app/status_interfaces.h"
+#include "base/status_interfaces.h"
 #include "net/download_entry.h"
 
 // Copies the file a file:// address, UNC path or resolved relative path

@@ -2,8 +2,8 @@
 #include <vector>
 
 #include "net/file_copy.h"
-#include "patch/exception.h"
-#include "patch/file_stream.h"
+#include "base/exception.h"
+#include "base/file_stream.h"
 
 namespace {
 

@@ -6,9 +6,9 @@
 #include "net/http_transfer.h"
 #include "net/location.h"
 #include "net/sign_url.h"
-#include "patch/exception.h"
-#include "patch/paths.h"
-#include "text/log.h"
+#include "base/exception.h"
+#include "base/paths.h"
+#include "base/log.h"
 
 HttpDownloader::~HttpDownloader() {
     RequestStop();
@@ -78,6 +78,17 @@ DownloadStatus HttpDownloader::WaitForFile(const std::string& fileName) {
         // The worker signals after each file and once more after it has
         // ended; a stop request signals too.
         wakeEvent.Wait();
+    }
+}
+
+ArchiveState HttpDownloader::WaitForArchive(const std::string& fileName) {
+    switch (WaitForFile(fileName)) {
+        case DownloadStatus::Done:
+            return ArchiveState::Arrived;
+        case DownloadStatus::Cancelled:
+            return ArchiveState::Cancelled;
+        default:
+            return ArchiveState::Failed;
     }
 }
 

@@ -7,7 +7,8 @@
 #include <string>
 #include <thread>
 
-#include "app/status_interfaces.h"
+#include "base/archive_source.h"
+#include "base/status_interfaces.h"
 #include "net/auto_reset_event.h"
 #include "net/download_entry.h"
 
@@ -15,7 +16,7 @@
 // caller can work on each file as soon as it has arrived. A location is an
 // "http://" address, a "file://" address, a UNC path or a path relative to
 // the program's folder. The first file that does not arrive ends the list.
-class HttpDownloader {
+class HttpDownloader : public IArchiveSource {
 public:
     HttpDownloader() = default;
     HttpDownloader(const HttpDownloader&) = delete;
@@ -37,6 +38,8 @@ public:
     // has ended; a stop gives Cancelled. Throws "HttpDownloader not started."
     // before the first Start.
     DownloadStatus WaitForFile(const std::string& fileName);
+    // WaitForFile as the patch applier sees it.
+    ArchiveState WaitForArchive(const std::string& fileName) override;
 
     // Ends the transfer in progress and the rest of the list, and wakes a
     // caller blocked in WaitForFile. Safe from any thread.

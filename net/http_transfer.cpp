@@ -3,8 +3,8 @@
 #include <cstdio>
 
 #include "net/http_transport.h"
-#include "patch/exception.h"
-#include "patch/file_stream.h"
+#include "base/exception.h"
+#include "base/file_stream.h"
 
 namespace {
 

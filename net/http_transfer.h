@@ -3,7 +3,7 @@
 #include <atomic>
 #include <string>
 
-#include "app/status_interfaces.h"
+#include "base/status_interfaces.h"
 #include "net/download_entry.h"
 
 // Fetches address into localPath over HTTP, reporting progress after every

@@ -1,21 +1,7 @@
 #include "net/location.h"
 
-#include "patch/paths.h"
-
-namespace {
-
-bool StartsWithIgnoringCase(const std::string& text, const char* prefix) {
-    size_t i = 0;
-    for (; prefix[i] != '\0'; ++i) {
-        if (i >= text.size()) return false;
-        char c = text[i];
-        if (c >= 'A' && c <= 'Z') c = static_cast<char>(c - 'A' + 'a');
-        if (c != prefix[i]) return false;
-    }
-    return true;
-}
-
-}  // namespace
+#include "base/paths.h"
+#include "base/string_helpers.h"
 
 std::string JoinLocation(const std::string& base, const std::string& tail) {
     if (StartsWithIgnoringCase(base, "http://")) return PathJoin(base, tail, '/');

@@ -3,8 +3,8 @@
 #include <algorithm>
 #include <string>
 
-#include "patch/exception.h"
-#include "patch/stream_readers.h"
+#include "base/exception.h"
+#include "base/stream_readers.h"
 
 namespace {
 

@@ -4,7 +4,7 @@
 #include <memory>
 #include <vector>
 
-#include "patch/memory_stream.h"
+#include "base/memory_stream.h"
 
 // The near/same address cache of a delta: COPY addresses are stored as
 // small offsets from recently used addresses. Reads the current window's

@@ -1,6 +1,6 @@
 #include "patch/checksum.h"
 
-#include "patch/exception.h"
+#include "base/exception.h"
 
 uint32_t Checksum(const uint8_t* data, int64_t length) {
     if (data == nullptr) throw Exception("Checksum data");

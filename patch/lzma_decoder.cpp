@@ -6,8 +6,8 @@
 #include <cstdlib>
 #include <memory>
 
-#include "patch/exception.h"
-#include "patch/file_stream.h"
+#include "base/exception.h"
+#include "base/file_stream.h"
 
 std::atomic<bool> quitRequested{false};
 

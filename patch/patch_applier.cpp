@@ -2,21 +2,18 @@
 
 #include <set>
 
-#include "app/status_interfaces.h"
-#include "net/http_downloader.h"
-#include "patch/exception.h"
-#include "patch/file_operations.h"
-#include "patch/file_stream.h"
+#include "base/archive_source.h"
+#include "base/status_interfaces.h"
+#include "base/exception.h"
+#include "base/file_operations.h"
+#include "base/file_stream.h"
 #include "patch/patch_archive.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
-#include "patch/paths.h"
-#include "patch/relative_path.h"
+#include "base/paths.h"
+#include "base/relative_path.h"
 #include "patch/vcdiff_decoder.h"
-#include "text/encoding.h"
-#include "text/localization.h"
-#include "text/log.h"
-#include "ui/message_box.h"
+#include "base/log.h"
 
 namespace {
 
@@ -45,19 +42,18 @@ void FlushToDisk(const std::string& path) {
 
 void PatchApplier::Init(PatchInfoFile* info, PatchProgressFile* progress, const std::string& installation,
                         const std::string& patchedFiles, const std::string& patch, IStatusView* view,
-                        HttpDownloader* source) {
+                        IArchiveSource* source) {
     patchInfo = info;
     progressFile = progress;
     installationFolder = installation;
     patchedFilesFolder = patchedFiles;
     patchFolder = patch;
     statusView = view;
-    downloader = source;
+    archives = source;
     cancelRequested = false;
     filesDone = 0;
     actionCounter = 0;
     filesTotal = patchInfo->CountFileAndDirectoryChanges();
-    initialised = true;
 }
 
 void PatchApplier::CheckCancel() const {
@@ -70,15 +66,16 @@ void PatchApplier::ReportProgress(const std::string& path) const {
 }
 
 void PatchApplier::WaitForArchive(const std::string& archiveName) const {
-    if (downloader == nullptr) throw Exception("No downloader set.");
-    switch (downloader->WaitForFile(archiveName)) {
-        case DownloadStatus::Done:
+    if (archives == nullptr) throw Exception("No downloader set.");
+    switch (archives->WaitForArchive(archiveName)) {
+        case ArchiveState::Arrived:
             return;
-        case DownloadStatus::Cancelled:
+        case ArchiveState::Cancelled:
             throw Exception("", ErrorCode::UserCancelled);
-        default:
-            throw Exception("Failed to download patch file.", ErrorCode::FileNotFound);
+        case ArchiveState::Failed:
+            break;
     }
+    throw Exception("Failed to download patch file.", ErrorCode::FileNotFound);
 }
 
 // Every path of the batch is checked before the first file is written or
@@ -229,14 +226,7 @@ void PatchApplier::MoveWithRetry(const std::string& source, const std::string& d
     const std::string folder = GetParentDirectory(destination);
     if (!folder.empty() && !FileExists(folder)) MakeDirectories(folder);
     while (!MoveFileReplacing(source, destination)) {
-        MessageBoxRequest question;
-        question.text = Localize("INSTALLER_FAILED_TO_MOVE_THE_FILE") + L"\n\n" + WidenFromCodePage(source) + L"\n\n" +
-                        Localize("INSTALLER_TO") + L"\n\n" + WidenFromCodePage(destination) + L"\n\n" +
-                        Localize("INSTALLER_CLOSE_FILES_AND_RETRY");
-        question.caption = GetWindowTitle();
-        question.buttons = MessageButtons::RetryCancel;
-        question.icon = MessageIcon::Warning;
-        if (ShowMessageBox(question) != MessageAnswer::Retry) {
+        if (retryQuestion == nullptr || !retryQuestion->AskRetryMove(source, destination)) {
             throw Exception("Failed to move file from " + source + " to " + destination, ErrorCode::StepFailed);
         }
     }

@@ -5,10 +5,24 @@
 #include <string>
 #include <vector>
 
-class HttpDownloader;
+class IArchiveSource;
 class IStatusView;
 class PatchInfoFile;
 class PatchProgressFile;
+
+// Asked when a prepared file cannot be moved into the installation (the
+// game or another program holds the old file open): true to try again.
+// The program answers with a box in the player's language.
+class IMoveRetryQuestion {
+public:
+    virtual bool AskRetryMove(const std::string& source, const std::string& destination) = 0;
+
+protected:
+    IMoveRetryQuestion() = default;
+    IMoveRetryQuestion(const IMoveRetryQuestion&) = default;
+    IMoveRetryQuestion& operator=(const IMoveRetryQuestion&) = default;
+    ~IMoveRetryQuestion() = default;
+};
 
 // Carries out one patch in two stages, so the installation is touched only
 // once everything it needs is on disk. PreparePatch builds every patched
@@ -24,11 +38,13 @@ public:
     virtual ~PatchApplier() = default;
 
     // Keeps the arguments (none owned), clears a cancel request and counts
-    // the batch's items. The downloader may be null for a resumed batch.
+    // the batch's items. The archive source may be null for a resumed batch.
     void Init(PatchInfoFile* patchInfo, PatchProgressFile* progressFile, const std::string& installationFolder,
               const std::string& patchedFilesFolder, const std::string& patchFolder, IStatusView* statusView,
-              HttpDownloader* downloader);
-    bool IsInitialised() const { return initialised; }
+              IArchiveSource* archives);
+    // Who is asked when a move fails; without one (null) the first failed
+    // move ends stage two. Not owned; kept across Init.
+    void SetRetryQuestion(IMoveRetryQuestion* question) { retryQuestion = question; }
 
     // Stage one. Throws Exception on every failure; the installation is
     // not changed.
@@ -57,10 +73,10 @@ private:
     std::string patchedFilesFolder;
     std::string patchFolder;
     IStatusView* statusView = nullptr;
-    HttpDownloader* downloader = nullptr;
+    IArchiveSource* archives = nullptr;
+    IMoveRetryQuestion* retryQuestion = nullptr;
     int32_t filesDone = 0;
     int32_t filesTotal = 0;
     std::atomic<bool> cancelRequested{false};
     int32_t actionCounter = 0;
-    bool initialised = false;
 };

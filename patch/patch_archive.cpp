@@ -1,9 +1,9 @@
 #include "patch/patch_archive.h"
 
-#include "patch/exception.h"
+#include "base/exception.h"
 #include "patch/lzma_decoder.h"
-#include "patch/stream_readers.h"
-#include "text/log.h"
+#include "base/stream_readers.h"
+#include "base/log.h"
 
 namespace {
 

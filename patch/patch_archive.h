@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <string>
 
-#include "patch/file_stream.h"
+#include "base/file_stream.h"
 
 // One member of a patch archive as its header describes it. An archive is
 // nothing but members back to back: a name length byte, the name, the data

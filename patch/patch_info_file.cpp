@@ -2,8 +2,8 @@
 
 #include <sstream>
 
-#include "patch/exception.h"
-#include "patch/xml_file.h"
+#include "base/exception.h"
+#include "base/xml_file.h"
 
 namespace {
 

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "state/registry_hive.h"
+#include "base/registry_hive.h"
 
 // The patch description ("patchinfo.xml"): which files a patch rebuilds
 // from deltas, adds or deletes, which directories, registry keys and

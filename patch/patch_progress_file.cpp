@@ -4,11 +4,11 @@
 #include <climits>
 #include <cstdlib>
 
-#include "patch/exception.h"
-#include "patch/file_operations.h"
-#include "patch/paths.h"
-#include "patch/xml_file.h"
-#include "text/log.h"
+#include "base/exception.h"
+#include "base/file_operations.h"
+#include "base/paths.h"
+#include "base/xml_file.h"
+#include "base/log.h"
 
 namespace {
 

@@ -35,7 +35,6 @@ public:
     // it reaches the recorded action.
     bool resuming = false;
 
-    std::string GetDirectory() const { return folder; }
     std::string GetRecordPath() const { return recordPath; }
     std::string GetAlternativeRecordPath() const { return alternativeRecordPath; }
 

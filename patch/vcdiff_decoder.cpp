@@ -6,10 +6,10 @@
 #include <string>
 
 #include "patch/checksum.h"
-#include "patch/exception.h"
-#include "patch/file_stream.h"
-#include "patch/memory_stream.h"
-#include "patch/stream_readers.h"
+#include "base/exception.h"
+#include "base/file_stream.h"
+#include "base/memory_stream.h"
+#include "base/stream_readers.h"
 
 namespace {
 

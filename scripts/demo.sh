@@ -8,7 +8,7 @@
 set -euo pipefail
 root=$(cd "$(dirname "$0")/.." && pwd)
 cd "$root"
-command -v cmake >/dev/null && [ -e /usr/include/tinyxml.h ] || bash scripts/setup.sh
+bash scripts/setup.sh >/dev/null  # installs only what is missing
 
 echo "== building the publisher's tool"
 cmake --preset native >/dev/null

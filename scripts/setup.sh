@@ -1,9 +1,24 @@
 #!/usr/bin/env bash
 # Installs everything the two builds and the test suite need on a fresh
-# Debian 12 machine. Safe to run again: it only adds what is missing.
+# Debian 12 machine. Safe to run again: it only adds what is missing, and
+# when nothing is, it needs no rights and changes nothing. Installing needs
+# root (apt-get, /etc/apt, the deps folder); run as root or with sudo
+# available. IRONVALE_DEPS_DIR (default /opt/ironvale-deps) is where
+# Debian's TinyXML source is unpacked for the Windows build; CMake reads
+# the same variable.
 set -euo pipefail
-here=$(cd "$(dirname "$0")/.." && pwd)
 deps_dir=${IRONVALE_DEPS_DIR:-/opt/ironvale-deps}
+
+as_root() {
+  if [ "$(id -u)" -eq 0 ]; then
+    "$@"
+  elif command -v sudo >/dev/null; then
+    sudo "$@"
+  else
+    echo "setup: '$*' needs root; run scripts/setup.sh as root" >&2
+    exit 1
+  fi
+}
 
 packages=(
   build-essential cmake ninja-build pkg-config git
@@ -24,9 +39,12 @@ done
 
 # Debian's TinyXML source is built into the Windows program; apt needs a
 # deb-src entry to hand it out.
-if ! grep -rqs '^Types:.*deb-src' /etc/apt/sources.list.d/ && ! grep -qs '^deb-src' /etc/apt/sources.list; then
+need_source=
+[ -f "$deps_dir/tinyxml/tinyxml.h" ] || need_source=1
+if [ -n "$need_source" ] && ! grep -rqs '^Types:.*deb-src' /etc/apt/sources.list.d/ &&
+   ! grep -qs '^deb-src' /etc/apt/sources.list; then
   echo "setup: adding deb-src entries"
-  cat > /etc/apt/sources.list.d/ironvale-src.sources <<'SRC'
+  as_root tee /etc/apt/sources.list.d/ironvale-src.sources >/dev/null <<'SRC'
 Types: deb-src
 URIs: http://deb.debian.org/debian
 Suites: bookworm bookworm-updates
@@ -43,23 +61,22 @@ SRC
 fi
 
 if [ ${#missing[@]} -gt 0 ] || [ -n "${need_update:-}" ]; then
-  export DEBIAN_FRONTEND=noninteractive
-  apt-get update -qq
+  as_root env DEBIAN_FRONTEND=noninteractive apt-get update -qq
 fi
 if [ ${#missing[@]} -gt 0 ]; then
   echo "setup: installing ${missing[*]}"
-  DEBIAN_FRONTEND=noninteractive apt-get install -y -qq --no-install-recommends "${missing[@]}"
+  as_root env DEBIAN_FRONTEND=noninteractive apt-get install -y -qq --no-install-recommends "${missing[@]}"
 fi
 
 # TinyXML source for the Windows build, unpacked with Debian's patches
 # applied, outside the repository.
-mkdir -p "$deps_dir"
-if [ ! -f "$deps_dir/tinyxml/tinyxml.h" ]; then
-  echo "setup: fetching Debian's tinyxml source"
+if [ -n "$need_source" ]; then
+  echo "setup: fetching Debian's tinyxml source into $deps_dir"
   tmp=$(mktemp -d)
   (cd "$tmp" && apt-get source -qq --download-only tinyxml 2>/dev/null && dpkg-source -x ./*.dsc src >/dev/null)
-  rm -rf "$deps_dir/tinyxml"
-  mv "$tmp/src" "$deps_dir/tinyxml"
+  as_root mkdir -p "$deps_dir"
+  as_root rm -rf "$deps_dir/tinyxml"
+  as_root mv "$tmp/src" "$deps_dir/tinyxml"
   rm -rf "$tmp"
 fi
 echo "setup: done"

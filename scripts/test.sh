@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # Builds both builds (native with sanitizers, Windows with mingw-w64) and the
-# fuzz targets, runs every test, and ends with one line "N passed, N failed".
+# fuzz targets, checks includes and formatting, runs every test, and ends
+# with one line "N passed, N failed".
 #   scripts/test.sh            everything
 #   FUZZ_SECONDS=N             time per fuzz target (default 20)
 set -uo pipefail
@@ -9,21 +10,26 @@ cd "$root"
 fuzz_seconds=${FUZZ_SECONDS:-20}
 jobs=${JOBS:-$(nproc)}
 
-needed=(/usr/bin/x86_64-w64-mingw32-g++-posix /usr/lib/wine/wine64 /usr/bin/xdelta3 /usr/bin/clang++
-        /usr/bin/Xvfb /usr/include/tinyxml.h /usr/include/lzma/LzmaDec.c /usr/include/x86_64-linux-gnu/curl/curl.h
-        /usr/src/googletest/CMakeLists.txt /usr/bin/ninja /usr/sbin/nginx /opt/ironvale-deps/tinyxml/tinyxml.h)
-for f in "${needed[@]}"; do
-  if [ ! -e "$f" ]; then
-    echo "test.sh: $f is missing; running scripts/setup.sh"
-    bash scripts/setup.sh || { echo "0 passed, 1 failed"; exit 1; }
-    break
-  fi
-done
+# Installs only what is missing (quiet and quick when nothing is).
+bash scripts/setup.sh >/dev/null || { echo "test.sh: scripts/setup.sh failed"; echo "0 passed, 1 failed"; exit 1; }
 
 results=$root/build/results
 rm -rf "$results"
 mkdir -p "$results"
 build_failures=0
+
+# The house rules: includes only point down the layers, and the code is
+# formatted with the repository's .clang-format.
+echo "== checking includes and formatting"
+if ! python3 scripts/check_includes.py >"$results/includes.log" 2>&1; then
+  echo "FAILED: include check"; cat "$results/includes.log"
+  build_failures=$((build_failures + 1))
+fi
+if ! git ls-files '*.c' '*.cpp' '*.h' | xargs clang-format --dry-run --Werror >"$results/format.log" 2>&1; then
+  echo "FAILED: formatting (run: git ls-files '*.c' '*.cpp' '*.h' | xargs clang-format -i)"
+  head -40 "$results/format.log"
+  build_failures=$((build_failures + 1))
+fi
 
 build() {  # PRESET
   echo "== building $1"

@@ -3,9 +3,9 @@
 #include <sstream>
 #include <vector>
 
-#include "patch/exception.h"
-#include "patch/paths.h"
-#include "patch/xml_file.h"
+#include "base/exception.h"
+#include "base/paths.h"
+#include "base/xml_file.h"
 
 namespace {
 

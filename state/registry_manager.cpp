@@ -1,7 +1,7 @@
 #include "state/registry_manager.h"
 
-#include "patch/exception.h"
-#include "patch/paths.h"
+#include "base/exception.h"
+#include "base/paths.h"
 
 namespace {
 

@@ -2,7 +2,7 @@
 
 #include <string>
 
-#include "state/registry_hive.h"
+#include "base/registry_hive.h"
 
 // Finds and keeps the registry key where the game records its installation
 // folder and the player's language. Reads report failure by false or an

@@ -8,8 +8,9 @@
 #include <system_error>
 #include <vector>
 
-#include "patch/atomic_file.h"
-#include "patch/paths.h"
+#include "base/atomic_file.h"
+#include "base/paths.h"
+#include "base/string_helpers.h"
 #include "state/registry_manager.h"
 
 namespace {
@@ -67,18 +68,6 @@ std::string FolderNameFor(const std::string& keyName) {
         }
     }
     return folder;
-}
-
-bool EqualsIgnoringCase(const std::string& a, const std::string& b) {
-    if (a.size() != b.size()) return false;
-    for (size_t i = 0; i < a.size(); ++i) {
-        char x = a[i];
-        char y = b[i];
-        if (x >= 'a' && x <= 'z') x = static_cast<char>(x - 'a' + 'A');
-        if (y >= 'a' && y <= 'z') y = static_cast<char>(y - 'a' + 'A');
-        if (x != y) return false;
-    }
-    return true;
 }
 
 bool IsDirectory(const std::string& path) {

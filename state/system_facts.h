@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "patch/file_operations.h"  // FileExists
+#include "base/file_operations.h"  // FileExists
 
 // Facts about the machine, the user's rights and the operating system that
 // the environment checks rest on.

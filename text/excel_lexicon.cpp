@@ -2,7 +2,8 @@
 
 #include <vector>
 
-#include "text/encoding.h"
+#include "base/encoding.h"
+#include "base/string_helpers.h"
 #include "text/program_resource.h"
 
 namespace {
@@ -40,18 +41,6 @@ std::string ToNarrow(const std::u16string& text) {
     narrow.reserve(text.size());
     for (const char16_t unit : text) narrow += unit < 0x80 ? static_cast<char>(unit) : '?';
     return narrow;
-}
-
-bool EqualsIgnoringCase(const std::string& a, const std::string& b) {
-    if (a.size() != b.size()) return false;
-    for (size_t i = 0; i < a.size(); ++i) {
-        char x = a[i];
-        char y = b[i];
-        if (x >= 'A' && x <= 'Z') x = static_cast<char>(x - 'A' + 'a');
-        if (y >= 'A' && y <= 'Z') y = static_cast<char>(y - 'A' + 'a');
-        if (x != y) return false;
-    }
-    return true;
 }
 
 void ReplaceLineBreaks(std::u16string& text) {

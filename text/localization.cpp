@@ -2,7 +2,7 @@
 
 #include <mutex>
 
-#include "patch/exception.h"
+#include "base/exception.h"
 #include "text/excel_lexicon.h"
 
 namespace {

@@ -2,17 +2,16 @@
 #include <iostream>
 #include <string>
 
-#include "text/encoding.h"
+#include "base/encoding.h"
+#include "base/string_helpers.h"
 #include "ui/message_box.h"
 
 namespace {
 
-std::string Lower(std::string text) {
-    for (char& c : text) {
-        if (c >= 'A' && c <= 'Z') c = static_cast<char>(c - 'A' + 'a');
-    }
+// The answer line without its line end and trailing blanks, in lower case.
+std::string Normalise(std::string text) {
     while (!text.empty() && (text.back() == '\r' || text.back() == ' ')) text.pop_back();
-    return text;
+    return ToLowerAscii(text);
 }
 
 const char* IconName(MessageIcon icon) {
@@ -46,7 +45,7 @@ MessageAnswer ShowMessageBox(const MessageBoxRequest& request) {
     const MessageAnswer negative = retry ? MessageAnswer::Cancel : MessageAnswer::No;
     std::string answer;
     if (!std::getline(std::cin, answer)) return negative;
-    answer = Lower(answer);
+    answer = Normalise(answer);
     for (;;) {
         if (answer.empty() || answer == "y" || answer == "yes" || answer == "r" || answer == "retry") {
             return retry ? MessageAnswer::Retry : MessageAnswer::Yes;
@@ -57,6 +56,6 @@ MessageAnswer ShowMessageBox(const MessageBoxRequest& request) {
         std::cerr << (retry ? "Please answer r or c: " : "Please answer y or n: ");
         std::cerr.flush();
         if (!std::getline(std::cin, answer)) return negative;
-        answer = Lower(answer);
+        answer = Normalise(answer);
     }
 }

@@ -2,11 +2,11 @@
 
 #include <algorithm>
 
-#include "patch/file_operations.h"
+#include "base/file_operations.h"
 #include "patch/patch_info_file.h"
-#include "patch/paths.h"
-#include "patch/relative_path.h"
-#include "text/log.h"
+#include "base/paths.h"
+#include "base/relative_path.h"
+#include "base/log.h"
 
 namespace {
 

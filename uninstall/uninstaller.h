@@ -4,7 +4,7 @@
 #include <unordered_set>
 #include <vector>
 
-#include "state/registry_hive.h"
+#include "base/registry_hive.h"
 
 // The uninstall record ("Uninstall.xml"): everything the installer and the
 // patches put into the installation and no later patch took away - files,
@@ -53,7 +53,6 @@ public:
     RegistryHive GetHive() const { return hive; }
     std::string GetRegistryPath() const { return registryPath; }
     std::string GetProductGuid() const { return productGuid; }
-    bool IsMachineWide() const { return machineWide; }
     std::string GetSid() const { return sid; }
 
 private:

@@ -6,8 +6,8 @@
 #include <cstdlib>
 #include <string>
 
-#include "patch/file_stream.h"
-#include "patch/paths.h"
+#include "base/file_stream.h"
+#include "base/paths.h"
 
 // A folder of this fuzzing process for the files the loaders read.
 inline const std::string& FuzzFolder() {

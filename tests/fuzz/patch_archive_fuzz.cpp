@@ -4,11 +4,11 @@
 #include <cstdint>
 #include <string>
 
-#include "patch/exception.h"
+#include "base/exception.h"
 #include "patch/lzma_decoder.h"
-#include "patch/memory_stream.h"
+#include "base/memory_stream.h"
 #include "patch/patch_archive.h"
-#include "patch/paths.h"
+#include "base/paths.h"
 #include "tests/fuzz/fuzz_files.h"
 
 namespace {

@@ -2,7 +2,7 @@
 #include <cstdint>
 #include <string>
 
-#include "patch/exception.h"
+#include "base/exception.h"
 #include "patch/patch_info_file.h"
 #include "tests/fuzz/fuzz_files.h"
 

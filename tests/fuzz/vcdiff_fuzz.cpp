@@ -5,8 +5,8 @@
 #include <cstdint>
 #include <vector>
 
-#include "patch/exception.h"
-#include "patch/memory_stream.h"
+#include "base/exception.h"
+#include "base/memory_stream.h"
 #include "patch/vcdiff_decoder.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {

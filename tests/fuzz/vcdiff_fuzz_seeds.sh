@@ -4,4 +4,4 @@
 #   vcdiff_fuzz_seeds.sh OUTDIR
 set -euo pipefail
 [ $# -eq 1 ] || { echo "usage: $0 OUTDIR" >&2; exit 2; }
-exec python3 "$(dirname "$0")/../vcdiff/make_xdelta3_cases.py" --fuzz-seeds "$1"
+exec python3 "$(dirname "$0")/../patch/make_xdelta3_cases.py" --fuzz-seeds "$1"

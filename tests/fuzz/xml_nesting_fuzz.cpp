@@ -13,7 +13,7 @@
 #include <utility>
 #include <vector>
 
-#include "patch/xml_nesting.h"
+#include "base/xml_nesting.h"
 
 namespace {
 

@@ -3,11 +3,11 @@
 #include <cstdio>
 #include <random>
 
-#include "patch/exception.h"
-#include "patch/paths.h"
+#include "base/exception.h"
+#include "base/paths.h"
 #include "tests/support/test_files.h"
-#include "text/log.h"
-#include "text/log_file.h"
+#include "base/log.h"
+#include "base/log_file.h"
 
 void RecordingView::OnFileProgress(const std::string& localPath, uint32_t bytesDone, uint32_t bytesTotal) {
     HttpDownloader* target = nullptr;

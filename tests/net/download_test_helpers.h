@@ -7,7 +7,7 @@
 #include <string>
 #include <vector>
 
-#include "app/status_interfaces.h"
+#include "base/status_interfaces.h"
 #include "net/http_downloader.h"
 
 // Records what the downloader reports, from its worker thread, and can ask

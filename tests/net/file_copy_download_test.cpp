@@ -7,7 +7,7 @@
 
 #include "net/http_downloader.h"
 #include "net/location.h"
-#include "patch/paths.h"
+#include "base/paths.h"
 #include "tests/net/download_test_helpers.h"
 #include "tests/support/test_files.h"
 

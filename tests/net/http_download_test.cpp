@@ -7,7 +7,7 @@
 
 #include "net/http_downloader.h"
 #include "net/sign_url.h"
-#include "patch/paths.h"
+#include "base/paths.h"
 #include "tests/net/download_test_helpers.h"
 #include "tests/support/http_test_server.h"
 #include "tests/support/test_files.h"

@@ -6,7 +6,7 @@
 #include "net/location.h"
 #include "net/md5.h"
 #include "net/sign_url.h"
-#include "patch/paths.h"
+#include "base/paths.h"
 #include "tests/support/http_test_server.h"
 
 namespace {

@@ -7,7 +7,7 @@
 #include <sstream>
 
 #include "net/md5.h"
-#include "patch/paths.h"
+#include "base/paths.h"
 
 namespace {
 

@@ -7,7 +7,7 @@
 #include <sstream>
 #include <stdexcept>
 
-#include "patch/paths.h"
+#include "base/paths.h"
 
 namespace fs = std::filesystem;
 

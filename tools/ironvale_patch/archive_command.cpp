@@ -5,10 +5,10 @@
 #include <string>
 #include <vector>
 
-#include "patch/exception.h"
-#include "patch/file_stream.h"
+#include "base/exception.h"
+#include "base/file_stream.h"
 #include "patch/patch_archive.h"
-#include "patch/stream_readers.h"
+#include "base/stream_readers.h"
 #include "tools/ironvale_patch/command.h"
 #include "tools/publisher/archive_writer.h"
 

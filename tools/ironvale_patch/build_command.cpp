@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "patch/exception.h"
+#include "base/exception.h"
 #include "patch/patch_info_file.h"
 #include "tools/ironvale_patch/command.h"
 #include "tools/publisher/patch_builder.h"

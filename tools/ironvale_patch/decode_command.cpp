@@ -1,6 +1,6 @@
 // ironvale-patch decode SOURCE DELTA TARGET: rebuilds TARGET from SOURCE and
 // a VCDIFF delta, exactly as the updater does when it patches a file.
-#include "patch/file_stream.h"
+#include "base/file_stream.h"
 #include "patch/vcdiff_decoder.h"
 #include "tools/ironvale_patch/command.h"
 

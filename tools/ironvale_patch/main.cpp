@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "patch/exception.h"
+#include "base/exception.h"
 #include "tools/ironvale_patch/command.h"
 
 namespace {

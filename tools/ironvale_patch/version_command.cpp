@@ -2,9 +2,9 @@
 #include <string>
 #include <vector>
 
-#include "patch/atomic_file.h"
-#include "patch/exception.h"
-#include "patch/paths.h"
+#include "base/atomic_file.h"
+#include "base/exception.h"
+#include "base/paths.h"
 #include "tools/ironvale_patch/command.h"
 #include "tools/publisher/patch_builder.h"
 

@@ -3,7 +3,7 @@
 #include <algorithm>
 #include <vector>
 
-#include "patch/exception.h"
+#include "base/exception.h"
 
 namespace {
 

@@ -3,7 +3,7 @@
 #include <cstdint>
 #include <string>
 
-#include "patch/file_stream.h"
+#include "base/file_stream.h"
 #include "tools/publisher/lzma_encoder.h"
 
 // Writes a patch archive member by member: a name length byte, the name,

@@ -1,8 +1,8 @@
 #include "tools/publisher/delta_maker.h"
 
-#include "patch/exception.h"
-#include "patch/file_operations.h"
-#include "patch/file_stream.h"
+#include "base/exception.h"
+#include "base/file_operations.h"
+#include "base/file_stream.h"
 #include "patch/vcdiff_decoder.h"
 #include "tools/publisher/run_program.h"
 #include "tools/publisher/tree_listing.h"

@@ -6,8 +6,8 @@
 #include <cstdlib>
 #include <exception>
 
-#include "patch/exception.h"
-#include "patch/memory_stream.h"
+#include "base/exception.h"
+#include "base/memory_stream.h"
 
 namespace {
 

@@ -6,10 +6,10 @@
 #include <system_error>
 #include <vector>
 
-#include "patch/exception.h"
-#include "patch/file_operations.h"
-#include "patch/file_stream.h"
-#include "patch/paths.h"
+#include "base/exception.h"
+#include "base/file_operations.h"
+#include "base/file_stream.h"
+#include "base/paths.h"
 #include "tools/publisher/archive_writer.h"
 #include "tools/publisher/delta_maker.h"
 #include "tools/publisher/lzma_encoder.h"

@@ -4,7 +4,7 @@
 #include <ostream>
 #include <string>
 
-#include "state/registry_hive.h"
+#include "base/registry_hive.h"
 
 // What the publisher asks for: a patch from one game tree to the next, or
 // (with no old tree) the complete build of a tree.

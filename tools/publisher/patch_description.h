@@ -5,7 +5,7 @@
 #include <utility>
 #include <vector>
 
-#include "state/registry_hive.h"
+#include "base/registry_hive.h"
 
 // Everything a patch description ("patchinfo.xml") of a patch or complete
 // build says, in the order the file lists it. Paths are relative, with

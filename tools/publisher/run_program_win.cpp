@@ -2,7 +2,7 @@
 
 #include <windows.h>
 
-#include "text/encoding.h"
+#include "base/encoding.h"
 
 namespace {
 

@@ -4,9 +4,9 @@
 #include <system_error>
 #include <vector>
 
-#include "patch/exception.h"
-#include "patch/file_stream.h"
-#include "patch/paths.h"
+#include "base/exception.h"
+#include "base/file_stream.h"
+#include "base/paths.h"
 
 namespace {
 
@@ -22,8 +22,7 @@ void CheckRelativePath(const std::string& relative, const std::string& name) {
     }
 }
 
-void Walk(const std::string& root, const std::string& relative, const std::set<std::string>& ignored,
-          TreeListing& listing) {
+void Walk(const std::string& root, const std::string& relative, TreeListing& listing) {
     const std::string folder = relative.empty() ? root : PathJoin(root, relative);
     std::error_code error;
     std::filesystem::directory_iterator entries(ToFileSystemPath(folder), error);
@@ -34,7 +33,6 @@ void Walk(const std::string& root, const std::string& relative, const std::set<s
         const std::string name = NarrowEntryName(entries->path().filename(), folder);
         const std::string path = relative.empty() ? name : relative + "\\" + name;
         CheckRelativePath(path, name);
-        if (ignored.count(path) != 0) continue;
         const auto status = entries->status(error);
         if (error) break;
         if (std::filesystem::is_directory(status)) {
@@ -50,19 +48,19 @@ void Walk(const std::string& root, const std::string& relative, const std::set<s
     if (error) throw Exception("Cannot list folder " + folder + ": " + error.message());
     for (const auto& directory : found) {
         listing.directories.insert(directory.first);
-        Walk(root, directory.first, ignored, listing);
+        Walk(root, directory.first, listing);
     }
 }
 
 }  // namespace
 
-TreeListing ListTree(const std::string& root, const std::set<std::string>& ignored) {
+TreeListing ListTree(const std::string& root) {
     std::error_code error;
     if (!std::filesystem::is_directory(ToFileSystemPath(root), error)) {
         throw Exception("Not a readable folder: " + root);
     }
     TreeListing listing;
-    Walk(root, "", ignored, listing);
+    Walk(root, "", listing);
     return listing;
 }
 

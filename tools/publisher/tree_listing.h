@@ -16,9 +16,8 @@ struct TreeListing {
 
 // Walks root. Throws Exception when root or anything below it cannot be
 // listed, when an entry is neither a file nor a folder, and when a name
-// cannot be carried by a patch (see CheckEntryName). Paths listed in
-// ignored (relative, with backslashes) are left out with all they hold.
-TreeListing ListTree(const std::string& root, const std::set<std::string>& ignored = {});
+// cannot be carried by a patch (see CheckEntryName).
+TreeListing ListTree(const std::string& root);
 
 // The narrow name of one folder entry, in the form patch descriptions and
 // archives carry it: on Windows in the system code page, on POSIX as UTF-8.

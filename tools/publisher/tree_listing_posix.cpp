@@ -1,6 +1,6 @@
 #include "tools/publisher/tree_listing.h"
 
-#include "patch/exception.h"
+#include "base/exception.h"
 
 namespace {
 

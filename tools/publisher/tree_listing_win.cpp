@@ -2,8 +2,8 @@
 
 #include <windows.h>
 
-#include "patch/exception.h"
-#include "text/encoding.h"
+#include "base/exception.h"
+#include "base/encoding.h"
 
 std::string NarrowEntryName(const std::filesystem::path& name, const std::string& folder) {
     const std::wstring& wide = name.native();

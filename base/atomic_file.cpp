@@ -1,0 +1,38 @@
+#include "base/atomic_file.h"
+
+#include <algorithm>
+
+#include "base/exception.h"
+#include "base/file_operations.h"
+#include "base/file_stream.h"
+#include "base/paths.h"
+
+bool ReplaceFileAtomically(const std::string& path, const std::string& content) {
+    const std::string name = GetFileName(path);
+    const std::string folder = GetParentDirectory(path);
+    const std::string temporary = folder.empty() ? "~" + name + ".tmp" : PathJoin(folder, "~" + name + ".tmp");
+    return ReplaceFileAtomically(path, content, temporary);
+}
+
+bool ReplaceFileAtomically(const std::string& path, const std::string& content, const std::string& temporaryPath) {
+    try {
+        FileStream file;
+        file.Create(temporaryPath);
+        size_t done = 0;
+        while (done < content.size()) {
+            const size_t piece = std::min<size_t>(content.size() - done, 1u << 30);
+            done += file.Write(content.data() + done, static_cast<uint32_t>(piece));
+        }
+        file.Flush();
+        file.Close();
+    } catch (const Exception&) {
+        RemoveFile(temporaryPath);
+        return false;
+    }
+    if (!MoveFileReplacing(temporaryPath, path)) {
+        RemoveFile(temporaryPath);
+        return false;
+    }
+    SyncFolder(GetParentDirectory(path));
+    return true;
+}

@@ -1,0 +1,67 @@
+#include "base/file_stream.h"
+
+#include "base/exception.h"
+
+FileStream::~FileStream() { handle.Close(); }
+
+void FileStream::OpenWith(const std::string& path, NativeHandle::Mode mode, const char* failure) {
+    Close();
+    name = path;
+    if (!handle.Open(path, mode)) throw Exception(failure + path);
+}
+
+void FileStream::Create(const std::string& path) {
+    OpenWith(path, NativeHandle::Mode::CreateAlways, "Failed to create file: ");
+}
+
+void FileStream::Open(const std::string& path) {
+    OpenWith(path, NativeHandle::Mode::OpenRead, "Failed to open file: ");
+}
+
+void FileStream::OpenForWrite(const std::string& path) {
+    OpenWith(path, NativeHandle::Mode::OpenAlways, "Failed to open file: ");
+}
+
+void FileStream::Close() { handle.Close(); }
+
+int64_t FileStream::Seek(int64_t offset, uint32_t origin) {
+    int64_t newPosition = 0;
+    if (!handle.Seek(offset, origin, newPosition)) throw Exception("Failed to seek file.");
+    position = newPosition;
+    return position;
+}
+
+int64_t FileStream::GetPosition() { return position; }
+
+int64_t FileStream::GetLength() {
+    int64_t length = 0;
+    if (!handle.Length(length)) throw Exception("Failed to get of length file.");
+    return length;
+}
+
+int32_t FileStream::ReadByte() {
+    uint8_t value = 0;
+    uint32_t done = 0;
+    if (!handle.Read(&value, 1, done)) throw Exception("Failed to read byte from file.");
+    return done == 0 ? -1 : static_cast<int32_t>(value);
+}
+
+uint32_t FileStream::Read(void* destination, uint32_t count) {
+    uint32_t done = 0;
+    if (!handle.Read(destination, count, done)) throw Exception("Failed to read data from file.");
+    return done;
+}
+
+uint32_t FileStream::Write(const void* source, uint32_t count) {
+    uint32_t done = 0;
+    if (!handle.Write(source, count, done)) throw Exception("Failed to write data to file.");
+    return done;
+}
+
+void FileStream::WriteByte(uint8_t) {}
+
+void FileStream::Attach(uint8_t*, int32_t) {}
+
+void FileStream::Flush() {
+    if (!handle.Flush()) throw Exception("Failed to flush file: " + name);
+}

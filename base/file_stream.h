@@ -1,0 +1,49 @@
+#pragma once
+
+#include <cstdint>
+#include <string>
+
+#include "base/native_handle.h"
+
+// One byte-stream interface over files and borrowed buffers. Reads and
+// writes never move the position reported by GetPosition: it is the result
+// of the last Seek only. Callers rely on that to know where a scan started.
+class FileStream {
+public:
+    FileStream() = default;
+    FileStream(const FileStream&) = delete;
+    FileStream& operator=(const FileStream&) = delete;
+    virtual ~FileStream();
+
+    // Creates (or empties) the file for writing, exclusively.
+    virtual void Create(const std::string& path);
+    // Opens an existing file for reading; others may read too.
+    virtual void Open(const std::string& path);
+    // Opens or creates the file for writing without truncating it.
+    virtual void OpenForWrite(const std::string& path);
+    virtual void Close();
+    // origin: 0 begin, 1 current, 2 end.
+    virtual int64_t Seek(int64_t offset, uint32_t origin);
+    virtual int64_t GetPosition();
+    virtual int64_t GetLength();
+    // 0..255, or -1 at the end.
+    virtual int32_t ReadByte();
+    virtual uint32_t Read(void* destination, uint32_t count);
+    virtual uint32_t Write(const void* source, uint32_t count);
+    virtual void WriteByte(uint8_t value);
+    virtual void Attach(uint8_t* buffer, int32_t size);
+    const std::string& GetName() const { return name; }
+
+    // Forces written data to the disk (used before a file is relied on
+    // after a crash). Does nothing for memory streams.
+    virtual void Flush();
+
+    bool IsOpen() const { return handle.IsOpen(); }
+
+private:
+    void OpenWith(const std::string& path, NativeHandle::Mode mode, const char* failure);
+
+    NativeHandle handle;
+    int64_t position = 0;
+    std::string name;
+};

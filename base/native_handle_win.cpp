@@ -1,0 +1,66 @@
+#include "base/native_handle.h"
+
+#include <windows.h>
+
+namespace {
+HANDLE AsHandle(intptr_t value) { return reinterpret_cast<HANDLE>(value); }
+}  // namespace
+
+bool NativeHandle::IsOpen() const { return value != 0 && AsHandle(value) != INVALID_HANDLE_VALUE; }
+
+bool NativeHandle::Open(const std::string& path, Mode mode) {
+    Close();
+    HANDLE h = INVALID_HANDLE_VALUE;
+    switch (mode) {
+        case Mode::CreateAlways:
+            h = CreateFileA(path.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_ALWAYS, 0, nullptr);
+            break;
+        case Mode::OpenRead:
+            h = CreateFileA(path.c_str(), GENERIC_READ, FILE_SHARE_READ, nullptr, OPEN_EXISTING,
+                            FILE_FLAG_RANDOM_ACCESS, nullptr);
+            break;
+        case Mode::OpenAlways:
+            h = CreateFileA(path.c_str(), GENERIC_WRITE, 0, nullptr, OPEN_ALWAYS, 0, nullptr);
+            break;
+    }
+    value = reinterpret_cast<intptr_t>(h);
+    return h != INVALID_HANDLE_VALUE;
+}
+
+void NativeHandle::Close() {
+    if (IsOpen()) CloseHandle(AsHandle(value));
+    value = 0;
+}
+
+bool NativeHandle::Seek(int64_t offset, uint32_t origin, int64_t& newPosition) {
+    LARGE_INTEGER distance;
+    distance.QuadPart = offset;
+    LARGE_INTEGER result;
+    result.QuadPart = 0;
+    if (!SetFilePointerEx(AsHandle(value), distance, &result, origin)) return false;
+    newPosition = result.QuadPart;
+    return true;
+}
+
+bool NativeHandle::Length(int64_t& length) {
+    LARGE_INTEGER size;
+    if (!GetFileSizeEx(AsHandle(value), &size)) return false;
+    length = size.QuadPart;
+    return true;
+}
+
+bool NativeHandle::Read(void* destination, uint32_t count, uint32_t& done) {
+    DWORD read = 0;
+    const BOOL ok = ReadFile(AsHandle(value), destination, count, &read, nullptr);
+    done = read;
+    return ok != FALSE;
+}
+
+bool NativeHandle::Write(const void* source, uint32_t count, uint32_t& done) {
+    DWORD written = 0;
+    const BOOL ok = WriteFile(AsHandle(value), source, count, &written, nullptr);
+    done = written;
+    return ok != FALSE;
+}
+
+bool NativeHandle::Flush() { return FlushFileBuffers(AsHandle(value)) != FALSE; }

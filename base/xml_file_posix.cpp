@@ -1,0 +1,3 @@
+#include "base/xml_file.h"
+
+const char kXmlLineBreak[] = "\n";

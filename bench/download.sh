@@ -1,0 +1,104 @@
+#!/usr/bin/env bash
+# Download throughput: our downloader (ironvale-patch fetch) against
+# `curl -o`, both fetching the same 512 MiB file from a loopback nginx in
+# the same run. Prints the medians and the ratio (ours / curl, higher is
+# better; the target is at least 0.9). When the Windows build is there, the
+# WinINet figure under Wine is printed beside it.
+#   bench/download.sh ROOT BUILD_DIR [RUNS]
+set -euo pipefail
+root=$1
+build=$2
+runs=${3:-5}
+tool=$build/tools/ironvale-patch
+wintool=$root/build/windows/tools/ironvale-patch.exe
+size_mib=512
+
+for needed in nginx curl hyperfine python3; do
+  command -v "$needed" >/dev/null || { echo "download bench: $needed is missing" >&2; exit 2; }
+done
+[ -x "$tool" ] || { echo "download bench: $tool not built" >&2; exit 2; }
+
+# Memory-backed scratch space when there is some, so the disk does not
+# decide the result.
+scratch_parent=${TMPDIR:-/tmp}
+[ -d /dev/shm ] && [ -w /dev/shm ] && scratch_parent=/dev/shm
+work=$(mktemp -d "$scratch_parent/ivl-bench-download.XXXXXX")
+nginx_pid=
+cleanup() {
+  [ -n "$nginx_pid" ] && kill "$nginx_pid" 2>/dev/null && wait "$nginx_pid" 2>/dev/null
+  rm -rf "$work"
+}
+trap cleanup EXIT
+
+mkdir -p "$work/www" "$work/temp" "$work/out"
+head -c $((size_mib * 1024 * 1024)) /dev/urandom >"$work/www/big.bin"
+# nginx's workers run as an unprivileged user when started by root.
+chmod -R a+rX "$work"
+
+port=$(python3 -c 'import socket; s = socket.socket(); s.bind(("127.0.0.1", 0)); print(s.getsockname()[1])')
+cat >"$work/nginx.conf" <<CONF
+daemon off;
+worker_processes 1;
+pid $work/nginx.pid;
+error_log $work/error.log warn;
+events { worker_connections 64; }
+http {
+  access_log off;
+  sendfile on;
+  tcp_nopush on;
+  client_body_temp_path $work/temp/body;
+  proxy_temp_path $work/temp/proxy;
+  fastcgi_temp_path $work/temp/fastcgi;
+  uwsgi_temp_path $work/temp/uwsgi;
+  scgi_temp_path $work/temp/scgi;
+  server {
+    listen 127.0.0.1:$port;
+    root $work/www;
+  }
+}
+CONF
+nginx -p "$work" -c "$work/nginx.conf" &
+nginx_pid=$!
+url="http://127.0.0.1:$port/big.bin"
+for _ in $(seq 50); do
+  curl -sf -o /dev/null -r 0-0 "$url" && break
+  sleep 0.1
+done
+curl -sf -o /dev/null -r 0-0 "$url" || { echo "download bench: nginx did not start" >&2; cat "$work/error.log" >&2; exit 1; }
+
+# Both results must be the file itself, or the timing means nothing.
+"$tool" fetch "$url" "$work/out/check.bin"
+cmp -s "$work/www/big.bin" "$work/out/check.bin" || { echo "download bench: fetched file differs" >&2; exit 1; }
+rm -f "$work/out/check.bin"
+
+commands=(-n curl "curl -s -o $work/out/curl.bin $url" -n ironvale "$tool fetch $url $work/out/ours.bin")
+hyperfine --style none --warmup 1 --runs "$runs" --export-json "$work/native.json" "${commands[@]}" >/dev/null
+
+wine_json=
+if [ -f "$wintool" ]; then
+  "$root/scripts/wine-run.sh" "$wintool" fetch "$url" "Z:$work/out/wine.bin"
+  cmp -s "$work/www/big.bin" "$work/out/wine.bin" || { echo "download bench: WinINet file differs" >&2; exit 1; }
+  hyperfine --style none --runs 3 --export-json "$work/wine.json" \
+    -n wininet "$root/scripts/wine-run.sh $wintool fetch $url Z:$work/out/wine.bin" >/dev/null
+  wine_json=$work/wine.json
+fi
+
+python3 - "$size_mib" "$work/native.json" "$wine_json" <<'PY'
+import json, sys
+size_mib = int(sys.argv[1])
+def medians(path):
+    return {r["command"]: r["median"] for r in json.load(open(path))["results"]}
+native = medians(sys.argv[2])
+def line(name, seconds):
+    print(f"{name:<22} median {seconds:7.3f} s  {size_mib / seconds:8.1f} MiB/s")
+print(f"download of {size_mib} MiB from a loopback nginx")
+line("curl -o", native["curl"])
+line("ironvale (libcurl)", native["ironvale"])
+print(f"ratio ironvale/curl throughput: {native['curl'] / native['ironvale']:.2f}x (target >= 0.90x)")
+if sys.argv[3]:
+    wine = medians(sys.argv[3])
+    line("ironvale (WinINet/Wine)", wine["wininet"])
+    print(f"ratio WinINet under Wine/curl throughput: {native['curl'] / wine['wininet']:.2f}x")
+else:
+    print("WinINet under Wine: not measured (build the windows preset first)")
+PY

@@ -1,8 +1,0 @@
-#include "patch/exception.h"
-
-#include "text/encoding.h"
-
-Exception::Exception(const std::string& text) : Exception(text, ErrorCode::None) {}
-
-Exception::Exception(const std::string& text, ErrorCode errorCode)
-    : message(text), wideMessage(WidenFromCodePage(text)), code(static_cast<int32_t>(errorCode)) {}

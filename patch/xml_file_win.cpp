@@ -1,3 +1,0 @@
-#include "patch/xml_file.h"
-
-const char kXmlLineBreak[] = "\r\n";

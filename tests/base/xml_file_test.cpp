@@ -1,0 +1,137 @@
+// The shared XML reading and printing rules: TinyXML's own output byte for
+// byte, code-page bytes kept, and hostile files refused before TinyXML's
+// recursive parser could overflow the stack.
+#include <gtest/gtest.h>
+
+#include <filesystem>
+#include <string>
+
+#include "base/paths.h"
+#include "base/xml_file.h"
+#include "base/xml_nesting.h"
+#include "tests/support/format_test_helpers.h"
+#include "tests/support/test_files.h"
+
+namespace {
+
+TEST(MeasureXmlNesting, CountsOpenElementsTheWayTheParserSeesThem) {
+    const struct {
+        const char* text;
+        int depth;
+    } cases[] = {
+        {"<a/>", 0},
+        {"<?xml version=\"1.0\" ?><a><b><c/></b></a>", 2},
+        {"<a><b x='/>' y=\"<c>\"></b></a>", 2},                 // markup inside values
+        {"<a><!-- <b><c><d> --><b/></a>", 1},                   // markup inside comments
+        {"<a><![CDATA[<b><c>]]></a>", 1},                       // and CDATA
+        {"<a>text &lt; /> more<b>t</b></a>", 2},                // text runs to the next '<'
+        {"<a><?xml version='>x' ?><b></b></a>", 2},             // declaration values may hold '>'
+        {"<a><!DOCTYPE x><b></b></a>", 2},                      // unknown markup ends at '>'
+        {"<a/>trailing <b><c><d>", 0},                          // the parser stops at text after the root
+        {"<r>&#x</r>x1;<a>&#x</a>x1;<b/></a></r>", 2},          // "&#x" runs to the next ';'
+        {"<r>&#</r>#1;<a/></r>", 1},                            // so does "&#"
+        {"<r><a b=\"&#x\"/>x1;\"><c/></a></r>", 2},             // even across a quote
+        {"<r>&#xz;</r>", -1},                                   // a bad reference ends the parse
+        {"<a><b>", -1},                                         // unclosed
+        {"<a><!-- never closed", -1},
+        {"<a b=\"unterminated></a>", -1},
+        {"<a b=c\"d\"></a>", -1},                               // quote in an unquoted value
+    };
+    int64_t nodes = 0;
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.text);
+        EXPECT_EQ(MeasureXmlNesting(c.text, 10, nodes), c.depth);
+    }
+    EXPECT_EQ(MeasureXmlNesting("<a><b><c></c></b></a>", 2, nodes), -1);
+    // Elements, attributes, text and comments each count.
+    EXPECT_EQ(MeasureXmlNesting("<a x='1' y='2'>t<b/><!-- c --></a>", 10, nodes), 1);
+    EXPECT_EQ(nodes, 6);
+}
+
+TEST(ParseXml, RefusesDeepNestingAndMassesOfTinyNodes) {
+    std::string deep;
+    for (int i = 0; i < 200000; ++i) deep += "<a>";
+    TiXmlDocument document;
+    EXPECT_FALSE(ParseXml(deep, document));
+    std::string hidden = "<r>";
+    for (int i = 0; i < 200000; ++i) hidden += "<a x='/>'><!-- </a> -->";
+    EXPECT_FALSE(ParseXml(hidden, document));
+    std::string flat = "<r>";
+    for (int64_t i = 0; i < kMaximumXmlNodes; ++i) flat += "<a/>";
+    EXPECT_FALSE(ParseXml(flat + "</r>", document));
+}
+
+TEST(ParseXml, KeepsCodePageBytesAndReadsLikeLoadFile) {
+    TiXmlDocument document;
+    // 0xE9 (e acute in Windows-1252) right before the closing quote: read
+    // as UTF-8 it would swallow the quote and the rest of the tag.
+    ASSERT_TRUE(ParseXml("<r><new Path=\"Caf\xE9\" File=\"x\" /></r>", document));
+    const TiXmlElement* item = document.RootElement()->FirstChildElement("new");
+    EXPECT_STREQ(item->Attribute("Path"), "Caf\xE9");
+    EXPECT_STREQ(item->Attribute("File"), "x");
+
+    ASSERT_TRUE(ParseXml("\xEF\xBB\xBF<r>\r\n<v>a</v>\r</r>", document));
+    std::string text;
+    EXPECT_TRUE(ReadElementText(document.RootElement(), "v", text));
+    EXPECT_EQ(text, "a");
+
+    EXPECT_FALSE(ParseXml(std::string("<r>a\0b</r>", 10), document));
+    EXPECT_FALSE(ParseXml("", document));
+    EXPECT_FALSE(ParseXml("<!-- only a comment -->", document));
+    EXPECT_FALSE(ParseXml("<r><a></b></r>", document));
+}
+
+TEST(LoadXmlFile, RefusesFilesLargerThanAnyRecord) {
+    TempFolder folder;
+    const std::string path = folder / "big.xml";
+    WriteTextFile(path, "<r/>");
+    TiXmlDocument document;
+    EXPECT_TRUE(LoadXmlFile(path, document));
+    std::filesystem::resize_file(path, kMaximumXmlFileSize + 1);
+    EXPECT_FALSE(LoadXmlFile(path, document));
+    EXPECT_FALSE(LoadXmlFile(folder / "missing.xml", document));
+}
+
+TEST(SaveXmlFile, WritesExactlyWhatTinyXmlsSaveFileWrites) {
+    TempFolder folder;
+    TiXmlDocument document;
+    StartXmlDocument(document);
+    TiXmlNode* root = document.InsertEndChild(TiXmlElement("Root"));
+    TiXmlElement item("new");
+    item.SetAttribute("Path", "a&b <c> \"d\" 'e'");
+    root->InsertEndChild(item);
+    TiXmlNode* list = root->InsertEndChild(TiXmlElement("List"));
+    list->InsertEndChild(TiXmlElement("Empty"));
+    AppendTextElement(root, "Text", "x & y < z");
+    AppendTextElement(root, "Blank", "");
+
+    ASSERT_TRUE(SaveXmlFile(document, folder / "ours.xml"));
+    ASSERT_TRUE(document.SaveFile((folder / "tinyxml.xml").c_str()));
+    EXPECT_EQ(ReadTextFile(folder / "ours.xml"), ReadTextFile(folder / "tinyxml.xml"));
+    EXPECT_EQ(ReadTextFile(folder / "ours.xml"),
+              WithPlatformLineBreaks("<?xml version=\"1.0\" ?>\n"
+                                     "<Root>\n"
+                                     "    <new Path='a&amp;b &lt;c&gt; &quot;d&quot; &apos;e&apos;' />\n"
+                                     "    <List>\n"
+                                     "        <Empty />\n"
+                                     "    </List>\n"
+                                     "    <Text>x &amp; y &lt; z</Text>\n"
+                                     "    <Blank></Blank>\n"
+                                     "</Root>\n"));
+    EXPECT_FALSE(PathExists(folder / "~ours.xml.tmp"));
+}
+
+TEST(SaveXmlFile, LeavesTheOldFileWhenTheWriteFails) {
+    TempFolder folder;
+    TiXmlDocument document;
+    StartXmlDocument(document);
+    document.InsertEndChild(TiXmlElement("Root"));
+    EXPECT_FALSE(SaveXmlFile(document, PathJoin(folder / "missing-folder", "x.xml")));
+    // A folder where the temporary file should go makes the write fail.
+    WriteTextFile(folder / "x.xml", "old");
+    std::filesystem::create_directory(folder / "busy.tmp");
+    EXPECT_FALSE(SaveXmlFile(document, folder / "x.xml", folder / "busy.tmp"));
+    EXPECT_EQ(ReadTextFile(folder / "x.xml"), "old");
+}
+
+}  // namespace

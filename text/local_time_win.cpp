@@ -1,9 +1,0 @@
-#include "text/local_time.h"
-
-#include <windows.h>
-
-LocalTime GetLocalTimeNow() {
-    SYSTEMTIME now;
-    GetLocalTime(&now);
-    return LocalTime{now.wYear, now.wMonth, now.wDay, now.wHour, now.wMinute, now.wSecond, now.wMilliseconds};
-}

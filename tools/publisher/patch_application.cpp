@@ -1,0 +1,37 @@
+#include "tools/publisher/patch_application.h"
+
+#include <filesystem>
+
+#include "base/exception.h"
+#include "base/file_operations.h"
+#include "base/paths.h"
+#include "net/download_entry.h"
+#include "net/http_downloader.h"
+#include "patch/patch_applier.h"
+#include "patch/patch_info_file.h"
+#include "patch/patch_progress_file.h"
+#include "patch/patch_stages.h"
+#include "tools/publisher/tree_listing.h"
+
+void ApplyPatchFolder(const std::string& patchDir, const std::string& installDir) {
+    PatchBatch batch;
+    batch.installationFolder = installDir;
+    batch.patchFolder = PathJoin(installDir, "tempPatch");
+    batch.patchedFilesFolder = PathJoin(batch.patchFolder, "patched");
+    batch.patchUri = "file://" + NarrowEntryName(std::filesystem::absolute(ToFileSystemPath(patchDir)), patchDir);
+    if (!MakeDirectories(batch.patchedFilesFolder)) throw Exception("Cannot create " + batch.patchedFilesFolder);
+
+    PatchInfoFile info;
+    info.Load(PathJoin(patchDir, "patchinfo.xml"));
+    PatchProgressFile progress;
+    progress.SetDirectory(installDir);
+    PatchApplier applier;
+    PatchStages stages(info, progress, applier);
+
+    HttpDownloader downloader;
+    const auto list = MakeDownloadList(ArchivesInFetchOrder(info), batch.patchUri, batch.patchFolder);
+    if (!list.empty()) downloader.Start(list, false);
+    stages.Prepare(batch, &downloader, nullptr);
+    stages.Apply(batch, nullptr, nullptr);
+    DeleteDirectory(batch.patchFolder, true);
+}
