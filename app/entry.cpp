@@ -6,10 +6,10 @@
 #include "app/updater.h"
 #include "app/updater_arguments.h"
 #include "base/exception.h"
+#include "base/log.h"
 #include "state/configuration.h"
 #include "state/registry_manager.h"
 #include "text/localization.h"
-#include "base/log.h"
 #include "ui/message_box.h"
 
 const char* const kLogFileName = "IronvaleUpdater.log";

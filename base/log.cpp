@@ -1,8 +1,8 @@
 #include "base/log.h"
 
-#include "base/paths.h"
 #include "base/local_time.h"
 #include "base/log_file.h"
+#include "base/paths.h"
 
 namespace {
 
@@ -53,9 +53,9 @@ bool IsOpen() { return LogFile::IsOpen(); }
 std::string FormatLine(const std::string& sourceFile, const std::string& message, LogLevel level, int32_t line) {
     const LocalTime now = GetLocalTimeNow();
     std::ostringstream out;
-    out << now.year << '-' << now.month << '-' << now.day << ' ' << now.hour << ':' << now.minute << ':'
-        << now.second << '.' << now.milliseconds << ' ' << BaseName(sourceFile) << '(' << line
-        << "): " << LevelName(level) << ": " << message << "\r\n";
+    out << now.year << '-' << now.month << '-' << now.day << ' ' << now.hour << ':' << now.minute << ':' << now.second
+        << '.' << now.milliseconds << ' ' << BaseName(sourceFile) << '(' << line << "): " << LevelName(level) << ": "
+        << message << "\r\n";
     return out.str();
 }
 

@@ -3,8 +3,8 @@
 #include "base/atomic_file.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
-#include "base/xml_nesting.h"
 #include "base/log.h"
+#include "base/xml_nesting.h"
 
 namespace {
 

@@ -102,7 +102,8 @@ private:
             const char* semicolon = std::find(p + (hex ? 3 : 2), end, ';');
             if (semicolon == end) return false;
             for (const char* q = semicolon - 1; *q != (hex ? 'x' : '#'); --q) {
-                if (!(hex ? std::isxdigit(static_cast<unsigned char>(*q)) : std::isdigit(static_cast<unsigned char>(*q)))) {
+                if (!(hex ? std::isxdigit(static_cast<unsigned char>(*q))
+                          : std::isdigit(static_cast<unsigned char>(*q)))) {
                     return false;
                 }
             }

@@ -1,7 +1,7 @@
 #include "net/file_copy.h"
 
-#include "net/location.h"
 #include "base/log.h"
+#include "net/location.h"
 
 DownloadStatus FileCopyTransfer(const std::string& url, const std::string& localPath,
                                 const std::atomic<bool>& stopRequested, IStatusView* statusView) {

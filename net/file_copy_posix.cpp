@@ -1,9 +1,9 @@
 #include <cstdio>
 #include <vector>
 
-#include "net/file_copy.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
+#include "net/file_copy.h"
 
 namespace {
 

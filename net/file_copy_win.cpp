@@ -15,6 +15,6 @@ DWORD CALLBACK OnCopyProgress(LARGE_INTEGER total, LARGE_INTEGER done, LARGE_INT
 
 bool CopyFileWithProgress(const std::string& source, const std::string& destination, const CopyProgress& progress) {
     // PROGRESS_CANCEL makes CopyFileEx delete the partial destination.
-    return CopyFileExA(source.c_str(), destination.c_str(), &OnCopyProgress,
-                       const_cast<CopyProgress*>(&progress), nullptr, 0) != FALSE;
+    return CopyFileExA(source.c_str(), destination.c_str(), &OnCopyProgress, const_cast<CopyProgress*>(&progress),
+                       nullptr, 0) != FALSE;
 }

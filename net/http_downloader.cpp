@@ -2,13 +2,13 @@
 
 #include <chrono>
 
+#include "base/exception.h"
+#include "base/log.h"
+#include "base/paths.h"
 #include "net/file_copy.h"
 #include "net/http_transfer.h"
 #include "net/location.h"
 #include "net/sign_url.h"
-#include "base/exception.h"
-#include "base/paths.h"
-#include "base/log.h"
 
 HttpDownloader::~HttpDownloader() {
     RequestStop();
@@ -111,8 +111,8 @@ void HttpDownloader::Fetch(DownloadEntry& entry) {
     LOG(Trace) << "Downloading file: " << entry.url;
     switch (ClassifyLocation(entry.url)) {
         case LocationKind::Http:
-            entry.status = HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry.localPath, stopRequested,
-                                        statusView);
+            entry.status =
+                HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry.localPath, stopRequested, statusView);
             break;
         case LocationKind::Relative:
             entry.url = PathJoin(GetProgramFolder(), entry.url);

@@ -2,9 +2,9 @@
 
 #include <cstdio>
 
-#include "net/http_transport.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
+#include "net/http_transport.h"
 
 namespace {
 

@@ -1,5 +1,5 @@
-#include <windows.h>
 #include <shlwapi.h>
+#include <windows.h>
 #include <wininet.h>
 
 #include "net/location.h"

@@ -3,17 +3,17 @@
 #include <set>
 
 #include "base/archive_source.h"
-#include "base/status_interfaces.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/file_stream.h"
+#include "base/log.h"
+#include "base/paths.h"
+#include "base/relative_path.h"
+#include "base/status_interfaces.h"
 #include "patch/patch_archive.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
-#include "base/paths.h"
-#include "base/relative_path.h"
 #include "patch/vcdiff_decoder.h"
-#include "base/log.h"
 
 namespace {
 
@@ -141,9 +141,9 @@ void PatchApplier::PrepareDiffFile(const std::string& path, const std::string& a
             << "Patching file " << path << ". Size: " << source.GetLength();
         VcdiffDecoder::Decode(&source, &delta, &target);
     } catch (const Exception& error) {
-        throw Exception("Failed to apply delta file " + deltaPath + " on " + sourcePath +
-                            ". Source message: " + error.message,
-                        ErrorCode::DeltaFailed);
+        throw Exception(
+            "Failed to apply delta file " + deltaPath + " on " + sourcePath + ". Source message: " + error.message,
+            ErrorCode::DeltaFailed);
     }
     RemoveFile(deltaPath);
 }

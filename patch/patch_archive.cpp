@@ -1,9 +1,9 @@
 #include "patch/patch_archive.h"
 
 #include "base/exception.h"
-#include "patch/lzma_decoder.h"
-#include "base/stream_readers.h"
 #include "base/log.h"
+#include "base/stream_readers.h"
+#include "patch/lzma_decoder.h"
 
 namespace {
 

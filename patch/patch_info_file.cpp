@@ -14,14 +14,10 @@ struct CursorList {
 
 // In the order of PatchInfoFile::Cursor.
 const CursorList kCursorLists[] = {
-    {"FileChanges", "diff"},
-    {"FileChanges", "new"},
-    {"FileChanges", "delete"},
-    {"DirectoryChanges", "delete"},
-    {"DirectoryChanges", "new"},
-    {"RegistryChanges", "delete"},
-    {"RegistryChanges", "new"},
-    {"RegistryGroupChanges", "delete"},
+    {"FileChanges", "diff"},         {"FileChanges", "new"},
+    {"FileChanges", "delete"},       {"DirectoryChanges", "delete"},
+    {"DirectoryChanges", "new"},     {"RegistryChanges", "delete"},
+    {"RegistryChanges", "new"},      {"RegistryGroupChanges", "delete"},
     {"RegistryGroupChanges", "new"},
 };
 

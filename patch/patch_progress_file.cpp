@@ -6,9 +6,9 @@
 
 #include "base/exception.h"
 #include "base/file_operations.h"
+#include "base/log.h"
 #include "base/paths.h"
 #include "base/xml_file.h"
-#include "base/log.h"
 
 namespace {
 

@@ -30,8 +30,7 @@ std::vector<std::string> ArchivesInFetchOrder(PatchInfoFile& info) {
 }
 
 void PatchStages::Prepare(const PatchBatch& batch, IArchiveSource* source, IStatusView* view) {
-    applier.Init(&info, &progress, batch.installationFolder, batch.patchedFilesFolder, batch.patchFolder, view,
-                 source);
+    applier.Init(&info, &progress, batch.installationFolder, batch.patchedFilesFolder, batch.patchFolder, view, source);
     prepared = true;
     applier.PreparePatch();
 }

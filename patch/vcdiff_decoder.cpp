@@ -5,11 +5,11 @@
 #include <new>
 #include <string>
 
-#include "patch/checksum.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
 #include "base/memory_stream.h"
 #include "base/stream_readers.h"
+#include "patch/checksum.h"
 
 namespace {
 

@@ -18,7 +18,6 @@ std::string TrimBlanks(const std::string& text) {
 
 }  // namespace
 
-
 RegistryManager::RegistryManager(RegistryHive root, const std::string& path) : hive(root), keyPath(path) {}
 
 bool RegistryManager::Locate(const std::string& path, const std::string& userSid) {

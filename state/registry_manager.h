@@ -40,7 +40,6 @@ private:
     std::string keyPath;
 };
 
-
 // The platform's registry, narrowed to what the manager needs. Key paths
 // are backslash-separated, value names and key names ignore case.
 namespace RegistryPlatform {

@@ -32,7 +32,7 @@ void Initialize() {
     if (state.initialized) return;
     state.initialized = true;
     state.languages = {
-        {"English", "ENG_US"}, {"French", "FRE_FR"},   {"German", "GER_DE"},  {"Italian", "ITA_IT"},
+        {"English", "ENG_US"},  {"French", "FRE_FR"}, {"German", "GER_DE"},  {"Italian", "ITA_IT"},
         {"Japanese", "JPN_JP"}, {"Polish", "POL_PL"}, {"Russian", "RUS_RU"}, {"Spanish", "SPA_ES"},
     };
     SetLanguage("English");
@@ -76,6 +76,7 @@ const std::wstring& GetWindowTitle() {
     // moment; build it once.
     static std::once_flag once;
     static std::wstring title;
-    std::call_once(once, [] { title = Localize("INSTALLER_GAME_NAME") + L" - " + Localize("INSTALLER_UPDATER_HEADER"); });
+    std::call_once(once,
+                   [] { title = Localize("INSTALLER_GAME_NAME") + L" - " + Localize("INSTALLER_UPDATER_HEADER"); });
     return title;
 }

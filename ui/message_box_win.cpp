@@ -38,8 +38,8 @@ UINT Style(const MessageBoxRequest& request) {
 }  // namespace
 
 MessageAnswer ShowMessageBox(const MessageBoxRequest& request) {
-    const int answer = MessageBoxW(static_cast<HWND>(request.owner), request.text.c_str(), request.caption.c_str(),
-                                   Style(request));
+    const int answer =
+        MessageBoxW(static_cast<HWND>(request.owner), request.text.c_str(), request.caption.c_str(), Style(request));
     switch (answer) {
         case IDYES:
             return MessageAnswer::Yes;

@@ -3,10 +3,10 @@
 #include <algorithm>
 
 #include "base/file_operations.h"
-#include "patch/patch_info_file.h"
+#include "base/log.h"
 #include "base/paths.h"
 #include "base/relative_path.h"
-#include "base/log.h"
+#include "patch/patch_info_file.h"
 
 namespace {
 
@@ -36,9 +36,8 @@ void Uninstaller::List::Remove(const std::string& item) {
 
 Uninstaller::Uninstaller(const std::string& path) : recordPath(path) { AddChanges(recordPath, false); }
 
-Uninstaller::Uninstaller(const std::string& installDir, const std::string& registryKeyPath,
-                         const std::string& path, const std::string& guid, bool isMachineWide,
-                         const std::string& userSid, bool loadExisting)
+Uninstaller::Uninstaller(const std::string& installDir, const std::string& registryKeyPath, const std::string& path,
+                         const std::string& guid, bool isMachineWide, const std::string& userSid, bool loadExisting)
     : installDirectory(installDir), recordPath(path), productGuid(guid), machineWide(isMachineWide), sid(userSid) {
     if (loadExisting) {
         AddChanges(recordPath, false);

@@ -67,14 +67,10 @@ TEST(UpdaterArgumentsTest, SwitchValuesAsTheyAreRead) {
         bool elevated;
         bool eula;
     } cases[] = {
-        {"-SERVERDELTATIME 12.9", 12, false, true},
-        {"-serverDeltaTime -3.7", -3, false, true},
-        {"-serverDeltaTime abc", 0, false, true},
-        {"-serverDeltaTime 1e12", 2147483647, false, true},
-        {"-internallyElevated 10", 0, true, true},
-        {"-internallyElevated true", 0, false, true},
-        {"-downloadEula TRUE", 0, false, true},
-        {"-downloadEula yes", 0, false, false},
+        {"-SERVERDELTATIME 12.9", 12, false, true}, {"-serverDeltaTime -3.7", -3, false, true},
+        {"-serverDeltaTime abc", 0, false, true},   {"-serverDeltaTime 1e12", 2147483647, false, true},
+        {"-internallyElevated 10", 0, true, true},  {"-internallyElevated true", 0, false, true},
+        {"-downloadEula TRUE", 0, false, true},     {"-downloadEula yes", 0, false, false},
     };
     for (const auto& c : cases) {
         const UpdaterArguments a = Parsed(c.line);

@@ -4,9 +4,9 @@
 
 #include "base/exception.h"
 #include "base/file_stream.h"
+#include "base/log.h"
 #include "base/paths.h"
 #include "tests/support/test_files.h"
-#include "base/log.h"
 
 namespace {
 
@@ -48,7 +48,8 @@ protected:
         Log::Close();
         std::remove(path.c_str());
     }
-    const std::string name = "ivl-log-test-" + std::to_string(::testing::UnitTest::GetInstance()->random_seed()) + ".log";
+    const std::string name =
+        "ivl-log-test-" + std::to_string(::testing::UnitTest::GetInstance()->random_seed()) + ".log";
     std::string path;
 };
 

@@ -183,8 +183,7 @@ TEST(ReadBigEndian7BitEncodedIntTest, DecodesAndRejects) {
         if (c.error == nullptr) {
             EXPECT_EQ(ReadBigEndian7BitEncodedInt(&stream), c.value);
         } else {
-            const std::string expected =
-                std::string(c.error) + " File:  Size: " + std::to_string(bytes.size());
+            const std::string expected = std::string(c.error) + " File:  Size: " + std::to_string(bytes.size());
             EXPECT_EQ(ThrownMessage([&] { ReadBigEndian7BitEncodedInt(&stream); }), expected);
         }
     }

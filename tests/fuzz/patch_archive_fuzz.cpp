@@ -5,10 +5,10 @@
 #include <string>
 
 #include "base/exception.h"
-#include "patch/lzma_decoder.h"
 #include "base/memory_stream.h"
-#include "patch/patch_archive.h"
 #include "base/paths.h"
+#include "patch/lzma_decoder.h"
+#include "patch/patch_archive.h"
 #include "tests/fuzz/fuzz_files.h"
 
 namespace {
@@ -44,9 +44,9 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     const std::string output = PathJoin(FuzzFolder(), "member.out");
     // The first member's own name reaches the decoder; a missing name
     // makes the scan walk every header.
-    const std::string first = size == 0 ? std::string()
-                                        : std::string(reinterpret_cast<const char*>(data) + 1,
-                                                      std::min<size_t>(data[0], size - 1));
+    const std::string first =
+        size == 0 ? std::string()
+                  : std::string(reinterpret_cast<const char*>(data) + 1, std::min<size_t>(data[0], size - 1));
     const size_t firstData = size == 0 ? 0 : std::min<size_t>(size, 1 + data[0] + 5);
     for (const std::string& name : {first, std::string("missing")}) {
         if (name == first && !ModestDictionary(data + firstData, size - firstData)) continue;

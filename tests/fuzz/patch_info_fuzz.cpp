@@ -22,8 +22,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     while (info.NextNewFile(item, archive)) {
     }
     while (info.NextDeletedFile(item) || info.NextDeletedDirectory(item) || info.NextNewDirectory(item) ||
-           info.NextDeletedRegistryKey(item) || info.NextNewRegistryKey(item) ||
-           info.NextDeletedRegistryGroup(item) || info.NextNewRegistryGroup(item)) {
+           info.NextDeletedRegistryKey(item) || info.NextNewRegistryKey(item) || info.NextDeletedRegistryGroup(item) ||
+           info.NextNewRegistryGroup(item)) {
     }
     info.CountFileAndDirectoryChanges();
     return 0;

@@ -4,10 +4,10 @@
 #include <random>
 
 #include "base/exception.h"
-#include "base/paths.h"
-#include "tests/support/test_files.h"
 #include "base/log.h"
 #include "base/log_file.h"
+#include "base/paths.h"
+#include "tests/support/test_files.h"
 
 void RecordingView::OnFileProgress(const std::string& localPath, uint32_t bytesDone, uint32_t bytesTotal) {
     HttpDownloader* target = nullptr;

@@ -5,9 +5,9 @@
 #include <filesystem>
 #include <random>
 
+#include "base/paths.h"
 #include "net/http_downloader.h"
 #include "net/location.h"
-#include "base/paths.h"
 #include "tests/net/download_test_helpers.h"
 #include "tests/support/test_files.h"
 
@@ -82,7 +82,8 @@ TEST_F(FileCopyDownloadTest, FailedCopiesAreLoggedAndLeaveNoFile) {
         std::string location;
         std::string logged;
     } cases[] = {
-        {"https", "https://patches.example.com/a.bin", PathJoin(GetProgramFolder(), "https://patches.example.com/a.bin")},
+        {"https", "https://patches.example.com/a.bin",
+         PathJoin(GetProgramFolder(), "https://patches.example.com/a.bin")},
         {"missing", "file://" + (folder / "missing.bin"), "file://" + (folder / "missing.bin")},
         {"folder", "file://" + folder.Path(), "file://" + folder.Path()},
     };

@@ -5,9 +5,9 @@
 #include <chrono>
 #include <thread>
 
+#include "base/paths.h"
 #include "net/http_downloader.h"
 #include "net/sign_url.h"
-#include "base/paths.h"
 #include "tests/net/download_test_helpers.h"
 #include "tests/support/http_test_server.h"
 #include "tests/support/test_files.h"
@@ -205,8 +205,8 @@ TEST_F(HttpDownloadTest, ListStopsAtTheFirstFailureAndLeavesTheRestPending) {
 
     std::vector<DownloadStatus> outcomes;
     for (const DownloadEntry& entry : downloader.Entries()) outcomes.push_back(entry.status);
-    EXPECT_EQ(outcomes, (std::vector<DownloadStatus>{DownloadStatus::Done, DownloadStatus::NotFound,
-                                                     DownloadStatus::Pending}));
+    EXPECT_EQ(outcomes,
+              (std::vector<DownloadStatus>{DownloadStatus::Done, DownloadStatus::NotFound, DownloadStatus::Pending}));
     EXPECT_FALSE(PathExists(folder / "three.bin"));
     EXPECT_EQ(server.Requests().size(), 2u);
 }

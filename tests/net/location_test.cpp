@@ -3,10 +3,10 @@
 #include <ctime>
 #include <regex>
 
+#include "base/paths.h"
 #include "net/location.h"
 #include "net/md5.h"
 #include "net/sign_url.h"
-#include "base/paths.h"
 #include "tests/support/http_test_server.h"
 
 namespace {

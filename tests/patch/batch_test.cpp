@@ -69,10 +69,7 @@ const BatchCase kCases[] = {
      nullptr},
     {"EmptyFiles",
      [] {
-         return Tree()
-             .File("grows.txt", "")
-             .File("shrinks.txt", SeededBytes(4000, 8))
-             .File("stays-empty-gone.txt", "");
+         return Tree().File("grows.txt", "").File("shrinks.txt", SeededBytes(4000, 8)).File("stays-empty-gone.txt", "");
      },
      [] { return Tree().File("grows.txt", "now it has content").File("shrinks.txt", "").File("new-empty.txt", ""); },
      nullptr},

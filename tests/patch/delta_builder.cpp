@@ -2,9 +2,9 @@
 
 #include <vector>
 
-#include "patch/code_table.h"
 #include "base/exception.h"
 #include "base/memory_stream.h"
+#include "patch/code_table.h"
 #include "patch/vcdiff_decoder.h"
 
 std::string Varint(uint32_t value) {

@@ -3,14 +3,14 @@
 // own output.
 #include <gtest/gtest.h>
 
-#include "patch/checksum.h"
-#include "patch/code_table.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
 #include "base/memory_stream.h"
+#include "patch/checksum.h"
+#include "patch/code_table.h"
 #include "patch/vcdiff_decoder.h"
-#include "tests/support/test_files.h"
 #include "tests/patch/delta_builder.h"
+#include "tests/support/test_files.h"
 
 namespace {
 

@@ -5,8 +5,8 @@
 #include <string>
 
 #include "base/exception.h"
-#include "patch/lzma_decoder.h"
 #include "base/memory_stream.h"
+#include "patch/lzma_decoder.h"
 #include "tests/support/format_test_helpers.h"
 #include "tools/publisher/lzma_encoder.h"
 

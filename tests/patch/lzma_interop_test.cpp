@@ -42,8 +42,8 @@ TEST(LzmaInterop, UnpacksMembersMadeByXzPythonAndTheSdk) {
         const char* member;
         const std::string& expected;
     } cases[] = {
-        {"data\\xz.txt", text},   {"data\\python.txt", text}, {"data\\python-lc0lp2pb0.txt", text},
-        {"data\\sdk.txt", text},  {"empty-xz", nothing},      {"empty-python", nothing},
+        {"data\\xz.txt", text},  {"data\\python.txt", text}, {"data\\python-lc0lp2pb0.txt", text},
+        {"data\\sdk.txt", text}, {"empty-xz", nothing},      {"empty-python", nothing},
         {"empty-sdk", nothing},
     };
     PatchArchive archive(archivePath);

@@ -118,14 +118,10 @@ TEST(PatchProgressFile, RecoversFromWhicheverRecordIsReadable) {
         bool found;
         int32_t action;  // which record was taken: 1 from PPF.xml, 2 from _PPF.xml
     } cases[] = {
-        {Content::Absent, Content::Absent, false, false, -1},
-        {Content::Valid, Content::Absent, false, true, 1},
-        {Content::Broken, Content::Absent, true, false, -1},
-        {Content::Absent, Content::Valid, false, true, 2},
-        {Content::Absent, Content::Broken, true, false, -1},
-        {Content::Valid, Content::Valid, false, true, 1},
-        {Content::Valid, Content::Broken, false, true, 1},
-        {Content::Broken, Content::Valid, false, true, 2},
+        {Content::Absent, Content::Absent, false, false, -1}, {Content::Valid, Content::Absent, false, true, 1},
+        {Content::Broken, Content::Absent, true, false, -1},  {Content::Absent, Content::Valid, false, true, 2},
+        {Content::Absent, Content::Broken, true, false, -1},  {Content::Valid, Content::Valid, false, true, 1},
+        {Content::Valid, Content::Broken, false, true, 1},    {Content::Broken, Content::Valid, false, true, 2},
         {Content::Broken, Content::Broken, true, false, -1},
     };
     for (const auto& c : cases) {

@@ -1,10 +1,10 @@
 #include <gtest/gtest.h>
 
-#include "base/status_interfaces.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
-#include "patch/patch_progress_file.h"
 #include "base/paths.h"
+#include "base/status_interfaces.h"
+#include "patch/patch_progress_file.h"
 #include "tests/patch/stage_two_fixture.h"
 #include "tests/support/test_files.h"
 

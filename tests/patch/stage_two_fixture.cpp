@@ -4,10 +4,10 @@
 
 #include "base/exception.h"
 #include "base/file_operations.h"
+#include "base/paths.h"
 #include "patch/patch_applier.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
-#include "base/paths.h"
 #include "patch/patch_stages.h"
 #include "tests/support/batch_fixture.h"
 #include "tests/support/test_files.h"

@@ -8,8 +8,8 @@
 #include <string>
 #include <thread>
 
-#include "patch/patch_progress_file.h"
 #include "base/paths.h"
+#include "patch/patch_progress_file.h"
 #include "tests/patch/record_writer_process.h"
 #include "tests/support/test_files.h"
 

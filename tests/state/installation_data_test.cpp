@@ -67,9 +67,10 @@ TEST(InstallationData, SplitsTheDigestListIntoPairs) {
     TempFolder folder;
     for (const auto& c : cases) {
         SCOPED_TRACE(c.text);
-        WriteTextFile(folder / "InstallationData.xml", std::string("<I><CurrentVersion>1</CurrentVersion>"
-                                                                   "<PatcherVersion>3</PatcherVersion><InstalledHashes>") +
-                                                           c.text + "</InstalledHashes></I>");
+        WriteTextFile(folder / "InstallationData.xml",
+                      std::string("<I><CurrentVersion>1</CurrentVersion>"
+                                  "<PatcherVersion>3</PatcherVersion><InstalledHashes>") +
+                          c.text + "</InstalledHashes></I>");
         InstallationData data;
         data.Load(folder.Path());
         EXPECT_EQ(data.installedHashes, c.expected);

@@ -134,7 +134,8 @@ TestBatch::TestBatch(const Tree& installed, const Tree& target, ArchiveChooser c
         use("new", file.first, newPath);
     }
     for (const auto& file : installed.files) {
-        if (target.files.count(file.first) == 0) items.push_back({"FileChanges", "delete", Backslashed(file.first), ""});
+        if (target.files.count(file.first) == 0)
+            items.push_back({"FileChanges", "delete", Backslashed(file.first), ""});
     }
     // Deepest folders first, so every deletion finds its folder still there.
     for (auto folder = installed.folders.rbegin(); folder != installed.folders.rend(); ++folder) {

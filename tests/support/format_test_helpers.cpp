@@ -1,9 +1,9 @@
 #include "tests/support/format_test_helpers.h"
 
-#include "patch/lzma_decoder.h"
 #include "base/memory_stream.h"
 #include "base/paths.h"
 #include "base/xml_file.h"
+#include "patch/lzma_decoder.h"
 #include "tests/support/test_files.h"
 
 std::string FixtureText() {

@@ -6,8 +6,8 @@
 #include <fstream>
 #include <sstream>
 
-#include "net/md5.h"
 #include "base/paths.h"
+#include "net/md5.h"
 
 namespace {
 

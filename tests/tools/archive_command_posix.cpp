@@ -32,12 +32,13 @@ TEST(ArchiveCommand, PacksListsAndExtractsWhatXzAlsoReads) {
     WriteTextFile(folder / "empty.bin", "");
     const std::string archive = folder / "a.pak";
     ASSERT_TRUE(Shell("'" + tool + "' archive pack '" + archive + "' 'dir\\input.bin=" + (folder / "input.bin") +
-                    "' 'empty.bin=" + (folder / "empty.bin") + "' > /dev/null"));
+                      "' 'empty.bin=" + (folder / "empty.bin") + "' > /dev/null"));
     ASSERT_TRUE(Shell("'" + tool + "' archive list '" + archive + "' > '" + (folder / "list.txt") + "'"));
     const std::string list = ReadTextFile(folder / "list.txt");
     EXPECT_NE(list.find(std::to_string(data.size()) + " "), std::string::npos) << list;
     EXPECT_NE(list.find("dir\\input.bin"), std::string::npos) << list;
-    ASSERT_TRUE(Shell("'" + tool + "' archive extract '" + archive + "' 'dir\\input.bin' '" + (folder / "out.bin") + "'"));
+    ASSERT_TRUE(
+        Shell("'" + tool + "' archive extract '" + archive + "' 'dir\\input.bin' '" + (folder / "out.bin") + "'"));
     EXPECT_EQ(ReadTextFile(folder / "out.bin"), data);
     EXPECT_FALSE(Shell("'" + tool + "' archive extract '" + archive + "' nope '" + (folder / "x") + "' 2>/dev/null"));
 

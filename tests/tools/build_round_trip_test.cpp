@@ -5,8 +5,8 @@
 #include <filesystem>
 
 #include "base/paths.h"
-#include "tests/tools/tree_maker.h"
 #include "tests/support/test_files.h"
+#include "tests/tools/tree_maker.h"
 #include "tools/publisher/patch_builder.h"
 #include "tools/publisher/patch_verifier.h"
 

@@ -7,10 +7,10 @@
 
 #include "base/exception.h"
 #include "base/file_stream.h"
-#include "patch/patch_info_file.h"
 #include "base/paths.h"
-#include "tests/tools/tree_maker.h"
+#include "patch/patch_info_file.h"
 #include "tests/support/test_files.h"
+#include "tests/tools/tree_maker.h"
 #include "tools/publisher/patch_builder.h"
 
 namespace {

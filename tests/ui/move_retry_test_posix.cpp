@@ -58,8 +58,7 @@ TEST(ApplierMoveRetry, RetryAsksAgainAndCancelEndsWithStepFailed) {
     }
     EXPECT_EQ(Count(shown.str(), "Failed to move the file:"), 2u) << shown.str();
     EXPECT_NE(shown.str().find(source), std::string::npos);
-    EXPECT_NE(shown.str().find("If you have any of these files open, please close them and retry."),
-              std::string::npos);
+    EXPECT_NE(shown.str().find("If you have any of these files open, please close them and retry."), std::string::npos);
     EXPECT_TRUE(PathExists(source));
     EXPECT_EQ(ReadTextFile(PathJoin(destination, "inside.txt")), "in the way");
 }

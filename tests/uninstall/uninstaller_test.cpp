@@ -23,11 +23,10 @@ std::string Description(const std::string& fileChanges, const std::string& rest 
 TEST(Uninstaller, RecordsWhatWasAddedAndNotTakenAwayLater) {
     TempFolder folder;
     const std::string install = folder / "Game";
-    WriteTextFile(folder / "p1.xml",
-                  Description("<new Path=\"a\\b.txt\" File=\"1.pak\" /><new Path=\"keep.txt\" />"
-                              "<diff Path=\"patched.exe\" File=\"1.pak\" />",
-                              "<DirectoryChanges><new Path=\"a\" /></DirectoryChanges>"
-                              "<RegistryChanges><new Path=\"Sub\" /></RegistryChanges>"));
+    WriteTextFile(folder / "p1.xml", Description("<new Path=\"a\\b.txt\" File=\"1.pak\" /><new Path=\"keep.txt\" />"
+                                                 "<diff Path=\"patched.exe\" File=\"1.pak\" />",
+                                                 "<DirectoryChanges><new Path=\"a\" /></DirectoryChanges>"
+                                                 "<RegistryChanges><new Path=\"Sub\" /></RegistryChanges>"));
     WriteTextFile(folder / "p2.xml", Description("<delete Path=\"a\\b.txt\" /><delete Path=\"keep.txt\" />"
                                                  "<new Path=\"keep.txt\" /><new Path=\"keep.txt\" />"));
     Uninstaller record(install, "Software\\Ironvale", folder / "Uninstall.xml", "{GUID}", true, "", false);
@@ -89,21 +88,22 @@ TEST(Uninstaller, SavesAndReadsTheRecordBackAsStored) {
         ASSERT_TRUE(record.Save());
     }
     const std::string file = PathJoin(folder / "Game", "x.dat");
-    EXPECT_EQ(ReadTextFile(recordPath), WithPlatformLineBreaks("<?xml version=\"1.0\" ?>\n"
-                                                               "<IronvaleWestPatch>\n"
-                                                               "    <FileChanges>\n"
-                                                               "        <new Path=\"" +
-                                                               file +
-                                                               "\" />\n"
-                                                               "    </FileChanges>\n"
-                                                               "    <DirectoryChanges />\n"
-                                                               "    <RegistryChanges />\n"
-                                                               "    <RegistryGroupChanges>\n"
-                                                               "        <new Path=\"S-1\\Software\\Ironvale\\G\" />\n"
-                                                               "    </RegistryGroupChanges>\n"
-                                                               "    <RegistryHive>HKEY_USERS</RegistryHive>\n"
-                                                               "    <RegistryPath>S-1\\Software\\Ironvale</RegistryPath>\n"
-                                                               "</IronvaleWestPatch>\n"));
+    EXPECT_EQ(ReadTextFile(recordPath),
+              WithPlatformLineBreaks("<?xml version=\"1.0\" ?>\n"
+                                     "<IronvaleWestPatch>\n"
+                                     "    <FileChanges>\n"
+                                     "        <new Path=\"" +
+                                     file +
+                                     "\" />\n"
+                                     "    </FileChanges>\n"
+                                     "    <DirectoryChanges />\n"
+                                     "    <RegistryChanges />\n"
+                                     "    <RegistryGroupChanges>\n"
+                                     "        <new Path=\"S-1\\Software\\Ironvale\\G\" />\n"
+                                     "    </RegistryGroupChanges>\n"
+                                     "    <RegistryHive>HKEY_USERS</RegistryHive>\n"
+                                     "    <RegistryPath>S-1\\Software\\Ironvale</RegistryPath>\n"
+                                     "</IronvaleWestPatch>\n"));
 
     Uninstaller reading(recordPath);
     EXPECT_EQ(reading.GetFiles(), List{file});
@@ -130,12 +130,13 @@ TEST(Uninstaller, RemovesFilesThenDirectoriesDeepestFirst) {
     std::filesystem::create_directories(kept);
     WriteTextFile(PathJoin(deep, "a.bin"), "a");
     WriteTextFile(PathJoin(kept, "user.sav"), "not recorded");
-    const std::string list = "<new Path=\"" + PathJoin(deep, "a.bin") + "\" /><new Path=\"" +
-                             PathJoin(game, "gone.txt") + "\" />";
+    const std::string list =
+        "<new Path=\"" + PathJoin(deep, "a.bin") + "\" /><new Path=\"" + PathJoin(game, "gone.txt") + "\" />";
     // Listed shallowest first: only the deepest-first order can remove
     // them all with plain (non-recursive) removals.
     const std::string directories = "<DirectoryChanges><new Path=\"" + game + "\" /><new Path=\"" + kept +
-                                    "\" /><new Path=\"" + data + "\" /><new Path=\"" + deep + "\" /><new Path=\"\" />"
+                                    "\" /><new Path=\"" + data + "\" /><new Path=\"" + deep +
+                                    "\" /><new Path=\"\" />"
                                     "</DirectoryChanges>";
     WriteTextFile(folder / "Uninstall.xml", Description(list, directories));
 

@@ -7,8 +7,8 @@
 
 #include "base/exception.h"
 #include "base/file_stream.h"
-#include "patch/patch_archive.h"
 #include "base/stream_readers.h"
+#include "patch/patch_archive.h"
 #include "tools/ironvale_patch/command.h"
 #include "tools/publisher/archive_writer.h"
 

@@ -112,7 +112,8 @@ std::string EncodeLzma(const std::string& data, const LzmaOptions& options) {
     MemoryStream source;
     source.Attach(reinterpret_cast<uint8_t*>(&bytes[0]), static_cast<int32_t>(bytes.size()));
     std::string result;
-    EncodeLzma(source, bytes.size(), options,
-               [&](const uint8_t* chunk, size_t length) { result.append(reinterpret_cast<const char*>(chunk), length); });
+    EncodeLzma(source, bytes.size(), options, [&](const uint8_t* chunk, size_t length) {
+        result.append(reinterpret_cast<const char*>(chunk), length);
+    });
     return result;
 }

@@ -13,8 +13,8 @@ struct LzmaOptions {
     int lc = 3;
     int lp = 0;
     int pb = 2;
-    bool storeSize = true;        // false: size field all ones, end marker
-    bool endMarker = false;       // an end marker also when the size is stored
+    bool storeSize = true;   // false: size field all ones, end marker
+    bool endMarker = false;  // an end marker also when the size is stored
 };
 
 using ByteSink = std::function<void(const uint8_t* data, size_t size)>;

@@ -1,8 +1,8 @@
 #include "tools/publisher/patch_description.h"
 
 #include "base/exception.h"
-#include "patch/patch_info_file.h"
 #include "base/xml_file.h"
+#include "patch/patch_info_file.h"
 
 namespace {
 

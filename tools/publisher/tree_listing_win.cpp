@@ -2,8 +2,8 @@
 
 #include <windows.h>
 
-#include "base/exception.h"
 #include "base/encoding.h"
+#include "base/exception.h"
 
 std::string NarrowEntryName(const std::filesystem::path& name, const std::string& folder) {
     const std::wstring& wide = name.native();
