@@ -3,9 +3,10 @@
 // Waits for a dialog box (class #32770) with the given caption, prints its
 // message text (UTF-8, one line per text line) and presses the button with
 // the given control id. Exit 0 when pressed, 2 when no dialog appeared.
+#include <windows.h>
+
 #include <fcntl.h>
 #include <io.h>
-#include <windows.h>
 
 #include <cstdio>
 #include <cwchar>
