@@ -1,11 +1,12 @@
 #!/usr/bin/env python3
-"""Seeded pairs of old and new files and their deltas as xdelta3 writes them
-without secondary compression, with and without window checksums.
+"""Seeded old and new files and their xdelta3 deltas (no secondary compressor;
+with and without window checksums).
 
-  make_xdelta3_cases.py OUTDIR               the files, and OUTDIR/manifest.txt
-                                             of "SOURCE DELTA TARGET" lines
-  make_xdelta3_cases.py --fuzz-seeds OUTDIR  small ones as fuzz inputs: 2-byte
-                                             source length, source, delta
+  make_xdelta3_cases.py OUTDIR               the files and OUTDIR/manifest.txt
+  make_xdelta3_cases.py --fuzz-seeds OUTDIR  small ones packed as fuzz inputs
+
+Manifest lines name SOURCE DELTA TARGET; a fuzz input is the 2-byte source
+length (little-endian), the source, then the delta.
 """
 import random
 import struct
@@ -17,8 +18,7 @@ EDITS = ["replace", "insert", "delete"]
 
 
 def edit(rng, data, count, max_run, kinds):
-    """Applies count scattered edits (replace, insert, delete) of up to
-    max_run bytes, built piecewise so that large files stay fast."""
+    """count scattered edits of up to max_run bytes, built piecewise for speed."""
     pieces, last = [], 0
     for pos in sorted(rng.randrange(len(data) + 1) for _ in range(count)):
         if pos < last:

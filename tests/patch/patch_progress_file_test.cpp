@@ -43,8 +43,9 @@ TEST(PatchProgressFile, WritesTheRecordAsTinyXmlPrintsItAndReadsItBack) {
     EXPECT_FALSE(PathExists(folder / "_PPF.xml"));
 }
 
-// The records on disk, and the outcome: the action and file of the record
-// taken (which is then "PPF.xml", alone), "none", or the error.
+// "PPF.xml", "_PPF.xml" (or none), and the outcome: the action and file of
+// the record taken (which is then "PPF.xml", alone; a missing file name is
+// an empty one), "none", or the error.
 TEST(PatchProgressFile, RecoversFromWhicheverRecordIsReadable) {
     const std::string none = "(no file)";
     const std::string one = RecordText(1, "f");
@@ -52,22 +53,15 @@ TEST(PatchProgressFile, RecoversFromWhicheverRecordIsReadable) {
     const std::string torn = one.substr(0, 100);
     const std::string lost = "Unrecoverable interrupted batch, reinstall necessary. (3)";
     std::vector<std::array<std::string, 3>> cases = {
-        // "PPF.xml", "_PPF.xml", outcome
-        {none, none, "none"},
-        {one, none, "1 f"},
-        {torn, none, lost},
-        {none, two, "2 f"},
-        {none, torn, lost},
-        {one, two, "1 f"},
-        {one, torn, "1 f"},
-        {torn, two, "2 f"},
-        {torn, torn, lost},
-        {"<S><PatchStatus action=\"4\" /></S>", none, "4 "},  // no file name is an empty one
-        {"<S><PatchStatus action=\"12abc\" file=\"f\" /></S>", none, lost},
-        {"<S><PatchStatus action=\"2147483648\" file=\"f\" /></S>", none, lost},
-        {"<S><PatchStatus file=\"f\" /></S>", none, lost},
-        {"<S><Version>2</Version></S>", two, "2 f"},
+        {none, none, "none"}, {one, none, "1 f"}, {torn, none, lost}, {none, two, "2 f"}, {none, torn, lost},
+        {one, two, "1 f"},    {one, torn, "1 f"}, {torn, two, "2 f"}, {torn, torn, lost},
     };
+    cases.push_back({"<S><PatchStatus action=\"4\" /></S>", none, "4 "});
+    for (const char* unreadable :
+         {"<S><PatchStatus action=\"12abc\" file=\"f\" /></S>", "<S><PatchStatus file=\"f\" /></S>",
+          "<S><PatchStatus action=\"2147483648\" file=\"f\" /></S>", "<S><Version>2</Version></S>"}) {
+        cases.push_back({unreadable, two, "2 f"});
+    }
     // A write cut off anywhere before the end of its XML leaves the previous
     // record, and no such prefix of the new one reads as a record.
     for (size_t k = 0; k + 1 < two.size(); ++k) {
