@@ -1,12 +1,10 @@
-# The interop cases: seeded file pairs and their deltas made by xdelta3 at
-# build time, so the Windows build decodes the same real xdelta3 output
-# under Wine as the native build does.
+# The VCDIFF interop cases, made by xdelta3 at build time so that the Windows
+# build decodes under Wine the same real xdelta3 output as the native one.
 set(vcdiff_cases_dir "${CMAKE_CURRENT_BINARY_DIR}/vcdiff-cases")
-set(vcdiff_cases_script "${CMAKE_CURRENT_SOURCE_DIR}/patch/make_xdelta3_cases.py")
 add_custom_command(
   OUTPUT "${vcdiff_cases_dir}/manifest.txt"
-  COMMAND "${Python3_EXECUTABLE}" "${vcdiff_cases_script}" "${vcdiff_cases_dir}"
-  DEPENDS "${vcdiff_cases_script}"
+  COMMAND "${Python3_EXECUTABLE}" "${CMAKE_CURRENT_SOURCE_DIR}/patch/make_xdelta3_cases.py" "${vcdiff_cases_dir}"
+  DEPENDS "${CMAKE_CURRENT_SOURCE_DIR}/patch/make_xdelta3_cases.py"
   COMMENT "Encoding the VCDIFF interop cases with xdelta3"
   VERBATIM)
 add_custom_target(vcdiff_cases DEPENDS "${vcdiff_cases_dir}/manifest.txt")

@@ -1,169 +1,91 @@
 // The progress record: its exact bytes, what counts as unreadable, and the
-// recovery matrix of "PPF.xml" and "_PPF.xml".
+// recovery matrix of "PPF.xml" and "_PPF.xml" with every torn write.
+#include "patch/patch_progress_file.h"
+
 #include <gtest/gtest.h>
 
+#include <array>
 #include <string>
+#include <vector>
 
 #include "base/exception.h"
-#include "patch/patch_progress_file.h"
 #include "tests/support/format_test_helpers.h"
 #include "tests/support/test_files.h"
 
 namespace {
 
-void Fill(PatchProgressFile& record, int32_t action, const std::string& file) {
-    record.SetPatchPath("C:\\Game\\Patch");
-    record.SetPatchedFilesPath("C:\\Game\\Patch\\Patched");
-    record.SetPatchUri("http://host/patches/1_to_2/");
-    record.SetVersion("2.0");
-    record.SetActionIndex(action);
-    record.SetFile(file);
-}
-
 std::string RecordText(int32_t action, const std::string& file) {
-    return "<?xml version=\"1.0\" ?>\n"
-           "<WestPatchStatus>\n"
-           "    <PatchPath>C:\\Game\\Patch</PatchPath>\n"
+    return "<?xml version=\"1.0\" ?>\n<WestPatchStatus>\n    <PatchPath>C:\\Game\\Patch</PatchPath>\n"
            "    <PatchedFilesPath>C:\\Game\\Patch\\Patched</PatchedFilesPath>\n"
-           "    <PatchURI>http://host/patches/1_to_2/</PatchURI>\n"
-           "    <PatchStatus action=\"" +
-           std::to_string(action) + "\" file=\"" + file +
-           "\" />\n"
-           "    <Version>2.0</Version>\n"
-           "</WestPatchStatus>\n";
+           "    <PatchURI>http://host/patches/1_to_2/</PatchURI>\n    <PatchStatus action=\"" +
+           std::to_string(action) + "\" file=\"" + file + "\" />\n    <Version>2.0</Version>\n</WestPatchStatus>\n";
 }
 
-TEST(PatchProgressFile, WritesTheRecordAsTinyXmlPrintsIt) {
+std::string Fields(const PatchProgressFile& record) {
+    return record.GetPatchPath() + "|" + record.GetPatchedFilesPath() + "|" + record.GetPatchUri() + "|" +
+           record.GetVersion() + "|" + std::to_string(record.GetActionIndex()) + "|" + record.GetFile();
+}
+
+TEST(PatchProgressFile, WritesTheRecordAsTinyXmlPrintsItAndReadsItBack) {
     TempFolder folder;
+    WriteTextFile(folder / "full.xml", RecordText(12, "data\\old.bin"));
     PatchProgressFile record;
     record.SetDirectory(folder.Path());
-    Fill(record, -1, "");
     ASSERT_TRUE(record.WriteRecord());
-    EXPECT_EQ(ReadTextFile(folder / "PPF.xml"), WithPlatformLineBreaks(RecordText(-1, "")));
-    EXPECT_FALSE(PathExists(folder / "_PPF.xml"));
+    PatchProgressFile loaded;
+    loaded.LoadRecord(folder / "full.xml");
+    loaded.LoadRecord(folder / "PPF.xml");
+    EXPECT_EQ(Fields(loaded), "||||-1|") << "empty values replace the loaded ones";
 
-    Fill(record, 12, "data\\old.bin");
+    record.LoadRecord(folder / "full.xml");
     ASSERT_TRUE(record.WriteRecord());
     EXPECT_EQ(ReadTextFile(folder / "PPF.xml"), WithPlatformLineBreaks(RecordText(12, "data\\old.bin")));
-
-    PatchProgressFile loaded;
-    loaded.LoadRecord(folder / "PPF.xml");
-    EXPECT_EQ(loaded.GetPatchPath(), "C:\\Game\\Patch");
-    EXPECT_EQ(loaded.GetPatchedFilesPath(), "C:\\Game\\Patch\\Patched");
-    EXPECT_EQ(loaded.GetPatchUri(), "http://host/patches/1_to_2/");
-    EXPECT_EQ(loaded.GetVersion(), "2.0");
-    EXPECT_EQ(loaded.GetActionIndex(), 12);
-    EXPECT_EQ(loaded.GetFile(), "data\\old.bin");
+    EXPECT_FALSE(PathExists(folder / "_PPF.xml"));
 }
 
-TEST(PatchProgressFile, EmptyValuesRoundTrip) {
-    TempFolder folder;
-    PatchProgressFile record;
-    record.SetDirectory(folder.Path());
-    ASSERT_TRUE(record.WriteRecord());
-    EXPECT_NE(ReadTextFile(folder / "PPF.xml").find("<PatchURI></PatchURI>"), std::string::npos);
-    PatchProgressFile loaded;
-    Fill(loaded, 5, "x");
-    loaded.LoadRecord(folder / "PPF.xml");
-    EXPECT_EQ(loaded.GetPatchPath(), "");
-    EXPECT_EQ(loaded.GetPatchUri(), "");
-    EXPECT_EQ(loaded.GetVersion(), "");
-    EXPECT_EQ(loaded.GetActionIndex(), -1);
-    EXPECT_EQ(loaded.GetFile(), "");
-}
-
-TEST(PatchProgressFile, UnreadableRecordsChangeNothing) {
-    const struct {
-        const char* name;
-        std::string content;
-    } cases[] = {
-        {"action is not a number", "<S><PatchStatus action=\"abc\" file=\"f\" /></S>"},
-        {"action with trailing letters", "<S><PatchStatus action=\"12abc\" file=\"f\" /></S>"},
-        {"action too large", "<S><PatchStatus action=\"2147483648\" file=\"f\" /></S>"},
-        {"action missing", "<S><PatchStatus file=\"f\" /></S>"},
-        {"no status", "<S><Version>2</Version></S>"},
-        {"torn", RecordText(3, "f").substr(0, 150)},
-        {"empty file", ""},
-    };
-    TempFolder folder;
-    for (const auto& c : cases) {
-        SCOPED_TRACE(c.name);
-        WriteTextFile(folder / "PPF.xml", c.content);
-        PatchProgressFile record;
-        Fill(record, 7, "kept");
-        try {
-            record.LoadRecord(folder / "PPF.xml");
-            ADD_FAILURE() << "no error";
-        } catch (const Exception& error) {
-            EXPECT_EQ(error.message, "Failed to load PatchProgressFile file.");
-        }
-        EXPECT_EQ(record.GetActionIndex(), 7);
-        EXPECT_EQ(record.GetFile(), "kept");
-    }
-    // A missing file attribute alone is just an empty file name.
-    WriteTextFile(folder / "PPF.xml", "<S><PatchStatus action=\"4\" /></S>");
-    PatchProgressFile record;
-    record.LoadRecord(folder / "PPF.xml");
-    EXPECT_EQ(record.GetActionIndex(), 4);
-    EXPECT_EQ(record.GetFile(), "");
-}
-
-enum class Content { Absent, Valid, Broken };
-
+// "PPF.xml", "_PPF.xml" (or none), and the outcome: the action and file of
+// the record taken (which is then "PPF.xml", alone; a missing file name is
+// an empty one), "none", or the error.
 TEST(PatchProgressFile, RecoversFromWhicheverRecordIsReadable) {
-    const struct {
-        Content record;
-        Content alternative;
-        bool throws;
-        bool found;
-        int32_t action;  // which record was taken: 1 from PPF.xml, 2 from _PPF.xml
-    } cases[] = {
-        {Content::Absent, Content::Absent, false, false, -1}, {Content::Valid, Content::Absent, false, true, 1},
-        {Content::Broken, Content::Absent, true, false, -1},  {Content::Absent, Content::Valid, false, true, 2},
-        {Content::Absent, Content::Broken, true, false, -1},  {Content::Valid, Content::Valid, false, true, 1},
-        {Content::Valid, Content::Broken, false, true, 1},    {Content::Broken, Content::Valid, false, true, 2},
-        {Content::Broken, Content::Broken, true, false, -1},
+    const std::string none = "(no file)";
+    const std::string one = RecordText(1, "f");
+    const std::string two = RecordText(2, "f");
+    const std::string torn = one.substr(0, 100);
+    const std::string lost = "Unrecoverable interrupted batch, reinstall necessary. (3)";
+    std::vector<std::array<std::string, 3>> cases = {
+        {none, none, "none"}, {one, none, "1 f"}, {torn, none, lost}, {none, two, "2 f"}, {none, torn, lost},
+        {one, two, "1 f"},    {one, torn, "1 f"}, {torn, two, "2 f"}, {torn, torn, lost},
     };
-    for (const auto& c : cases) {
-        SCOPED_TRACE(testing::Message() << "PPF " << static_cast<int>(c.record) << ", _PPF "
-                                        << static_cast<int>(c.alternative));
-        TempFolder folder;
-        const auto place = [&](Content content, const std::string& name, int32_t action) {
-            if (content == Content::Valid) WriteTextFile(folder / name, RecordText(action, "f"));
-            if (content == Content::Broken) WriteTextFile(folder / name, RecordText(action, "f").substr(0, 100));
-        };
-        place(c.record, "PPF.xml", 1);
-        place(c.alternative, "_PPF.xml", 2);
-        PatchProgressFile progress;
-        progress.SetDirectory(folder.Path());
-        if (c.throws) {
-            try {
-                progress.Recover();
-                ADD_FAILURE() << "no error";
-            } catch (const Exception& error) {
-                EXPECT_EQ(error.message, "Unrecoverable interrupted batch, reinstall necessary.");
-                EXPECT_EQ(error.Code(), ErrorCode::ReinstallRequired);
-            }
-            EXPECT_FALSE(PathExists(folder / "PPF.xml"));
-            EXPECT_FALSE(PathExists(folder / "_PPF.xml"));
-            continue;
-        }
-        EXPECT_EQ(progress.Recover(), c.found);
-        EXPECT_EQ(progress.GetActionIndex(), c.action);
-        // A loaded record is always left as "PPF.xml", and alone.
-        EXPECT_EQ(PathExists(folder / "PPF.xml"), c.found);
-        EXPECT_FALSE(PathExists(folder / "_PPF.xml"));
-        if (c.found) {
-            EXPECT_EQ(ReadTextFile(folder / "PPF.xml"), RecordText(c.action, "f"));
-        }
+    cases.push_back({"<S><PatchStatus action=\"4\" /></S>", none, "4 "});
+    for (const char* unreadable :
+         {"<S><PatchStatus action=\"12abc\" file=\"f\" /></S>", "<S><PatchStatus file=\"f\" /></S>",
+          "<S><PatchStatus action=\"2147483648\" file=\"f\" /></S>", "<S><Version>2</Version></S>"}) {
+        cases.push_back({unreadable, two, "2 f"});
     }
-}
-
-TEST(PatchProgressFile, AFailedWriteIsReported) {
-    TempFolder folder;
-    PatchProgressFile record;
-    record.SetDirectory(folder / "missing");
-    EXPECT_FALSE(record.WriteRecord());
+    // A write cut off anywhere before the end of its XML leaves the previous
+    // record, and no such prefix of the new one reads as a record.
+    for (size_t k = 0; k + 1 < two.size(); ++k) {
+        cases.push_back({one, two.substr(0, k), "1 f"});
+        cases.push_back({none, two.substr(0, k), lost});
+    }
+    for (const auto& [record, spare, outcome] : cases) {
+        TempFolder folder;
+        if (record != none) WriteTextFile(folder / "PPF.xml", record);
+        if (spare != none) WriteTextFile(folder / "_PPF.xml", spare);
+        const auto recover = [&folder] {
+            PatchProgressFile progress;
+            progress.SetDirectory(folder.Path());
+            try {
+                return progress.Recover() ? std::to_string(progress.GetActionIndex()) + " " + progress.GetFile()
+                                          : "none";
+            } catch (const Exception& error) {
+                return error.message + " (" + std::to_string(error.code) + ")";
+            }
+        };
+        EXPECT_EQ(recover(), outcome) << record << "\n" << spare;
+        EXPECT_FALSE(PathExists(folder / "_PPF.xml"));
+        EXPECT_EQ(recover(), outcome == lost ? "none" : outcome) << "what was taken is left";
+    }
 }
 
 }  // namespace
