@@ -5,6 +5,7 @@
 #include <memory>
 #include <ostream>
 #include <random>
+#include <sstream>
 
 #include "base/exception.h"
 #include "base/file_operations.h"
@@ -32,9 +33,8 @@ std::string Varint(size_t value) {
     return bytes;
 }
 
-// A VCDIFF delta of one window that copies the common prefix from the old
-// file and adds the rest: a Windows test program cannot start xdelta3, and
-// the publisher's round trips bring real xdelta3 output to the applier.
+// A VCDIFF delta copying the common prefix and adding the rest, as a Windows
+// test program cannot start xdelta3 (whose output the round trips cover).
 std::string PrefixDelta(const std::string& oldData, const std::string& newData) {
     size_t copied = 0;
     while (copied < oldData.size() && copied < newData.size() && oldData[copied] == newData[copied]) ++copied;
@@ -49,14 +49,11 @@ std::string PrefixDelta(const std::string& oldData, const std::string& newData) 
     return header + (copied ? '\x01' + Varint(copied) + '\0' : std::string(1, '\0')) + Varint(window.size()) + window;
 }
 
-// Empty, small, or past the decoders' buffers; text or binary.
+// Empty, small, or past the decoders' buffers.
 std::string RandomContent(std::mt19937& random) {
     const size_t sizes[] = {0, random() % 3000, random() % 3000, 20000 + random() % 150000};
     const size_t size = sizes[random() % 4];
-    if (random() % 2 == 0) return SeededBytes(size, random());
-    std::string text;
-    while (text.size() < size) text += "line " + std::to_string(random() % 50) + " of the realm\n";
-    return text.substr(0, size);
+    return SeededBytes(size, random());
 }
 
 std::string Edited(std::string content, std::mt19937& random) {
@@ -79,9 +76,8 @@ Tree& Tree::Folder(const std::string& path) {
 
 Tree TreeOf(const std::string& spec) {
     Tree tree;
-    for (size_t start = 0, end = 0; end != std::string::npos; start = end + 1) {
-        end = spec.find('|', start);
-        const std::string entry = spec.substr(start, end - start);
+    std::istringstream entries(spec);
+    for (std::string entry; std::getline(entries, entry, '|');) {
         const size_t equals = entry.find('=');
         if (equals != std::string::npos) tree.File(entry.substr(0, equals), entry.substr(equals + 1));
         if (equals == std::string::npos) tree.Folder(entry.substr(0, entry.size() - 1));
@@ -102,12 +98,10 @@ void WriteTree(const std::string& root, const Tree& tree) {
 
 Tree ReadTree(const std::string& root) {
     Tree tree;
-    std::error_code error;
-    const fs::path base = fs::u8path(root);
-    for (fs::recursive_directory_iterator it(base, error), end; !error && it != end; it.increment(error)) {
-        const std::string relative = it->path().lexically_relative(base).generic_u8string();
-        if (it->is_directory()) tree.folders.insert(relative);
-        if (!it->is_directory()) tree.files[relative] = ReadTextFile(it->path().u8string());
+    for (const auto& entry : fs::recursive_directory_iterator(fs::u8path(root))) {
+        const std::string relative = entry.path().lexically_relative(fs::u8path(root)).generic_u8string();
+        if (entry.is_directory()) tree.folders.insert(relative);
+        if (!entry.is_directory()) tree.files[relative] = ReadTextFile(entry.path().u8string());
     }
     return tree;
 }
@@ -150,15 +144,13 @@ Tree NextVersion(const Tree& old, unsigned seed) {
     for (const std::string& folder : removed) {  // a top folder becomes a file
         if (Parent(folder).empty() && random() % 2 == 0) next.File(folder, RandomContent(random));
     }
-    const std::vector<std::string> kept(next.folders.begin(), next.folders.end());
-    next.File((kept.empty() ? "" : kept[random() % kept.size()] + "/") + "added/deeper/new", RandomContent(random));
-    return next.Folder("empty_new/also_empty").File("top_new", RandomContent(random));
+    next.File("added/deeper/new", RandomContent(random)).Folder("empty_new/also_empty");
+    return next.File("top_new", RandomContent(random));
 }
 
 TestBatch::TestBatch(const Tree& installed, const Tree& target) {
     WriteTree(Installation(), installed);
-    WriteTree(PatchedFiles(), Tree());
-    WriteTree(PatchFolder(), Tree());
+    for (const std::string& folder : {PatchedFiles(), PatchFolder()}) WriteTree(folder, Tree());
     WriteTextFile(VersionFile(), "1");
     std::map<std::string, std::unique_ptr<ArchiveWriter>> archives;
     for (const auto& file : target.files) {
@@ -174,7 +166,6 @@ TestBatch::TestBatch(const Tree& installed, const Tree& target) {
         member.Open(root / "member");
         archives[archive]->AddMember(path, member);
     }
-    for (auto& archive : archives) archive.second->Close();
     for (const auto& file : installed.files) {
         if (target.files.count(file.first) == 0) description.deletedFiles.push_back(Backslashed(file.first));
     }
@@ -202,19 +193,16 @@ BatchRun::BatchRun(const TestBatch& patchBatch)
 }
 
 void BatchRun::Apply() {
-    const std::string versionFile = batch.VersionFile();
-    stages.Apply(work, this, [&versionFile](const std::string& version) { WriteTextFile(versionFile, version); });
+    stages.Apply(work, this, [this](const std::string& version) { WriteTextFile(batch.VersionFile(), version); });
 }
 
 void BatchRun::Resume() {
-    if (ReadTextFile(batch.VersionFile()) == work.version) {
-        RemoveFile(progress.GetRecordPath());
-        return;
-    }
     try {
         progress.resuming = progress.Recover();
     } catch (const Exception& error) {
         if (error.Code() != ErrorCode::ReinstallRequired) throw;
     }
-    Apply();
+    const bool finished = ReadTextFile(batch.VersionFile()) == work.version;
+    if (finished) RemoveFile(progress.GetRecordPath());
+    if (!finished) Apply();
 }

@@ -16,8 +16,7 @@
 #include "tests/support/test_files.h"
 #include "tools/publisher/patch_description.h"
 
-// A folder tree in memory: files by relative path ("a/b.txt") with their
-// contents, and every folder (also the parents of files).
+// Files by relative path ("a/b.txt") with their contents, and every folder.
 struct Tree {
     std::map<std::string, std::string> files;
     std::set<std::string> folders;
@@ -29,7 +28,7 @@ struct Tree {
 Tree TreeOf(const std::string& spec);  // "a/b.txt=text|empty/folder/|c.txt="
 void PrintTo(const Tree& tree, std::ostream* out);
 void WriteTree(const std::string& root, const Tree& tree);
-Tree ReadTree(const std::string& root);  // empty for a missing folder
+Tree ReadTree(const std::string& root);
 
 std::string SeededBytes(size_t size, unsigned seed);
 // A seeded game tree, and its next version: files edited, added and
@@ -37,10 +36,9 @@ std::string SeededBytes(size_t size, unsigned seed);
 Tree RandomTree(unsigned seed);
 Tree NextVersion(const Tree& old, unsigned seed);
 
-// A patch made from two trees, laid out as stage one finds it: the
-// installation (the old tree), the archives in the patch folder (one per
-// top folder or top-level file), an empty patched-files folder, the
-// description, and the installed version "1" in a file of its own.
+// A patch made from two trees, laid out as stage one finds it: the old tree
+// installed, the archives (one per top folder or top-level file) in the
+// patch folder, the description, and the installed version "1".
 class TestBatch {
 public:
     TestBatch(const Tree& installed, const Tree& target);
@@ -56,8 +54,8 @@ private:
     TempFolder root;
 };
 
-// One run of the updater over a batch, its parts open to the test. The
-// archives are in place (state makes every wait end otherwise); the
+// One run of the updater over a batch, its parts open to the test: the
+// archives are in place (state makes every wait end otherwise), the
 // applier's reports are kept and handed to onReport (a cancel, a crash).
 class BatchRun final : public IArchiveSource, public IStatusView {
 public:
@@ -68,9 +66,9 @@ public:
     void OnFileDone(const std::string&) override {}
     void Prepare() { stages.Prepare(work, this, this); }
     void Apply();  // stage two, storing the version in the batch's file
-    // Stage two as the next start finishes an interrupted batch: the new
-    // version already stored means only the record was left; an unreadable
-    // record was cut short while first written, before any action.
+    // Stage two as the next start finishes an interrupted batch: with the new
+    // version stored only the record was left; an unreadable record was cut
+    // short while first written, before any action.
     void Resume();
 
     const TestBatch& batch;

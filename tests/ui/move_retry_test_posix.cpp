@@ -1,6 +1,5 @@
 // A prepared file that something blocks: Retry puts the question again,
-// Cancel ends stage two with StepFailed. The console form of the question
-// reads its answers from standard input.
+// Cancel ends stage two with StepFailed. The console box reads stdin.
 #include <gtest/gtest.h>
 
 #include <iostream>
@@ -15,12 +14,9 @@
 namespace {
 
 // Swaps a stream's buffer for the lifetime of the object.
-class StreamSwap {
-public:
+struct StreamSwap {
     StreamSwap(std::ios& swapped, std::streambuf* replacement) : stream(swapped), saved(swapped.rdbuf(replacement)) {}
     ~StreamSwap() { stream.rdbuf(saved); }
-
-private:
     std::ios& stream;
     std::streambuf* saved;
 };
@@ -32,8 +28,7 @@ TEST(MoveRetry, RetryAsksAgainAndCancelEndsWithStepFailed) {
     MoveRetryBox retryBox;
     run.applier.SetRetryQuestion(&retryBox);
     run.Prepare();
-    // A folder that is not empty cannot be replaced by a moved file.
-    WriteTree(batch.Installation(), TreeOf("blocked.bin/inside.txt=in the way"));
+    WriteTree(batch.Installation(), TreeOf("blocked.bin/inside.txt=a folder that a move cannot replace"));
     std::istringstream answers("r\nc\nleft over\n");  // asked twice, the last line stays unread
     std::ostringstream shown;
     StreamSwap input(std::cin, answers.rdbuf());
