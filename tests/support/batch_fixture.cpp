@@ -120,9 +120,9 @@ Tree RandomTree(unsigned seed) {
     for (int i = 0; i < 20; ++i) {
         const std::string parent = folders[random() % folders.size()];
         const std::string path = (parent.empty() ? "" : parent + "/") + "n" + std::to_string(i);
-        if (random() % 4 == 0) folders.push_back(path);
-        if (folders.back() == path) tree.Folder(path);
-        if (folders.back() != path) tree.File(path, RandomContent(random));
+        const bool folder = random() % 4 == 0;
+        if (folder) folders.push_back(path);
+        folder ? tree.Folder(path) : tree.File(path, RandomContent(random));
     }
     return tree;
 }

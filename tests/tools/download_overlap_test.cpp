@@ -44,6 +44,7 @@ TEST(DownloadOverlap, EachArchiveIsPreparedWhileTheNextOneDownloads) {
     EXPECT_EQ(ReadTree(batch.Installation()), target);
     EXPECT_EQ(run.reports.size(), 6u);
     EXPECT_EQ(early, 0);
+    EXPECT_EQ(downloader.WaitForArchive("not in the list"), ArchiveState::Failed);  // rather than wait for ever
 }
 
 }  // namespace
