@@ -1,12 +1,14 @@
 #include "tests/support/batch_fixture.h"
 
-#include <tinyxml.h>
-
 #include <algorithm>
 #include <filesystem>
+#include <memory>
+#include <ostream>
 #include <random>
-#include <stdexcept>
+#include <sstream>
 
+#include "base/exception.h"
+#include "base/file_operations.h"
 #include "base/file_stream.h"
 #include "base/paths.h"
 #include "tools/publisher/archive_writer.h"
@@ -15,29 +17,77 @@ namespace fs = std::filesystem;
 
 namespace {
 
+std::string Parent(const std::string& path) {
+    const size_t slash = path.rfind('/');
+    return slash == std::string::npos ? "" : path.substr(0, slash);
+}
+
 std::string Backslashed(std::string path) {
     std::replace(path.begin(), path.end(), '/', '\\');
     return path;
 }
 
-void AddParents(Tree& tree, const std::string& path) {
-    for (size_t slash = path.find('/'); slash != std::string::npos; slash = path.find('/', slash + 1)) {
-        tree.folders.insert(path.substr(0, slash));
-    }
+std::string Varint(size_t value) {
+    std::string bytes(1, static_cast<char>(value & 0x7F));
+    while (value >>= 7) bytes.insert(bytes.begin(), static_cast<char>(0x80 | (value & 0x7F)));
+    return bytes;
+}
+
+// A VCDIFF delta copying the common prefix and adding the rest, as a Windows
+// test program cannot start xdelta3 (whose output the round trips cover).
+std::string PrefixDelta(const std::string& oldData, const std::string& newData) {
+    size_t copied = 0;
+    while (copied < oldData.size() && copied < newData.size() && oldData[copied] == newData[copied]) ++copied;
+    const std::string added = newData.substr(copied);
+    const std::string instructions =
+        (copied ? '\x13' + Varint(copied) : "") + (added.empty() ? "" : '\x01' + Varint(added.size()));
+    const std::string addresses = copied ? std::string(1, '\0') : "";  // COPY from the source's start
+    const std::string window = Varint(newData.size()) + '\0' + Varint(added.size()) + Varint(instructions.size()) +
+                               Varint(addresses.size()) + added + instructions + addresses;
+    const std::string header("\xD6\xC3\xC4\x00\x00", 5);
+    if (newData.empty()) return header;
+    return header + (copied ? '\x01' + Varint(copied) + '\0' : std::string(1, '\0')) + Varint(window.size()) + window;
+}
+
+// Empty, small, or past the decoders' buffers.
+std::string RandomContent(std::mt19937& random) {
+    const size_t sizes[] = {0, random() % 3000, random() % 3000, 20000 + random() % 150000};
+    const size_t size = sizes[random() % 4];
+    return SeededBytes(size, random());
+}
+
+std::string Edited(std::string content, std::mt19937& random) {
+    const size_t at = random() % (content.size() + 1);
+    content.erase(at, random() % 100);
+    return content.insert(at, "inserted " + std::to_string(random()));
 }
 
 }  // namespace
 
 Tree& Tree::File(const std::string& path, const std::string& content) {
     files[path] = content;
-    AddParents(*this, path);
-    return *this;
+    return Parent(path).empty() ? *this : Folder(Parent(path));
 }
 
 Tree& Tree::Folder(const std::string& path) {
     folders.insert(path);
-    AddParents(*this, path);
-    return *this;
+    return Parent(path).empty() ? *this : Folder(Parent(path));
+}
+
+Tree TreeOf(const std::string& spec) {
+    Tree tree;
+    std::istringstream entries(spec);
+    for (std::string entry; std::getline(entries, entry, '|');) {
+        const size_t equals = entry.find('=');
+        if (equals != std::string::npos) tree.File(entry.substr(0, equals), entry.substr(equals + 1));
+        if (equals == std::string::npos) tree.Folder(entry.substr(0, entry.size() - 1));
+    }
+    return tree;
+}
+
+void PrintTo(const Tree& tree, std::ostream* out) {  // paths and hashes, not bytes
+    for (const std::string& folder : tree.folders) *out << "\n  " << folder << "/";
+    for (const auto& file : tree.files) *out << "\n  " << file.first << " " << std::hash<std::string>()(file.second);
 }
 
 void WriteTree(const std::string& root, const Tree& tree) {
@@ -48,27 +98,12 @@ void WriteTree(const std::string& root, const Tree& tree) {
 
 Tree ReadTree(const std::string& root) {
     Tree tree;
-    const fs::path base = fs::u8path(root);
-    for (auto it = fs::recursive_directory_iterator(base); it != fs::recursive_directory_iterator(); ++it) {
-        const std::string relative = it->path().lexically_relative(base).generic_u8string();
-        if (it->is_directory()) {
-            tree.folders.insert(relative);
-        } else {
-            tree.files[relative] = ReadTextFile(it->path().u8string());
-        }
+    for (const auto& entry : fs::recursive_directory_iterator(fs::u8path(root))) {
+        const std::string relative = entry.path().lexically_relative(fs::u8path(root)).generic_u8string();
+        if (entry.is_directory()) tree.folders.insert(relative);
+        if (!entry.is_directory()) tree.files[relative] = ReadTextFile(entry.path().u8string());
     }
     return tree;
-}
-
-std::vector<std::string> FilesBelow(const std::string& root) {
-    std::vector<std::string> found;
-    std::error_code error;
-    const fs::path base = fs::u8path(root);
-    for (auto it = fs::recursive_directory_iterator(base, error); !error && it != fs::recursive_directory_iterator();
-         it.increment(error)) {
-        if (!it->is_directory()) found.push_back(it->path().lexically_relative(base).generic_u8string());
-    }
-    return found;
 }
 
 std::string SeededBytes(size_t size, unsigned seed) {
@@ -78,135 +113,96 @@ std::string SeededBytes(size_t size, unsigned seed) {
     return bytes;
 }
 
-void WritePatchInfo(const std::string& path, const std::vector<PatchItem>& items) {
-    TiXmlDocument document;
-    document.LinkEndChild(new TiXmlDeclaration("1.0", "", ""));
-    TiXmlElement* root = new TiXmlElement("IronvaleWestPatch");
-    document.LinkEndChild(root);
-    for (const char* listName : {"FileChanges", "DirectoryChanges"}) {
-        TiXmlElement* list = new TiXmlElement(listName);
-        root->LinkEndChild(list);
-        for (const PatchItem& item : items) {
-            if (item.list != listName) continue;
-            TiXmlElement* element = new TiXmlElement(item.kind);
-            element->SetAttribute("Path", item.path);
-            if (item.kind != "delete") element->SetAttribute("File", item.archive);
-            list->LinkEndChild(element);
-        }
+Tree RandomTree(unsigned seed) {
+    std::mt19937 random(seed);
+    Tree tree;
+    std::vector<std::string> folders = {""};
+    for (int i = 0; i < 20; ++i) {
+        const std::string parent = folders[random() % folders.size()];
+        const std::string path = (parent.empty() ? "" : parent + "/") + "n" + std::to_string(i);
+        const bool folder = random() % 4 == 0;
+        if (folder) folders.push_back(path);
+        folder ? tree.Folder(path) : tree.File(path, RandomContent(random));
     }
-    if (!document.SaveFile(path)) throw std::runtime_error("cannot write " + path);
+    return tree;
 }
 
-TestBatch::TestBatch(const Tree& installed, const Tree& target)
-    : TestBatch(installed, target, [](const std::string&) { return std::string("patch1.dat"); }) {}
-
-TestBatch::TestBatch(const Tree& installed, const Tree& target, ArchiveChooser chooser) {
-    WriteTree(Installation(), installed);
-    for (const std::string& folder : {PatchedFiles(), PatchFolder(), Served(), RecordFolder(), root / "work"}) {
-        fs::create_directories(fs::u8path(folder));
+Tree NextVersion(const Tree& old, unsigned seed) {
+    std::mt19937 random(seed * 7919 + 1);
+    Tree next;
+    std::set<std::string> removed;  // parents come first, so a removal takes what lies below
+    for (const std::string& folder : old.folders) {
+        if (removed.count(Parent(folder)) != 0 || random() % 4 == 0) removed.insert(folder);
+        if (removed.count(folder) == 0) next.Folder(folder);
     }
+    for (const auto& file : old.files) {
+        const unsigned choice = removed.count(Parent(file.first)) != 0 ? 0 : random() % 5;
+        if (choice == 1) next.File(file.first, file.second);
+        if (choice == 2 || choice == 3) next.File(file.first, Edited(file.second, random));
+        if (choice == 4) next.File(file.first + "/" + GetFileName(file.first), RandomContent(random));
+    }
+    for (const std::string& folder : removed) {  // a top folder becomes a file
+        if (Parent(folder).empty() && random() % 2 == 0) next.File(folder, RandomContent(random));
+    }
+    next.File("added/deeper/new", RandomContent(random)).Folder("empty_new/also_empty");
+    return next.File("top_new", RandomContent(random));
+}
 
-    // Members are packed per archive in the order of the items.
-    std::map<std::string, std::vector<std::pair<std::string, std::string>>> members;  // archive: (name, file)
-    auto use = [&](const std::string& kind, const std::string& path, const std::string& memberFile) {
-        const std::string archive = chooser(path);
-        if (std::find(archives.begin(), archives.end(), archive) == archives.end()) archives.push_back(archive);
-        items.push_back({"FileChanges", kind, Backslashed(path), archive});
-        members[archive].emplace_back(Backslashed(path), memberFile);
-    };
-    int counter = 0;
+TestBatch::TestBatch(const Tree& installed, const Tree& target) {
+    WriteTree(Installation(), installed);
+    for (const std::string& folder : {PatchedFiles(), PatchFolder()}) WriteTree(folder, Tree());
+    WriteTextFile(VersionFile(), "1");
+    std::map<std::string, std::unique_ptr<ArchiveWriter>> archives;
     for (const auto& file : target.files) {
         const auto old = installed.files.find(file.first);
-        if (old == installed.files.end() || old->second == file.second) continue;
-        const std::string number = std::to_string(counter++);
-        const std::string oldPath = root / "work" + "/old" + number;
-        const std::string newPath = root / "work" + "/new" + number;
-        const std::string deltaPath = root / "work" + "/delta" + number;
-        WriteTextFile(oldPath, old->second);
-        WriteTextFile(newPath, file.second);
-        MakeDelta(oldPath, newPath, deltaPath);
-        use("diff", file.first, deltaPath);
-    }
-    for (const auto& file : target.files) {
-        if (installed.files.count(file.first) != 0) continue;
-        const std::string newPath = root / "work" + "/added" + std::to_string(counter++);
-        WriteTextFile(newPath, file.second);
-        use("new", file.first, newPath);
+        if (old != installed.files.end() && old->second == file.second) continue;
+        const std::string path = Backslashed(file.first);
+        const std::string archive = file.first.substr(0, file.first.find('/')) + ".dat";
+        if (!archives[archive]) archives[archive] = std::make_unique<ArchiveWriter>(PathJoin(PatchFolder(), archive));
+        (old == installed.files.end() ? description.newFiles : description.diffFiles).emplace_back(path, archive);
+        WriteTextFile(root / "member",
+                      old == installed.files.end() ? file.second : PrefixDelta(old->second, file.second));
+        FileStream member;
+        member.Open(root / "member");
+        archives[archive]->AddMember(path, member);
     }
     for (const auto& file : installed.files) {
-        if (target.files.count(file.first) == 0)
-            items.push_back({"FileChanges", "delete", Backslashed(file.first), ""});
+        if (target.files.count(file.first) == 0) description.deletedFiles.push_back(Backslashed(file.first));
     }
     // Deepest folders first, so every deletion finds its folder still there.
     for (auto folder = installed.folders.rbegin(); folder != installed.folders.rend(); ++folder) {
-        if (target.folders.count(*folder) == 0) {
-            items.push_back({"DirectoryChanges", "delete", Backslashed(*folder), ""});
-        }
+        if (target.folders.count(*folder) == 0) description.deletedDirectories.push_back(Backslashed(*folder));
     }
     for (const std::string& folder : target.folders) {
-        if (installed.folders.count(folder) == 0) items.push_back({"DirectoryChanges", "new", Backslashed(folder), ""});
+        if (installed.folders.count(folder) == 0) description.newDirectories.push_back(Backslashed(folder));
     }
+    WriteInfo();
+}
 
-    for (const std::string& archive : archives) {
-        ArchiveWriter writer(PathJoin(Served(), archive));
-        for (const auto& member : members[archive]) {
-            FileStream source;
-            source.Open(member.second);
-            writer.AddMember(member.first, source);
-        }
-        writer.Close();
+void TestBatch::WriteInfo() const { WritePatchDescription(description, root / "patchinfo.xml"); }
+
+void BatchRun::OnApplyProgress(const std::string& fileName, int32_t permille) {
+    reports.emplace_back(fileName, permille);
+    if (onReport) onReport(fileName);
+}
+
+BatchRun::BatchRun(const TestBatch& patchBatch)
+    : batch(patchBatch), work{batch.Installation(), batch.PatchFolder(), batch.PatchedFiles(), "", "2"} {
+    info.Load(PathJoin(batch.Root(), "patchinfo.xml"));
+    progress.SetDirectory(batch.Root());
+}
+
+void BatchRun::Apply() {
+    stages.Apply(work, this, [this](const std::string& version) { WriteTextFile(batch.VersionFile(), version); });
+}
+
+void BatchRun::Resume() {
+    try {
+        progress.resuming = progress.Recover();
+    } catch (const Exception& error) {
+        if (error.Code() != ErrorCode::ReinstallRequired) throw;
     }
-    WritePatchInfo(InfoPath(), items);
-}
-
-std::string TestBatch::InfoPath() const { return PathJoin(Served(), "patchinfo.xml"); }
-
-std::list<DownloadEntry> TestBatch::FileDownloads() const {
-    std::list<DownloadEntry> list;
-    for (const std::string& archive : archives) {
-        DownloadEntry entry;
-        entry.url = "file://" + PathJoin(Served(), archive);
-        entry.localPath = PathJoin(PatchFolder(), archive);
-        list.push_back(entry);
-    }
-    return list;
-}
-
-void TestBatch::ReplaceItems(const std::vector<PatchItem>& replacement) {
-    items = replacement;
-    WritePatchInfo(InfoPath(), items);
-}
-
-void TestBatch::Apply(IStatusView* view) {
-    BatchRun run(*this, view);
-    run.StartFileDownloads();
-    run.Prepare();
-    run.ApplyStageTwo();
-}
-
-BatchRun::BatchRun(const TestBatch& patchBatch, IStatusView* view) : batch(patchBatch) {
-    info.Load(batch.InfoPath());
-    progress.SetDirectory(batch.RecordFolder());
-    applier.Init(&info, &progress, batch.Installation(), batch.PatchedFiles(), batch.PatchFolder(), view, &downloader);
-}
-
-void BatchRun::StartFileDownloads() {
-    if (!batch.Archives().empty()) downloader.Start(batch.FileDownloads(), false);
-}
-
-void BatchRun::ApplyStageTwo() {
-    progress.SetActionIndex(-1);
-    progress.SetFile("");
-    progress.WriteRecord();
-    applier.ApplyPatch();
-}
-
-void ApplyReports::OnApplyProgress(const std::string& fileName, int32_t permille) {
-    std::lock_guard<std::mutex> lock(mutex);
-    reports.push_back({fileName, permille});
-}
-
-std::vector<ApplyReports::Report> ApplyReports::Reports() const {
-    std::lock_guard<std::mutex> lock(mutex);
-    return reports;
+    const bool finished = ReadTextFile(batch.VersionFile()) == work.version;
+    if (finished) RemoveFile(progress.GetRecordPath());
+    if (!finished) Apply();
 }

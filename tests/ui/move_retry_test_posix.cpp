@@ -1,7 +1,5 @@
-// The move of a prepared file that something blocks: the question is put
-// again for every Retry, and Cancel ends stage two with StepFailed. The
-// console form of the question reads its answers from standard input.
-
+// A prepared file that something blocks: Retry puts the question again,
+// Cancel ends stage two with StepFailed. The console box reads stdin.
 #include <gtest/gtest.h>
 
 #include <iostream>
@@ -16,51 +14,34 @@
 namespace {
 
 // Swaps a stream's buffer for the lifetime of the object.
-class StreamSwap {
-public:
+struct StreamSwap {
     StreamSwap(std::ios& swapped, std::streambuf* replacement) : stream(swapped), saved(swapped.rdbuf(replacement)) {}
     ~StreamSwap() { stream.rdbuf(saved); }
-
-private:
     std::ios& stream;
     std::streambuf* saved;
 };
 
-size_t Count(const std::string& text, const std::string& what) {
-    size_t count = 0;
-    for (size_t at = text.find(what); at != std::string::npos; at = text.find(what, at + 1)) ++count;
-    return count;
-}
-
-TEST(ApplierMoveRetry, RetryAsksAgainAndCancelEndsWithStepFailed) {
+TEST(MoveRetry, RetryAsksAgainAndCancelEndsWithStepFailed) {
     Localization::Initialize();
-    TestBatch batch(Tree().File("old.txt", "o"), Tree().File("old.txt", "o").File("blocked.bin", "new content"));
+    TestBatch batch(Tree(), TreeOf("blocked.bin=new content"));
     BatchRun run(batch);
     MoveRetryBox retryBox;
     run.applier.SetRetryQuestion(&retryBox);
-    run.StartFileDownloads();
     run.Prepare();
-    // A non-empty folder where the file must go cannot be replaced by a move.
-    WriteTree(batch.Installation(), Tree().File("blocked.bin/inside.txt", "in the way"));
-
-    std::istringstream answers("r\nc\n");
+    WriteTree(batch.Installation(), TreeOf("blocked.bin/inside.txt=a folder that a move cannot replace"));
+    std::istringstream answers("r\nc\nleft over\n");  // asked twice, the last line stays unread
     std::ostringstream shown;
     StreamSwap input(std::cin, answers.rdbuf());
     StreamSwap output(std::cerr, shown.rdbuf());
-    const std::string source = PathJoin(batch.PatchedFiles(), "blocked.bin");
-    const std::string destination = PathJoin(batch.Installation(), "blocked.bin");
     try {
-        run.ApplyStageTwo();
-        FAIL() << "the move succeeded";
+        run.Apply();
+        ADD_FAILURE() << "the move succeeded";
     } catch (const Exception& error) {
         EXPECT_EQ(error.Code(), ErrorCode::StepFailed);
-        EXPECT_EQ(error.message, "Failed to move file from " + source + " to " + destination);
     }
-    EXPECT_EQ(Count(shown.str(), "Failed to move the file:"), 2u) << shown.str();
-    EXPECT_NE(shown.str().find(source), std::string::npos);
-    EXPECT_NE(shown.str().find("If you have any of these files open, please close them and retry."), std::string::npos);
-    EXPECT_TRUE(PathExists(source));
-    EXPECT_EQ(ReadTextFile(PathJoin(destination, "inside.txt")), "in the way");
+    std::string rest;
+    EXPECT_TRUE(std::getline(answers, rest) && rest == "left over") << shown.str();
+    EXPECT_TRUE(PathExists(PathJoin(batch.PatchedFiles(), "blocked.bin")));
 }
 
 }  // namespace

@@ -1,0 +1,142 @@
+// A batch run through both stages on real folders: the result, the ways
+// the stages end early, and the resume of a stage two cut short.
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <stdexcept>
+#include <tuple>
+
+#include "base/exception.h"
+#include "base/file_operations.h"
+#include "base/paths.h"
+#include "tests/support/batch_fixture.h"
+
+namespace {
+
+// Diffs and new files large and small, deletions of files and folder
+// trees, new nested and empty folders, empty files, a file and a folder
+// trading places either way, names with spaces, archives taken in turn.
+const Tree kInstalled =
+    TreeOf(
+        "game.exe=old|remove me.txt=x|sub/gone.dat=y|sub/kept.dat=kept|old/deeper/b.txt=b|old/empty/|"
+        "cfg/stale.ini=s|cfg/user.ini=old|grows=|shrinks=shrinks|swap=file")
+        .File("a.bin", SeededBytes(70000, 1));
+const Tree kTarget =
+    TreeOf(
+        "game.exe=new|sub/kept.dat=kept|cfg/user.ini=new|data/nested deep/level.bin=l|readme=r|grows=now|"
+        "shrinks=|new-empty=|fresh/empty/folder/|swap/swap=|old=file|Game Data/Bank 2.bnk=b")
+        .File("a.bin", SeededBytes(50000, 1) + SeededBytes(30000, 2));
+const int kActions = 17;  // 5 files deleted, 4 folders deleted (cfg too), 8 created (cfg too)
+
+TEST(Batch, InstallationEndsEqualToTheTarget) {
+    TestBatch batch(kInstalled, kTarget);
+    // A longer file left by an earlier attempt must not keep its tail.
+    WriteTree(batch.PatchedFiles(), Tree().File("a.bin", SeededBytes(100000, 3)));
+    BatchRun run(batch);
+    run.Prepare();
+    run.Apply();
+    EXPECT_EQ(ReadTree(batch.Installation()), kTarget);
+    EXPECT_TRUE(ReadTree(batch.PatchedFiles()).files.empty());
+    EXPECT_EQ(run.reports.back().second, 1000);
+}
+
+TEST(StageOne, EndsEarlyWithAClearErrorAndTheInstallationUntouched) {
+    const std::tuple<std::function<void(BatchRun&)>, ErrorCode, std::string> cases[] = {
+        {[](BatchRun& run) { run.onReport = [&run](const std::string&) { run.applier.RequestCancel(); }; },
+         ErrorCode::UserCancelled, ""},
+        {[](BatchRun& run) { run.state = ArchiveState::Cancelled; }, ErrorCode::UserCancelled, ""},
+        {[](BatchRun& run) { run.state = ArchiveState::Failed; }, ErrorCode::FileNotFound,
+         "Failed to download patch file."},
+        {[](BatchRun& run) { RemoveFile(PathJoin(run.work.installationFolder, "game.exe")); }, ErrorCode::DeltaFailed,
+         "Failed to apply delta file "},
+    };
+    for (const auto& [cause, code, message] : cases) {  // message: how it starts
+        SCOPED_TRACE(static_cast<int>(code));
+        TestBatch batch(kInstalled, kTarget);
+        BatchRun run(batch);
+        cause(run);
+        const Tree before = ReadTree(batch.Installation());
+        try {
+            run.Prepare();
+            ADD_FAILURE() << "no error";
+        } catch (const Exception& error) {
+            EXPECT_EQ(error.Code(), code);
+            EXPECT_EQ(error.message.substr(0, message.size()), message);
+            EXPECT_EQ(error.message.empty(), message.empty());
+        }
+        EXPECT_EQ(ReadTree(batch.Installation()), before);
+    }
+}
+
+// A hostile item after harmless ones is refused by either stage before
+// anything changes: a row per attribute naming a path, every escape form.
+TEST(HostileDescription, IsRefusedInBothStagesBeforeAnythingChanges) {
+    const std::pair<std::string, std::string> hostile[] = {
+        {"FileChanges", R"(<delete Path="..\outside.txt" />)"},
+        {"FileChanges", R"(<delete Path="/etc/passwd" />)"},
+        {"FileChanges", R"(<new Path="\\host\share\x" File="data.dat" />)"},
+        {"FileChanges", R"(<new Path="data\c.bin" File="..\patch\data.dat" />)"},
+        {"FileChanges", R"(<diff Path="data/../../x.bin" File="data.dat" />)"},
+        {"FileChanges", R"(<diff Path="game.exe" File="C:game.exe.dat" />)"},
+        {"DirectoryChanges", R"(<delete Path="" />)"},
+        {"DirectoryChanges", R"(<new Path="a:stream" />)"},
+        {"DirectoryChanges", R"(<new Path="sub\.. \x" />)"},
+    };
+    for (const auto& [list, element] : hostile) {
+        TestBatch batch(kInstalled, kTarget);
+        const std::string info = PathJoin(batch.Root(), "patchinfo.xml");
+        std::string text = ReadTextFile(info);
+        WriteTextFile(info, text.insert(text.find("</" + list), element));
+        for (const bool stageTwo : {false, true}) {
+            SCOPED_TRACE(element + (stageTwo ? " in stage two" : ""));
+            BatchRun run(batch);
+            try {
+                stageTwo ? run.Apply() : run.Prepare();
+                ADD_FAILURE() << "accepted";
+            } catch (const Exception& error) {
+                EXPECT_EQ(error.message.find("Unsafe path"), 0u) << error.message;
+            }
+            EXPECT_EQ(ReadTree(batch.Installation()), kInstalled);
+            EXPECT_TRUE(ReadTree(batch.PatchedFiles()).files.empty());
+        }
+    }
+}
+
+// Ends stage two after some actions, as a crash would. "cfg" is deleted and
+// then created anew as the last action: one path, two actions.
+void InterruptAfter(TestBatch& batch, int actions) {
+    batch.description.deletedDirectories.push_back("cfg");
+    batch.description.newDirectories.push_back("cfg");
+    batch.WriteInfo();
+    BatchRun run(batch);
+    run.Prepare();
+    run.onReport = [&actions](const std::string&) {
+        if (--actions == 0) throw std::runtime_error("interrupted");
+    };
+    EXPECT_THROW(run.Apply(), std::runtime_error);
+}
+
+TEST(Resume, InterruptedAfterEveryActionTheNextRunFinishesTheBatch) {
+    for (int k = 1; k <= kActions; ++k) {
+        SCOPED_TRACE("after action " + std::to_string(k));
+        TestBatch batch(kInstalled, kTarget);
+        InterruptAfter(batch, k);
+        ASSERT_TRUE(PathExists(PathJoin(batch.Root(), "PPF.xml")));
+        BatchRun(batch).Resume();
+        EXPECT_EQ(ReadTree(batch.Installation()), kTarget);
+        EXPECT_FALSE(PathExists(PathJoin(batch.Root(), "PPF.xml")));
+    }
+}
+
+// The record names the creation of "cfg", and the moves had begun: taking
+// the earlier deletion of "cfg" for it would throw away what was moved in.
+TEST(Resume, TheRecordedActionIsKnownByOrdinalAndPath) {
+    TestBatch batch(kInstalled, kTarget);
+    InterruptAfter(batch, kActions);
+    ASSERT_TRUE(MoveFileReplacing(PathJoin(batch.PatchedFiles(), "cfg\\user.ini"),
+                                  PathJoin(batch.Installation(), "cfg\\user.ini")));
+    BatchRun(batch).Resume();
+    EXPECT_EQ(ReadTree(batch.Installation()), kTarget);
+}
+
+}  // namespace
