@@ -1,7 +1,6 @@
-#include "tests/net/download_test_helpers.h"
+#include <string>
 
+// Two leading slashes make a UNC location here.
 std::string UncFormOf(const std::string& absolutePath) { return "/" + absolutePath; }
-
-std::string AbsoluteLocation() { return "/patches/a.bin"; }
 
 bool PlatformCopyReportsProgress() { return true; }

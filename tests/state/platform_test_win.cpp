@@ -1,0 +1,44 @@
+// The real registry as the system's own reg.exe sees it, and the sandbox that clears the tests' corner of it.
+#include <windows.h>
+// windows.h first: shlwapi.h needs its types.
+#include <gtest/gtest.h>
+#include <shlwapi.h>
+
+#include <cstdio>
+
+#include "registry_sandbox.h"
+#include "state/registry_manager.h"
+
+namespace {
+
+// Run at the start too, in case an earlier run was cut short.
+void Clear(const RegistrySandbox& sandbox) {
+    for (const HKEY hive : {HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER}) SHDeleteKeyA(hive, "SOFTWARE\\IronvaleTests");
+    SHDeleteKeyA(HKEY_USERS, sandbox.userSid.c_str());
+}
+
+std::string CommandOutput(const std::string& command) {
+    std::string output;
+    FILE* pipe = _popen((command + " 2>&1").c_str(), "r");
+    for (int c; pipe != nullptr && (c = std::fgetc(pipe)) != EOF;) output += static_cast<char>(c);
+    if (pipe != nullptr) _pclose(pipe);
+    return output;
+}
+
+TEST(RegistryRegExe, ReadsWhatTheManagerWroteAndTheOtherWayRound) {
+    RegistrySandbox sandbox;
+    const RegistryManager registry(RegistryHive::CurrentUser, sandbox.keyPath);
+    registry.SetLanguage("German");
+    registry.SetInstallDir("C:\\Games\\Iron vale");
+    const std::string output = CommandOutput("reg.exe query \"HKCU\\" + sandbox.keyPath + "\"");
+    EXPECT_NE(output.find("Language    REG_SZ    German"), std::string::npos) << output;
+    EXPECT_NE(output.find("Install Dir    REG_SZ    C:\\Games\\Iron vale"), std::string::npos) << output;
+    CommandOutput("reg.exe add \"HKCU\\" + sandbox.keyPath + "\" /v Language /t REG_SZ /d Polish /f");
+    EXPECT_EQ(registry.GetLanguage(), "Polish");
+}
+
+}  // namespace
+
+RegistrySandbox::RegistrySandbox() { Clear(*this); }
+
+RegistrySandbox::~RegistrySandbox() { Clear(*this); }
