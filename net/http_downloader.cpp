@@ -69,12 +69,14 @@ DownloadStatus HttpDownloader::WaitForFile(const std::string& fileName) {
     for (;;) {
         const DownloadStatus status = outcome();
         if (status != DownloadStatus::Pending) return status;
+        // A file the worker never reached because of a stop was cancelled,
+        // not failed: the caller must not report a download error.
+        if (stopRequested) return DownloadStatus::Cancelled;
         if (WorkerEnded()) {
             // The entry may have been settled just before the worker ended.
             const DownloadStatus last = outcome();
             return last != DownloadStatus::Pending ? last : DownloadStatus::Failed;
         }
-        if (stopRequested) return DownloadStatus::Cancelled;
         // The worker signals after each file and once more after it has
         // ended; a stop request signals too.
         wakeEvent.Wait();

@@ -169,6 +169,8 @@ TEST_F(DownloadTest, AListEndsAtTheFirstFailureAndOneRunsAtATimeUntilStoppedOrDe
         downloader.RequestStop();
         EXPECT_EQ(downloader.WaitForFile("target.bin"), DownloadStatus::Cancelled);
         downloader.WaitForWorker();
+        // Still a cancel once the worker has ended, not a failed download.
+        EXPECT_EQ(downloader.WaitForArchive("target.bin"), ArchiveState::Cancelled);
         // A new Start clears the earlier stop and fetches its own list.
         downloader.Download(server.Url("/a.bin"), target, false);
         downloader.WaitForWorker();
