@@ -1,15 +1,11 @@
-#include <gtest/gtest.h>
-
 #include "app/overall_progress.h"
 
-namespace {
+#include <gtest/gtest.h>
 
 TEST(OverallProgress, CompleteArchivesFillTheirSharesAndTheCurrentOneItsPart) {
     const struct {
-        int32_t done;
-        int32_t total;
-        uint32_t bytesDone;
-        uint32_t bytesTotal;
+        int32_t done, total;
+        uint32_t bytesDone, bytesTotal;
         int32_t expected;
     } cases[] = {
         {2, 4, 300, 600, 625},  // second of four complete, third half fetched
@@ -24,10 +20,7 @@ TEST(OverallProgress, CompleteArchivesFillTheirSharesAndTheCurrentOneItsPart) {
         {1, 4, 3000000, 1048576, 500},
         {3, 3, 5, 10, 1000},
     };
-    for (const auto& item : cases) {
-        EXPECT_EQ(OverallProgress(item.done, item.total, item.bytesDone, item.bytesTotal), item.expected)
-            << item.done << "/" << item.total << " " << item.bytesDone << "/" << item.bytesTotal;
+    for (const auto& c : cases) {
+        EXPECT_EQ(OverallProgress(c.done, c.total, c.bytesDone, c.bytesTotal), c.expected) << c.done << "/" << c.total;
     }
 }
-
-}  // namespace
