@@ -1,5 +1,7 @@
 #include <gtest/gtest.h>
 
+#include <utility>
+
 #include "app/command_line.h"
 #include "app/updater_arguments.h"
 
@@ -8,10 +10,7 @@ namespace {
 using Words = std::vector<std::string>;
 
 TEST(CommandLineTest, SplitsOnBlanksAndQuotesAndJoinsBack) {
-    const struct {
-        const char* text;
-        Words words;
-    } cases[] = {
+    const std::pair<const char*, Words> cases[] = {
         {"", {}},
         {" \t\r\n ", {}},
         {"a  b\tc", {"a", "b", "c"}},
@@ -21,9 +20,9 @@ TEST(CommandLineTest, SplitsOnBlanksAndQuotesAndJoinsBack) {
         {"C:\\path\\\"x\"", {"C:\\path\\x"}},
         {"\"unterminated quote", {"unterminated quote"}},
     };
-    for (const auto& c : cases) EXPECT_EQ(SplitCommandLine(c.text), c.words) << c.text;
-    const Words words = {"-hostname", "a b", "", "x\ty", "plain"};
-    EXPECT_EQ(SplitCommandLine(JoinCommandLine(words)), words);
+    for (const auto& [text, words] : cases) EXPECT_EQ(SplitCommandLine(text), words) << text;
+    const Words joined = {"-hostname", "a b", "", "x\ty", "plain"};
+    EXPECT_EQ(SplitCommandLine(JoinCommandLine(joined)), joined);
 }
 
 // The fields that differ from their defaults, in a fixed order.
@@ -43,9 +42,7 @@ std::string Parsed(const std::string& line) {
 }
 
 TEST(UpdaterArgumentsTest, ReadsEachSwitchAndSkipsTheRest) {
-    const struct {
-        const char *line, *parsed;
-    } cases[] = {
+    const std::pair<const char*, const char*> cases[] = {
         {"", ""},
         {"-hostname", ""},
         {"nothing here -silent", ""},
@@ -68,7 +65,7 @@ TEST(UpdaterArgumentsTest, ReadsEachSwitchAndSkipsTheRest) {
         // A word that is no switch here lets the next be read as one.
         {"-silent -SID s1", " sid=s1"},
     };
-    for (const auto& c : cases) EXPECT_EQ(Parsed(c.line), c.parsed) << c.line;
+    for (const auto& [line, parsed] : cases) EXPECT_EQ(Parsed(line), parsed) << line;
 }
 
 }  // namespace

@@ -2,12 +2,11 @@
 
 #include <gtest/gtest.h>
 
+#include <tuple>
+
 TEST(OverallProgress, CompleteArchivesFillTheirSharesAndTheCurrentOneItsPart) {
-    const struct {
-        int32_t done, total;
-        uint32_t bytesDone, bytesTotal;
-        int32_t expected;
-    } cases[] = {
+    // Archives done and in all, bytes of the current one fetched and in all; the progress in thousandths.
+    const std::tuple<int32_t, int32_t, uint32_t, uint32_t, int32_t> cases[] = {
         {2, 4, 300, 600, 625},  // second of four complete, third half fetched
         {0, 4, 0, 600, 0},
         {4, 4, 0, 0, 1000},   // after the last archive
@@ -20,7 +19,7 @@ TEST(OverallProgress, CompleteArchivesFillTheirSharesAndTheCurrentOneItsPart) {
         {1, 4, 3000000, 1048576, 500},
         {3, 3, 5, 10, 1000},
     };
-    for (const auto& c : cases) {
-        EXPECT_EQ(OverallProgress(c.done, c.total, c.bytesDone, c.bytesTotal), c.expected) << c.done << "/" << c.total;
+    for (const auto& [done, total, bytesDone, bytesTotal, expected] : cases) {
+        EXPECT_EQ(OverallProgress(done, total, bytesDone, bytesTotal), expected) << done << "/" << total;
     }
 }

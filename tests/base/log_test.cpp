@@ -1,8 +1,7 @@
-// The log: its exact line format, the 5,000,000-byte rule and the
-// exclusive file.
 #include <gtest/gtest.h>
 
 #include <regex>
+#include <tuple>
 
 #include "base/exception.h"
 #include "base/file_stream.h"
@@ -16,22 +15,19 @@ namespace {
 const std::string kStamp = R"(\d{4}-[1-9]\d?-[1-9]\d? ([1-9]?\d):([1-9]?\d):([1-9]?\d)\.([1-9]?\d{0,2}) )";
 
 TEST(LogTest, FormatsEachPartUnpadded) {
-    const struct {
-        const char *source, *text, *expected;
-        LogLevel level;
-    } cases[] = {
-        {"one/two\\three.cpp", "WinMain Enter", "three.cpp(17): Info: WinMain Enter\r\n", LogLevel::Info},
-        {"plain", "", "plain(17): Error: \r\n", LogLevel::Error},
-        {"x", "odd", "x(17): : odd\r\n", static_cast<LogLevel>(3)},
-        {"Main", "a\nb", "Main(17): Trace: a\nb\r\n", LogLevel::Trace},
-        {"f", "F", "f(17): Fatal: F\r\n", LogLevel::Fatal},
-        {"w", "W", "w(17): Warning: W\r\n", LogLevel::Warning},
+    const std::tuple<const char*, const char*, LogLevel, const char*> cases[] = {
+        {"one/two\\three.cpp", "WinMain Enter", LogLevel::Info, "three.cpp(17): Info: WinMain Enter\r\n"},
+        {"plain", "", LogLevel::Error, "plain(17): Error: \r\n"},
+        {"x", "odd", static_cast<LogLevel>(3), "x(17): : odd\r\n"},
+        {"Main", "a\nb", LogLevel::Trace, "Main(17): Trace: a\nb\r\n"},
+        {"f", "F", LogLevel::Fatal, "f(17): Fatal: F\r\n"},
+        {"w", "W", LogLevel::Warning, "w(17): Warning: W\r\n"},
     };
-    for (const auto& c : cases) {
+    for (const auto& [source, text, level, expected] : cases) {
         std::smatch stamp;
-        const std::string line = Log::FormatLine(c.source, c.text, c.level, 17);
+        const std::string line = Log::FormatLine(source, text, level, 17);
         ASSERT_TRUE(std::regex_search(line, stamp, std::regex("^" + kStamp))) << line;
-        EXPECT_EQ(stamp.suffix(), c.expected);
+        EXPECT_EQ(stamp.suffix(), expected);
     }
 }
 

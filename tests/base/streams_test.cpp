@@ -1,9 +1,8 @@
-// Files, paths and streams: positions, limits, sharing, and errors that
-// name the file.
 #include <gtest/gtest.h>
 
 #include <cstring>
 #include <functional>
+#include <tuple>
 
 #include "base/exception.h"
 #include "base/memory_stream.h"
@@ -80,11 +79,7 @@ TEST(MemoryStreamTest, StaysInsideTheBorrowedBuffer) {
 }
 
 TEST(StreamReadersTest, SevenBitIntegersFitIn32Bits) {
-    const struct {
-        std::string bytes;
-        uint32_t value;
-        const char* outcome;
-    } cases[] = {
+    const std::tuple<std::string, uint32_t, const char*> cases[] = {
         {std::string(1, '\0'), 0, "ok"},
         {"\x7F", 127, "ok"},
         {std::string("\x81\x00", 2), 128, "ok"},
@@ -93,22 +88,18 @@ TEST(StreamReadersTest, SevenBitIntegersFitIn32Bits) {
         {"\x80\x80\x80\x80\x80", 0, "Invalid 7-bit encoded integer in stream."},
         {"\x81", 0, "End of stream reached with bytes left to read."},
     };
-    for (const auto& c : cases) {
-        std::string bytes = c.bytes;
+    for (const auto& [encoded, expected, outcome] : cases) {
+        std::string bytes = encoded;
         MemoryStream stream;
         stream.Attach(reinterpret_cast<uint8_t*>(&bytes[0]), static_cast<int32_t>(bytes.size()));
         uint32_t value = 0;
-        EXPECT_NE(Thrown([&] { value = ReadBigEndian7BitEncodedInt(&stream); }).find(c.outcome), std::string::npos);
-        EXPECT_EQ(value, c.value);
+        EXPECT_NE(Thrown([&] { value = ReadBigEndian7BitEncodedInt(&stream); }).find(outcome), std::string::npos);
+        EXPECT_EQ(value, expected);
     }
 }
 
 TEST(PathsTest, OneJoinRuleForFilesAndAddresses) {
-    const struct {
-        const char *base, *tail;
-        char separator;
-        const char* expected;
-    } joins[] = {
+    const std::tuple<const char*, const char*, char, const char*> joins[] = {
         {"C:/Games/", "/data\\x.bin", '\\', "C:\\Games\\data\\x.bin"},
         {"", "a", '\\', "\\a"},
         {"dir", "", '\\', "dir\\"},
@@ -116,7 +107,8 @@ TEST(PathsTest, OneJoinRuleForFilesAndAddresses) {
         {"http://host/base\\", "sub/file", '/', "http://host/base/sub/file"},
         {"\\\\server\\share", "x/y", '\\', "\\\\server\\share\\x\\y"},
     };
-    for (const auto& c : joins) EXPECT_EQ(PathJoin(c.base, c.tail, c.separator), c.expected) << c.base << c.tail;
+    for (const auto& [base, tail, separator, joined] : joins)
+        EXPECT_EQ(PathJoin(base, tail, separator), joined) << base;
     EXPECT_EQ(GetParentDirectory("a/b\\c.txt"), PathJoin("a", "b"));
     EXPECT_EQ(GetFileName("a/b\\c.txt"), "c.txt");
 }

@@ -5,6 +5,7 @@
 
 #include <filesystem>
 #include <string>
+#include <utility>
 
 #include "base/atomic_file.h"
 #include "base/paths.h"
@@ -15,10 +16,7 @@
 namespace {
 
 TEST(MeasureXmlNesting, CountsOpenElementsTheWayTheParserSeesThem) {
-    const struct {
-        const char* text;
-        int depth;
-    } cases[] = {
+    const std::pair<const char*, int> cases[] = {
         {"<a/>", 0},
         {"<?xml version=\"1.0\" ?><a><b><c/></b></a>", 2},
         {"<a><b x='/>' y=\"<c>\"></b></a>", 2},         // markup inside values
@@ -38,7 +36,7 @@ TEST(MeasureXmlNesting, CountsOpenElementsTheWayTheParserSeesThem) {
         {"<a b=c\"d\"></a>", -1},  // quote in an unquoted value
     };
     int64_t nodes = 0;
-    for (const auto& c : cases) EXPECT_EQ(MeasureXmlNesting(c.text, 10, nodes), c.depth) << c.text;
+    for (const auto& [text, depth] : cases) EXPECT_EQ(MeasureXmlNesting(text, 10, nodes), depth) << text;
     EXPECT_EQ(MeasureXmlNesting("<a><b><c></c></b></a>", 2, nodes), -1);
     // Elements, attributes, text and comments each count.
     EXPECT_EQ(MeasureXmlNesting("<a x='1' y='2'>t<b/><!-- c --></a>", 10, nodes), 1);

@@ -1,5 +1,3 @@
-// The built-in string table as the program carries it, and the language
-// selection over it.
 #include <gtest/gtest.h>
 
 #include <algorithm>
