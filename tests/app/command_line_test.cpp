@@ -1,5 +1,7 @@
 #include <gtest/gtest.h>
 
+#include <utility>
+
 #include "app/command_line.h"
 #include "app/updater_arguments.h"
 
@@ -7,11 +9,8 @@ namespace {
 
 using Words = std::vector<std::string>;
 
-TEST(SplitCommandLineTest, SplitsOnBlanksAndQuotes) {
-    struct Case {
-        const char* text;
-        Words words;
-    } cases[] = {
+TEST(CommandLineTest, SplitsOnBlanksAndQuotesAndJoinsBack) {
+    const std::pair<const char*, Words> cases[] = {
         {"", {}},
         {" \t\r\n ", {}},
         {"a  b\tc", {"a", "b", "c"}},
@@ -21,83 +20,52 @@ TEST(SplitCommandLineTest, SplitsOnBlanksAndQuotes) {
         {"C:\\path\\\"x\"", {"C:\\path\\x"}},
         {"\"unterminated quote", {"unterminated quote"}},
     };
-    for (const Case& c : cases) EXPECT_EQ(SplitCommandLine(c.text), c.words) << c.text;
+    for (const auto& [text, words] : cases) EXPECT_EQ(SplitCommandLine(text), words) << text;
+    const Words joined = {"-hostname", "a b", "", "x\ty", "plain"};
+    EXPECT_EQ(SplitCommandLine(JoinCommandLine(joined)), joined);
 }
 
-TEST(SplitCommandLineTest, JoinGivesTheSameWordsBack) {
-    const Words words = {"-hostname", "a b", "", "x\ty", "plain"};
-    EXPECT_EQ(SplitCommandLine(JoinCommandLine(words)), words);
+// The fields that differ from their defaults, in a fixed order.
+std::string Parsed(const std::string& line) {
+    UpdaterArguments a;
+    EXPECT_TRUE(a.Parse(line));
+    std::string out;
+    if (a.serverDeltaTime != 0) out += " delta=" + std::to_string(a.serverDeltaTime);
+    if (a.hostName != kDefaultHostName) out += " host=" + a.hostName;
+    if (!a.sid.empty()) out += " sid=" + a.sid;
+    if (!a.latestVersion.empty()) out += " latest=" + a.latestVersion;
+    const bool flags[] = {a.internallyElevated, !a.downloadEula, a.doUninstallCleanup, a.doRemoveSettings,
+                          a.kdlGlRemove,        a.silent,        a.deleteCorvid};
+    const char* const names[] = {" elevated", " noEula", " cleanup", " settings", " remove", " silent", " corvid"};
+    for (size_t i = 0; i < std::size(flags); ++i) out += flags[i] ? names[i] : "";
+    return out;
 }
 
-UpdaterArguments Parsed(const std::string& line) {
-    UpdaterArguments arguments;
-    EXPECT_TRUE(arguments.Parse(line));
-    return arguments;
-}
-
-TEST(UpdaterArgumentsTest, DefaultsStayForLinesWithoutSwitches) {
-    for (const char* line : {"", "-hostname", "nothing here", "-silent"}) {
-        const UpdaterArguments a = Parsed(line);
-        EXPECT_EQ(a.serverDeltaTime, 0);
-        EXPECT_EQ(a.hostName, kDefaultHostName) << line;
-        EXPECT_FALSE(a.kdlGlRemove);
-        EXPECT_FALSE(a.silent);
-        EXPECT_TRUE(a.downloadEula);
-        EXPECT_TRUE(a.loggedIn);
-    }
-}
-
-TEST(UpdaterArgumentsTest, ComponentRemovalFormReadsOnlyItsOwnFlags) {
-    const UpdaterArguments a = Parsed("-KDL_GL_REMOVE -silent -hostname h -delete_corvid");
-    EXPECT_TRUE(a.kdlGlRemove);
-    EXPECT_TRUE(a.silent);
-    EXPECT_TRUE(a.deleteCorvid);
-    EXPECT_EQ(a.hostName, kDefaultHostName);
-    // Not as the first word: the flags are no switches at all.
-    const UpdaterArguments b = Parsed("-silent -kdl_gl_remove -latestVersion 7");
-    EXPECT_FALSE(b.kdlGlRemove);
-    EXPECT_FALSE(b.silent);
-    EXPECT_EQ(b.latestVersion, "7");
-}
-
-TEST(UpdaterArgumentsTest, SwitchValuesAsTheyAreRead) {
-    struct Case {
-        const char* line;
-        int32_t delta;
-        bool elevated;
-        bool eula;
-    } cases[] = {
-        {"-SERVERDELTATIME 12.9", 12, false, true}, {"-serverDeltaTime -3.7", -3, false, true},
-        {"-serverDeltaTime abc", 0, false, true},   {"-serverDeltaTime 1e12", 2147483647, false, true},
-        {"-internallyElevated 10", 0, true, true},  {"-internallyElevated true", 0, false, true},
-        {"-downloadEula TRUE", 0, false, true},     {"-downloadEula yes", 0, false, false},
+TEST(UpdaterArgumentsTest, ReadsEachSwitchAndSkipsTheRest) {
+    const std::pair<const char*, const char*> cases[] = {
+        {"", ""},
+        {"-hostname", ""},
+        {"nothing here -silent", ""},
+        // The component-removal form reads only its own flags, and only
+        // when it comes first.
+        {"-KDL_GL_REMOVE -silent -hostname h -delete_corvid", " remove silent corvid"},
+        {"-silent -kdl_gl_remove -latestVersion 7", " latest=7"},
+        {"-SERVERDELTATIME 12.9", " delta=12"},
+        {"-serverDeltaTime -3.7", " delta=-3"},
+        {"-serverDeltaTime abc", ""},
+        {"-serverDeltaTime 1e12", " delta=2147483647"},
+        {"-serverDeltaTime -1e12", " delta=-2147483648"},
+        {"-internallyElevated 10", " elevated"},
+        {"-internallyElevated true", ""},
+        {"-downloadEula TRUE", ""},
+        {"-downloadEula yes", " noEula"},
+        {"stray -SID S-1-5-21 -hostname \"back end\" -latestVersion 1001 -doUninstallCleanup true "
+         "-doRemoveSettings TRUE -internallyElevated 1 -hostname",
+         " host=back end sid=S-1-5-21 latest=1001 elevated cleanup settings"},
+        // A word that is no switch here lets the next be read as one.
+        {"-silent -SID s1", " sid=s1"},
     };
-    for (const auto& c : cases) {
-        const UpdaterArguments a = Parsed(c.line);
-        EXPECT_EQ(a.serverDeltaTime, c.delta) << c.line;
-        EXPECT_EQ(a.internallyElevated, c.elevated) << c.line;
-        EXPECT_EQ(a.downloadEula, c.eula) << c.line;
-    }
-}
-
-TEST(UpdaterArgumentsTest, EverySwitchWithItsValue) {
-    const UpdaterArguments a = Parsed(
-        "stray -SID S-1-5-21 -hostname \"back end\" -latestVersion 1001 -doUninstallCleanup true "
-        "-doRemoveSettings TRUE -internallyElevated 1 -hostname");
-    EXPECT_EQ(a.sid, "S-1-5-21");
-    EXPECT_EQ(a.hostName, "back end");
-    EXPECT_EQ(a.latestVersion, "1001");
-    EXPECT_TRUE(a.doUninstallCleanup);
-    EXPECT_TRUE(a.doRemoveSettings);
-    EXPECT_TRUE(a.internallyElevated);
-    EXPECT_EQ(a.Describe(),
-              "Arguments: ServerDeltaTime=0 InternallyElevated=1 loggedIn=1 SessionId= HostName=back end");
-}
-
-TEST(UpdaterArgumentsTest, ASkippedWordLetsTheNextBeReadAsASwitch) {
-    // "-silent" is no switch here, so "-SID" right after it is still one.
-    const UpdaterArguments a = Parsed("-silent -SID s1");
-    EXPECT_EQ(a.sid, "s1");
+    for (const auto& [line, parsed] : cases) EXPECT_EQ(Parsed(line), parsed) << line;
 }
 
 }  // namespace

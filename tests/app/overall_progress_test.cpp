@@ -1,17 +1,12 @@
-#include <gtest/gtest.h>
-
 #include "app/overall_progress.h"
 
-namespace {
+#include <gtest/gtest.h>
+
+#include <tuple>
 
 TEST(OverallProgress, CompleteArchivesFillTheirSharesAndTheCurrentOneItsPart) {
-    const struct {
-        int32_t done;
-        int32_t total;
-        uint32_t bytesDone;
-        uint32_t bytesTotal;
-        int32_t expected;
-    } cases[] = {
+    // Archives done and in all, bytes of the current one fetched and in all; the progress in thousandths.
+    const std::tuple<int32_t, int32_t, uint32_t, uint32_t, int32_t> cases[] = {
         {2, 4, 300, 600, 625},  // second of four complete, third half fetched
         {0, 4, 0, 600, 0},
         {4, 4, 0, 0, 1000},   // after the last archive
@@ -24,10 +19,7 @@ TEST(OverallProgress, CompleteArchivesFillTheirSharesAndTheCurrentOneItsPart) {
         {1, 4, 3000000, 1048576, 500},
         {3, 3, 5, 10, 1000},
     };
-    for (const auto& item : cases) {
-        EXPECT_EQ(OverallProgress(item.done, item.total, item.bytesDone, item.bytesTotal), item.expected)
-            << item.done << "/" << item.total << " " << item.bytesDone << "/" << item.bytesTotal;
+    for (const auto& [done, total, bytesDone, bytesTotal, expected] : cases) {
+        EXPECT_EQ(OverallProgress(done, total, bytesDone, bytesTotal), expected) << done << "/" << total;
     }
 }
-
-}  // namespace

@@ -1,24 +1,22 @@
-// The shared XML reading and printing rules: TinyXML's own output byte for
-// byte, code-page bytes kept, and hostile files refused before TinyXML's
-// recursive parser could overflow the stack.
+// The shared XML rules: TinyXML's own output byte for byte, code-page bytes
+// kept, hostile files refused before TinyXML's recursive parser could
+// overflow the stack, and a failed save that leaves the old file.
 #include <gtest/gtest.h>
 
 #include <filesystem>
 #include <string>
+#include <utility>
 
+#include "base/atomic_file.h"
 #include "base/paths.h"
 #include "base/xml_file.h"
 #include "base/xml_nesting.h"
-#include "tests/support/format_test_helpers.h"
 #include "tests/support/test_files.h"
 
 namespace {
 
 TEST(MeasureXmlNesting, CountsOpenElementsTheWayTheParserSeesThem) {
-    const struct {
-        const char* text;
-        int depth;
-    } cases[] = {
+    const std::pair<const char*, int> cases[] = {
         {"<a/>", 0},
         {"<?xml version=\"1.0\" ?><a><b><c/></b></a>", 2},
         {"<a><b x='/>' y=\"<c>\"></b></a>", 2},         // markup inside values
@@ -38,47 +36,32 @@ TEST(MeasureXmlNesting, CountsOpenElementsTheWayTheParserSeesThem) {
         {"<a b=c\"d\"></a>", -1},  // quote in an unquoted value
     };
     int64_t nodes = 0;
-    for (const auto& c : cases) {
-        SCOPED_TRACE(c.text);
-        EXPECT_EQ(MeasureXmlNesting(c.text, 10, nodes), c.depth);
-    }
+    for (const auto& [text, depth] : cases) EXPECT_EQ(MeasureXmlNesting(text, 10, nodes), depth) << text;
     EXPECT_EQ(MeasureXmlNesting("<a><b><c></c></b></a>", 2, nodes), -1);
     // Elements, attributes, text and comments each count.
     EXPECT_EQ(MeasureXmlNesting("<a x='1' y='2'>t<b/><!-- c --></a>", 10, nodes), 1);
     EXPECT_EQ(nodes, 6);
 }
 
-TEST(ParseXml, RefusesDeepNestingAndMassesOfTinyNodes) {
-    std::string deep;
+TEST(ParseXml, RefusesHostileTextsAndKeepsCodePageBytes) {
+    std::string deep, hidden = "<r>", flat = "<r>";
     for (int i = 0; i < 200000; ++i) deep += "<a>";
-    TiXmlDocument document;
-    EXPECT_FALSE(ParseXml(deep, document));
-    std::string hidden = "<r>";
     for (int i = 0; i < 200000; ++i) hidden += "<a x='/>'><!-- </a> -->";
-    EXPECT_FALSE(ParseXml(hidden, document));
-    std::string flat = "<r>";
     for (int64_t i = 0; i < kMaximumXmlNodes; ++i) flat += "<a/>";
-    EXPECT_FALSE(ParseXml(flat + "</r>", document));
-}
-
-TEST(ParseXml, KeepsCodePageBytesAndReadsLikeLoadFile) {
     TiXmlDocument document;
+    for (const std::string& text : {deep, hidden, flat + "</r>", std::string("<r>a\0b</r>", 10), std::string(),
+                                    std::string("<!-- only a comment -->"), std::string("<r><a></b></r>")}) {
+        EXPECT_FALSE(ParseXml(text, document)) << text.substr(0, 40);
+    }
     // 0xE9 (e acute in Windows-1252) right before the closing quote: read
     // as UTF-8 it would swallow the quote and the rest of the tag.
-    ASSERT_TRUE(ParseXml("<r><new Path=\"Caf\xE9\" File=\"x\" /></r>", document));
+    ASSERT_TRUE(ParseXml("\xEF\xBB\xBF<r>\r\n<new Path=\"Caf\xE9\" File=\"x\" />\r<v>a</v></r>", document));
     const TiXmlElement* item = document.RootElement()->FirstChildElement("new");
     EXPECT_STREQ(item->Attribute("Path"), "Caf\xE9");
     EXPECT_STREQ(item->Attribute("File"), "x");
-
-    ASSERT_TRUE(ParseXml("\xEF\xBB\xBF<r>\r\n<v>a</v>\r</r>", document));
     std::string text;
     EXPECT_TRUE(ReadElementText(document.RootElement(), "v", text));
     EXPECT_EQ(text, "a");
-
-    EXPECT_FALSE(ParseXml(std::string("<r>a\0b</r>", 10), document));
-    EXPECT_FALSE(ParseXml("", document));
-    EXPECT_FALSE(ParseXml("<!-- only a comment -->", document));
-    EXPECT_FALSE(ParseXml("<r><a></b></r>", document));
 }
 
 TEST(LoadXmlFile, RefusesFilesLargerThanAnyRecord) {
@@ -97,41 +80,31 @@ TEST(SaveXmlFile, WritesExactlyWhatTinyXmlsSaveFileWrites) {
     TiXmlDocument document;
     StartXmlDocument(document);
     TiXmlNode* root = document.InsertEndChild(TiXmlElement("Root"));
-    TiXmlElement item("new");
-    item.SetAttribute("Path", "a&b <c> \"d\" 'e'");
-    root->InsertEndChild(item);
-    TiXmlNode* list = root->InsertEndChild(TiXmlElement("List"));
-    list->InsertEndChild(TiXmlElement("Empty"));
+    root->ToElement()->SetAttribute("Path", "a&b <c> \"d\" 'e'");
+    root->InsertEndChild(TiXmlElement("List"))->InsertEndChild(TiXmlElement("Empty"));
     AppendTextElement(root, "Text", "x & y < z");
     AppendTextElement(root, "Blank", "");
-
+    WriteTextFile(folder / "ours.xml", std::string(4096, 'x'));  // replaced whole
     ASSERT_TRUE(SaveXmlFile(document, folder / "ours.xml"));
     ASSERT_TRUE(document.SaveFile((folder / "tinyxml.xml").c_str()));
     EXPECT_EQ(ReadTextFile(folder / "ours.xml"), ReadTextFile(folder / "tinyxml.xml"));
-    EXPECT_EQ(ReadTextFile(folder / "ours.xml"),
-              WithPlatformLineBreaks("<?xml version=\"1.0\" ?>\n"
-                                     "<Root>\n"
-                                     "    <new Path='a&amp;b &lt;c&gt; &quot;d&quot; &apos;e&apos;' />\n"
-                                     "    <List>\n"
-                                     "        <Empty />\n"
-                                     "    </List>\n"
-                                     "    <Text>x &amp; y &lt; z</Text>\n"
-                                     "    <Blank></Blank>\n"
-                                     "</Root>\n"));
     EXPECT_FALSE(PathExists(folder / "~ours.xml.tmp"));
 }
 
-TEST(SaveXmlFile, LeavesTheOldFileWhenTheWriteFails) {
+TEST(SaveXmlFile, AFailedWriteKeepsTheOldFileAndNoTemporary) {
     TempFolder folder;
     TiXmlDocument document;
     StartXmlDocument(document);
-    document.InsertEndChild(TiXmlElement("Root"));
-    EXPECT_FALSE(SaveXmlFile(document, PathJoin(folder / "missing-folder", "x.xml")));
-    // A folder where the temporary file should go makes the write fail.
     WriteTextFile(folder / "x.xml", "old");
+    // The temporary cannot be made: its folder is missing, or a folder has its name.
     std::filesystem::create_directory(folder / "busy.tmp");
+    EXPECT_FALSE(SaveXmlFile(document, folder / "x.xml", PathJoin(folder / "missing", "x.tmp")));
     EXPECT_FALSE(SaveXmlFile(document, folder / "x.xml", folder / "busy.tmp"));
     EXPECT_EQ(ReadTextFile(folder / "x.xml"), "old");
+    // The temporary is written but cannot take the place of a folder.
+    std::filesystem::create_directories(PathJoin(folder / "record", "inside"));
+    EXPECT_FALSE(ReplaceFileAtomically(folder / "record", "new"));
+    EXPECT_FALSE(PathExists(folder / "~record.tmp"));
 }
 
 }  // namespace

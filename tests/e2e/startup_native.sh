@@ -3,40 +3,30 @@
 # a second start against a held single-instance guard.
 set -euo pipefail
 program=$(realpath "$1")
-here=$(cd "$(dirname "$0")" && pwd)
-source "$here/log_format.sh"
-
+source "$(dirname "$0")/log_format.sh"
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
-export TMPDIR=$work/tmp
+export TMPDIR=$work/tmp IRONVALE_REGISTRY_ROOT=$work/registry
 mkdir -p "$TMPDIR"
-export IRONVALE_REGISTRY_ROOT=$work/registry
 
-set +e
-"$program" -serverDeltaTime -3.7 -hostname "test host" </dev/null >"$work/out" 2>&1
-code=$?
-set -e
-[ "$code" -eq 1 ] || fail "exit code $code, expected 1"
+expect_exit() {  # CODE ARGS...; the program never inherits the guard (descriptor 9)
+  local expected=$1 code=0
+  shift
+  "$program" "$@" </dev/null >"$work/out" 2>&1 9>&- || code=$?
+  [ "$code" -eq "$expected" ] || fail "'$*' ended with $code, expected $expected: $(cat "$work/out")"
+}
+
+expect_exit 1 -serverDeltaTime -3.7 -hostname "test host"
 # The program sees one command line rebuilt from its words.
 check_opening_lines "$TMPDIR/IronvaleUpdater.log" '-serverDeltaTime -3.7 -hostname "test host"'
 
-# A second start while another holder (this shell) has the guard.
+# A second start while this shell holds the guard; an elevated copy is
+# never kept out.
 exec 9>"$TMPDIR/IronvaleUpdater.lock"
 flock -n 9 || fail "cannot take the guard"
-set +e
-"$program" -hostname "test host" -serverDeltaTime -3 </dev/null >"$work/out" 2>&1 9>&-
-code=$?
-set -e
-[ "$code" -eq 255 ] || fail "second instance exit code $code, expected 255 (-1)"
-grep -q "Another copy of the updater is already running." "$work/out" || fail "no instance-running message: $(cat "$work/out")"
+expect_exit 255 -hostname "test host"
+grep -q "Another copy of the updater is already running." "$work/out" || fail "no instance-running message"
 tail -1 "$TMPDIR/IronvaleUpdater.log" | grep -q ': Error: There is already another updater instance running\.' \
   || fail "no instance-running log line"
-
-# An elevated copy is never kept out by the guard.
-set +e
-"$program" -internallyElevated 1 </dev/null >"$work/out" 2>&1 9>&-
-code=$?
-set -e
-exec 9>&-
-[ "$code" -eq 1 ] || fail "elevated copy exit code $code, expected 1"
+expect_exit 1 -internallyElevated 1
 echo "startup_native: ok"

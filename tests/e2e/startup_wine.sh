@@ -1,37 +1,34 @@
 #!/usr/bin/env bash
 # IronvaleUpdater.exe under Wine: the opening log lines and exit code, and
-# the instance-running box of a second start, answered by dialog_answer.
-set -euo pipefail
-program=$(realpath "$1")
-holder_exe=$(realpath "$2")
-answer_exe=$(realpath "$3")
+# the instance-running box of a second start, in English and in the
+# language stored in the game's registry key: the current user's, or that
+# of the user named by -SID (as an elevated copy reads it).
 source "$(dirname "$0")/wine_session.sh"
-start_display
-trap 'kill $xvfb 2>/dev/null || true' EXIT
-
-set +e
-"$run" "$program" -serverDeltaTime -3.7 -hostname "test host"
-code=$?
-set -e
+code=0
+"$run" "$program" -serverDeltaTime -3.7 -hostname "test host" || code=$?
 [ "$code" -eq 1 ] || fail "exit code $code, expected 1"
 check_opening_lines "$log" '-serverDeltaTime -3.7 -hostname "test host"'
-
-# Second start while another process holds the mutex.
-"$run" "$holder_exe" 60000 >"$WINEPREFIX/holder.out" 2>&1 &
-holder=$!
-for _ in $(seq 100); do grep -q held "$WINEPREFIX/holder.out" 2>/dev/null && break; sleep 0.1; done
-grep -q held "$WINEPREFIX/holder.out" || fail "the holder did not take the mutex"
-"$run" "$program" -hostname "test host" &
-second=$!
-text=$("$run" "$answer_exe" "Ironvale - Updater" 1 30000 | tr -d '\r')
-set +e
-wait "$second"
-code=$?
-set -e
-kill "$holder" 2>/dev/null || true
-wait "$holder" 2>/dev/null || true
-echo "$text"
-[ "$code" -eq 255 ] || fail "second instance exit code $code, expected 255 (-1)"
+second_start "Ironvale - Updater" -hostname "test host"
 grep -q "Another copy of the updater is already running." <<<"$text" || fail "box text: $text"
-tail -1 "$log" | grep -q ': Error: There is already another updater instance running\.' || fail "no instance-running log line"
+
+key='Software\Halvard\Ironvale'
+sid='S-1-5-21-4242-4242-4242-1001'
+# The prefix outlives the test: no language may stay behind.
+cleanup() { for k in "HKCU\\$key" "HKU\\$sid"; do "$run" reg delete "$k" /f >/dev/null 2>&1 || true; done; }
+table_text() {  # KEY COLUMN: 2 is English, then FRE GER ITA JPN POL RUS SPA
+  awk -F'\t' -v key="$1" -v column="$2" '$1 == key { print $column }' "$root/resources/strings.tsv"
+}
+check_language() {  # HIVE LANGUAGE COLUMN [ARGS...]
+  local hive=$1 language=$2 column=$3 expected
+  shift 3
+  expected=$(table_text INSTALLER_INSTANCE_RUNNING "$column")
+  [ -n "$expected" ] && [ "$expected" != "$(table_text INSTALLER_INSTANCE_RUNNING 2)" ] || fail "$language: not translated"
+  "$run" reg add "$hive\\$key" /v "Install Dir" /t REG_SZ /d 'C:\Games\Ironvale' /f >/dev/null
+  "$run" reg add "$hive\\$key" /v Language /t REG_SZ /d "$language" /f >/dev/null
+  second_start "$(table_text INSTALLER_GAME_NAME "$column") - $(table_text INSTALLER_UPDATER_HEADER "$column")" "$@"
+  cleanup
+  grep -qF -- "$expected" <<<"$text" || fail "$language: box text '$text', expected '$expected'"
+}
+check_language HKCU German 4 -hostname "test host"
+check_language "HKU\\$sid" Polish 7 -SID "$sid"
 echo "startup_wine: ok"

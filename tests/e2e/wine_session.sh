@@ -1,6 +1,11 @@
-# Shared set-up of the end-to-end tests that run IronvaleUpdater.exe under
-# Wine. Sourced after `program` and `holder_exe` are set (absolute paths);
-# sets `root`, `run`, `WINEPREFIX` and `log`, and provides start_display.
+# Shared set-up of the tests that run IronvaleUpdater.exe under Wine,
+# sourced with the script's arguments (the updater, hold_instance,
+# dialog_answer). Sets `root`, `run`, `WINEPREFIX` and `log`, and starts a
+# display for message boxes, stopped on exit after the caller's `cleanup`.
+set -euo pipefail
+program=$(realpath "$1")
+holder_exe=$(realpath "$2")
+answer_exe=$(realpath "$3")
 here=$(cd "$(dirname "${BASH_SOURCE[0]}")" && pwd)
 root=$(cd "$here/../.." && pwd)
 run="$root/scripts/wine-run.sh"
@@ -11,13 +16,29 @@ export WINEPREFIX="$(dirname "$program")/wineprefix"
 "$run" "$holder_exe" 0 >/dev/null 2>&1 || true
 log="$WINEPREFIX/drive_c/users/$(id -un)/Temp/IronvaleUpdater.log"
 [ -d "$(dirname "$log")" ] || log="$WINEPREFIX/drive_c/users/$(id -un)/AppData/Local/Temp/IronvaleUpdater.log"
+export DISPLAY=:$((90 + RANDOM % 100))
+Xvfb "$DISPLAY" -screen 0 1024x768x24 -nolisten tcp >/dev/null 2>&1 &
+xvfb=$!
+trap '! declare -F cleanup >/dev/null || cleanup; kill $xvfb 2>/dev/null || true' EXIT
+sleep 1
 
-# Message boxes need a display: a private Xvfb, its process id in `xvfb`
-# for the caller's clean-up.
-start_display() {
-  local display=:$((90 + RANDOM % 100))
-  Xvfb "$display" -screen 0 1024x768x24 -nolisten tcp >/dev/null 2>&1 &
-  xvfb=$!
-  export DISPLAY=$display
-  sleep 1
+# second_start CAPTION [ARGS...]: the updater started while hold_instance
+# has the single-instance guard must say so in a box (its text lands in
+# `text` and OK is pressed), in its log, and by ending with -1.
+second_start() {
+  local caption=$1 holder second code=0
+  shift
+  "$run" "$holder_exe" 60000 >"$WINEPREFIX/holder.out" 2>&1 &
+  holder=$!
+  for _ in $(seq 100); do grep -q held "$WINEPREFIX/holder.out" 2>/dev/null && break; sleep 0.1; done
+  grep -q held "$WINEPREFIX/holder.out" || fail "the holder did not take the mutex"
+  "$run" "$program" "$@" &
+  second=$!
+  text=$("$run" "$answer_exe" "$caption" 1 30000 | tr -d '\r') || true
+  wait "$second" || code=$?
+  kill "$holder" 2>/dev/null || true
+  wait "$holder" 2>/dev/null || true
+  echo "$caption: $text"
+  [ "$code" -eq 255 ] || fail "second instance exit code $code, expected 255 (-1)"
+  tail -1 "$log" | grep -q ': Error: There is already another updater instance running\.' || fail "no log line"
 }

@@ -1,18 +1,15 @@
-// The command line is untrusted: any text must parse without a crash.
-#include <cstddef>
-#include <cstdint>
-#include <string>
-
+// The command line is untrusted: any text must parse without a crash, and
+// joining and splitting again must give the words back whenever no word
+// holds a double quote (which a joined line cannot carry).
 #include "app/command_line.h"
 #include "app/updater_arguments.h"
+#include "tests/fuzz/fuzz_files.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     const std::string text(reinterpret_cast<const char*>(data), size);
     UpdaterArguments arguments;
     arguments.Parse(text);
     arguments.Describe();
-    // Joining and splitting again must give the words back whenever no word
-    // holds a double quote (which a joined line cannot carry).
     const std::vector<std::string> words = SplitCommandLine(text);
     bool quoted = false;
     for (const std::string& word : words) quoted = quoted || word.find('"') != std::string::npos;

@@ -3,8 +3,8 @@
 #include <atomic>
 #include <filesystem>
 #include <fstream>
+#include <iterator>
 #include <random>
-#include <sstream>
 #include <stdexcept>
 
 #include "base/paths.h"
@@ -13,8 +13,7 @@ namespace fs = std::filesystem;
 
 TempFolder::TempFolder() {
     static std::atomic<unsigned> counter{0};
-    std::random_device seed;
-    const std::string name = "ivl-test-" + std::to_string(seed()) + "-" + std::to_string(counter++);
+    const std::string name = "ivl-test-" + std::to_string(std::random_device()()) + "-" + std::to_string(counter++);
     path = (fs::temp_directory_path() / name).string();
     fs::create_directories(path);
 }
@@ -28,16 +27,13 @@ std::string TempFolder::operator/(const std::string& name) const { return PathJo
 
 void WriteTextFile(const std::string& path, const std::string& content) {
     std::ofstream out(path, std::ios::binary | std::ios::trunc);
-    if (!out) throw std::runtime_error("cannot write fixture " + path);
-    out << content;
+    if (!(out << content)) throw std::runtime_error("cannot write fixture " + path);
 }
 
 std::string ReadTextFile(const std::string& path) {
     std::ifstream in(path, std::ios::binary);
     if (!in) throw std::runtime_error("cannot read " + path);
-    std::ostringstream text;
-    text << in.rdbuf();
-    return text.str();
+    return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
 }
 
 bool PathExists(const std::string& path) {

@@ -2,15 +2,14 @@
 //
 // Holds the updater's single-instance guard, prints "held" and keeps it for
 // the given time, so a test can start a second updater against it.
+#include <windows.h>
+
 #include <cstdio>
 #include <cstdlib>
-
-#include <windows.h>
 
 #include "app/single_instance.h"
 
 int main(int argc, char** argv) {
-    const int milliseconds = argc > 1 ? std::atoi(argv[1]) : 30000;
     SingleInstance instance;
     if (!instance.Acquire()) {
         std::fprintf(stderr, "hold_instance: the guard is held elsewhere\n");
@@ -18,6 +17,6 @@ int main(int argc, char** argv) {
     }
     std::printf("held\n");
     std::fflush(stdout);
-    Sleep(static_cast<DWORD>(milliseconds));
+    Sleep(static_cast<DWORD>(argc > 1 ? std::atoi(argv[1]) : 30000));
     return 0;
 }
