@@ -19,6 +19,10 @@ bool MoveFileReplacing(const std::string& from, const std::string& to);
 // Makes the entries of a folder (renames, new files) durable. Nothing to do
 // on Windows, where moves are written through.
 void SyncFolder(const std::string& folder);
+// Removes a folder: only an empty one, or with everything in it.
+bool DeleteDirectory(const std::string& path, bool recursive);
+// Creates a folder with every missing parent; true when it exists afterwards.
+bool MakeDirectories(const std::string& path);
 // Appends the full path of every file below folder: the folder's own files
 // first, then everything below each subfolder, in the order the file system
 // lists them. A folder that cannot be listed adds nothing.

@@ -4,7 +4,10 @@
 #include <unistd.h>
 
 #include <cstdio>
+#include <filesystem>
+#include <system_error>
 
+#include "base/file_journal.h"
 #include "base/file_operations.h"
 
 bool FileExists(const std::string& path) {
@@ -15,24 +18,50 @@ bool FileExists(const std::string& path) {
 bool RemoveFile(const std::string& path) {
     struct stat info;
     if (::lstat(path.c_str(), &info) != 0 || S_ISDIR(info.st_mode)) return false;
-    return ::unlink(path.c_str()) == 0;
+    if (::unlink(path.c_str()) != 0) return false;
+    if (IFileJournal* journal = GetFileJournal()) journal->RemovedFile(path);
+    return true;
 }
 
 bool RenameFile(const std::string& from, const std::string& to) {
     // rename() would replace the target; the Windows move does not.
     if (FileExists(to)) return false;
-    return std::rename(from.c_str(), to.c_str()) == 0;
+    return MoveFileReplacing(from, to);
 }
 
 bool MoveFileReplacing(const std::string& from, const std::string& to) {
-    return std::rename(from.c_str(), to.c_str()) == 0;
+    if (std::rename(from.c_str(), to.c_str()) != 0) return false;
+    if (IFileJournal* journal = GetFileJournal()) journal->Moved(from, to);
+    return true;
 }
 
 void SyncFolder(const std::string& folder) {
     const int fd = ::open(folder.empty() ? "." : folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     if (fd < 0) return;
-    fsync(fd);
+    const bool synced = fsync(fd) == 0;
     ::close(fd);
+    if (IFileJournal* journal = GetFileJournal(); journal != nullptr && synced) journal->SyncedFolder(folder);
+}
+
+bool DeleteDirectory(const std::string& path, bool recursive) {
+    if (path.empty()) return false;
+    if (recursive) {
+        std::error_code error;
+        std::filesystem::remove_all(path, error);
+        if (error) return false;
+    } else if (::rmdir(path.c_str()) != 0) {
+        return false;
+    }
+    if (IFileJournal* journal = GetFileJournal()) journal->RemovedDirectory(path);
+    return true;
+}
+
+bool MakeDirectories(const std::string& path) {
+    std::error_code error;
+    std::filesystem::create_directories(path, error);
+    if (!std::filesystem::is_directory(path, error)) return false;
+    if (IFileJournal* journal = GetFileJournal()) journal->MadeDirectories(path);
+    return true;
 }
 
 void CollectFiles(const std::string& folder, std::vector<std::string>& list) {

@@ -1,6 +1,7 @@
 #include "base/file_stream.h"
 
 #include "base/exception.h"
+#include "base/file_journal.h"
 
 FileStream::~FileStream() { handle.Close(); }
 
@@ -8,6 +9,10 @@ void FileStream::OpenWith(const std::string& path, NativeHandle::Mode mode, cons
     Close();
     name = path;
     if (!handle.Open(path, mode)) throw Exception(failure + path);
+    filePointer = 0;
+    if (IFileJournal* journal = GetFileJournal(); journal != nullptr && mode != NativeHandle::Mode::OpenRead) {
+        journal->Created(path, mode == NativeHandle::Mode::CreateAlways);
+    }
 }
 
 void FileStream::Create(const std::string& path) {
@@ -28,6 +33,7 @@ int64_t FileStream::Seek(int64_t offset, uint32_t origin) {
     int64_t newPosition = 0;
     if (!handle.Seek(offset, origin, newPosition)) throw Exception("Failed to seek file.");
     position = newPosition;
+    filePointer = newPosition;
     return position;
 }
 
@@ -43,18 +49,22 @@ int32_t FileStream::ReadByte() {
     uint8_t value = 0;
     uint32_t done = 0;
     if (!handle.Read(&value, 1, done)) throw Exception("Failed to read byte from file.");
+    filePointer += done;
     return done == 0 ? -1 : static_cast<int32_t>(value);
 }
 
 uint32_t FileStream::Read(void* destination, uint32_t count) {
     uint32_t done = 0;
     if (!handle.Read(destination, count, done)) throw Exception("Failed to read data from file.");
+    filePointer += done;
     return done;
 }
 
 uint32_t FileStream::Write(const void* source, uint32_t count) {
     uint32_t done = 0;
     if (!handle.Write(source, count, done)) throw Exception("Failed to write data to file.");
+    if (IFileJournal* journal = GetFileJournal()) journal->Wrote(name, filePointer, source, done);
+    filePointer += done;
     return done;
 }
 
@@ -64,4 +74,5 @@ void FileStream::Attach(uint8_t*, int32_t) {}
 
 void FileStream::Flush() {
     if (!handle.Flush()) throw Exception("Failed to flush file: " + name);
+    if (IFileJournal* journal = GetFileJournal()) journal->Flushed(name);
 }

@@ -45,5 +45,8 @@ private:
 
     NativeHandle handle;
     int64_t position = 0;
+    // Where the next read or write happens (the system's file pointer),
+    // which, unlike position, reads and writes move.
+    int64_t filePointer = 0;
     std::string name;
 };

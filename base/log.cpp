@@ -1,5 +1,6 @@
 #include "base/log.h"
 
+#include "base/file_operations.h"
 #include "base/local_time.h"
 #include "base/log_file.h"
 #include "base/paths.h"

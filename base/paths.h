@@ -19,7 +19,3 @@ std::string GetFileName(const std::string& path);
 
 // The user's temporary folder, with its trailing separator.
 std::string GetTempDirectory();
-// Removes a folder: only an empty one, or with everything in it.
-bool DeleteDirectory(const std::string& path, bool recursive);
-// Creates a folder with every missing parent; true when it exists afterwards.
-bool MakeDirectories(const std::string& path);

@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "base/atomic_file.h"
+#include "base/file_operations.h"
 #include "base/paths.h"
 #include "base/string_helpers.h"
 #include "state/registry_manager.h"

@@ -7,6 +7,7 @@
 #include <string>
 
 #include "base/exception.h"
+#include "base/file_operations.h"
 #include "base/file_stream.h"
 #include "base/paths.h"
 

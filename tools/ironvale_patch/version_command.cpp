@@ -4,6 +4,7 @@
 
 #include "base/atomic_file.h"
 #include "base/exception.h"
+#include "base/file_operations.h"
 #include "base/paths.h"
 #include "tools/ironvale_patch/command.h"
 #include "tools/publisher/patch_builder.h"
