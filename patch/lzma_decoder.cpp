@@ -106,7 +106,9 @@ void DecodeLzma(FileStream& input, FileStream& output) {
     uint64_t remaining = unpackedSize;
     SRes result = SZ_OK;
     for (;;) {
-        if (quitRequested.load(std::memory_order_relaxed)) break;
+        // A stopped extraction is a cancel, never a finished file: the
+        // caller must not take the cut-off output for the member.
+        if (quitRequested.load(std::memory_order_relaxed)) throw Exception("", ErrorCode::UserCancelled);
         if (inPosition == inSize) {
             inSize = input.Read(inBuffer.get(), kBufferSize);
             inPosition = 0;

@@ -6,8 +6,8 @@
 class FileStream;
 
 // Set by the user-interface thread when the user confirmed quitting; the
-// decoding loop looks at it once per 64 KiB step and stops quietly, leaving
-// its output incomplete.
+// decoding loop looks at it once per 64 KiB step and stops with a
+// UserCancelled Exception, leaving its output incomplete.
 extern std::atomic<bool> quitRequested;
 
 // The largest dictionary a stream may make us allocate: 1.5 GiB, the most

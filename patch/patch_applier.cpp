@@ -1,14 +1,12 @@
 #include "patch/patch_applier.h"
 
-#include <set>
-
 #include "base/archive_source.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/file_stream.h"
+#include "base/item_path.h"
 #include "base/log.h"
 #include "base/paths.h"
-#include "base/relative_path.h"
 #include "base/status_interfaces.h"
 #include "patch/patch_archive.h"
 #include "patch/patch_info_file.h"
@@ -20,22 +18,37 @@ namespace {
 const char* const kLogSource = "PatchApplier";
 const char* const kDeltaFileName = "diffTempFile.dz";
 
-void RequireContained(const std::string& path) {
-    if (!IsContainedRelativePath(path)) {
-        throw Exception("Unsafe path in patch description: \"" + path + "\"");
+// The path below root (with the platform's separators), or empty when
+// path does not lie below root.
+std::string RelativeBelow(const std::string& path, const std::string& root) {
+    const std::string prefix = PathJoin(root, "");
+    const std::string full = PathJoin(path, "");
+    if (full.size() <= prefix.size() || full.compare(0, prefix.size(), prefix) != 0) return "";
+    return full.substr(prefix.size(), full.size() - prefix.size() - 1);
+}
+
+// Every folder from root down to the one that holds path, root included,
+// when path lies below root: the folders whose entries change when path
+// is created, moved or removed.
+std::vector<std::string> FoldersFromRootTo(const std::string& path, const std::string& root) {
+    const std::string relative = RelativeBelow(path, root);
+    if (relative.empty()) return {};
+    std::string top = PathJoin(root, "");
+    top.pop_back();
+    std::vector<std::string> folders{top};
+    for (size_t end = relative.find(kPathSeparator); end != std::string::npos;
+         end = relative.find(kPathSeparator, end + 1)) {
+        folders.push_back(PathJoin(root, relative.substr(0, end)));
     }
+    return folders;
 }
 
 // Makes sure what stage one wrote is on the disk, not only in a cache,
 // before the installation starts to depend on it.
 void FlushToDisk(const std::string& path) {
-    try {
-        FileStream file;
-        file.OpenForWrite(path);
-        file.Flush();
-    } catch (const Exception& error) {
-        LOG_AS(kLogSource, Error) << "Could not flush " << path << ": " << error.message;
-    }
+    FileStream file;
+    file.OpenForWrite(path);
+    file.Flush();
 }
 
 }  // namespace
@@ -53,6 +66,7 @@ void PatchApplier::Init(PatchInfoFile* info, PatchProgressFile* progress, const 
     cancelRequested = false;
     filesDone = 0;
     actionCounter = 0;
+    changedFolders.clear();
     filesTotal = patchInfo->CountFileAndDirectoryChanges();
 }
 
@@ -78,23 +92,38 @@ void PatchApplier::WaitForArchive(const std::string& archiveName) const {
     throw Exception("Failed to download patch file.", ErrorCode::FileNotFound);
 }
 
-// Every path of the batch is checked before the first file is written or
-// deleted, so a hostile description fails without touching anything.
+void PatchApplier::RequireSafe(const std::string& path, const std::vector<std::string>& ownNames) const {
+    if (!IsSafeItemPath(path, ownNames)) throw Exception("Unsafe path in patch description: \"" + path + "\"");
+}
+
+// Every name of the batch is checked before the first file is written or
+// deleted, so a hostile description fails without touching anything. An
+// item may not reach the updater's own work folders and records: deleting
+// the prepared files or the progress record half-way would lose the batch.
 void PatchApplier::CheckItemPaths() {
+    std::vector<std::string> ownNames = protectedNames;
+    for (const std::string& folder : {patchFolder, patchedFilesFolder}) {
+        const std::string relative = RelativeBelow(folder, installationFolder);
+        if (!relative.empty()) ownNames.push_back(relative);
+    }
+    for (const std::string& record : {progressFile->GetRecordPath(), progressFile->GetAlternativeRecordPath()}) {
+        const std::string relative = RelativeBelow(record, installationFolder);
+        if (!relative.empty()) ownNames.push_back(relative);
+    }
     patchInfo->ResetIterators();
     std::string path;
     std::string archive;
     while (patchInfo->NextDiffFile(path, archive)) {
-        RequireContained(path);
-        RequireContained(archive);
+        RequireSafe(path, ownNames);
+        RequireSafe(archive, {});
     }
     while (patchInfo->NextNewFile(path, archive)) {
-        RequireContained(path);
-        RequireContained(archive);
+        RequireSafe(path, ownNames);
+        RequireSafe(archive, {});
     }
-    while (patchInfo->NextDeletedFile(path)) RequireContained(path);
-    while (patchInfo->NextDeletedDirectory(path)) RequireContained(path);
-    while (patchInfo->NextNewDirectory(path)) RequireContained(path);
+    while (patchInfo->NextDeletedFile(path)) RequireSafe(path, ownNames);
+    while (patchInfo->NextDeletedDirectory(path)) RequireSafe(path, ownNames);
+    while (patchInfo->NextNewDirectory(path)) RequireSafe(path, ownNames);
     patchInfo->ResetIterators();
 }
 
@@ -117,6 +146,10 @@ void PatchApplier::PreparePatch() {
         ReportProgress(path);
         PrepareNewFile(path, archive);
     }
+    // A cancel during the last extraction must not pass for a finished
+    // stage: stage two would move a cut-off file in.
+    CheckCancel();
+    MakePreparedFilesDurable();
 }
 
 void PatchApplier::PrepareDiffFile(const std::string& path, const std::string& archive) {
@@ -140,6 +173,7 @@ void PatchApplier::PrepareDiffFile(const std::string& path, const std::string& a
         LogEntry(LogLevel::Trace, kLogSource, 107).Stream()
             << "Patching file " << path << ". Size: " << source.GetLength();
         VcdiffDecoder::Decode(&source, &delta, &target);
+        target.Flush();
     } catch (const Exception& error) {
         throw Exception(
             "Failed to apply delta file " + deltaPath + " on " + sourcePath + ". Source message: " + error.message,
@@ -152,7 +186,29 @@ void PatchApplier::PrepareNewFile(const std::string& path, const std::string& ar
     const std::string folder = PathJoin(patchedFilesFolder, GetParentDirectory(path));
     if (!FileExists(folder)) MakeDirectories(folder);
     WaitForArchive(archive);
-    PatchArchive(PathJoin(patchFolder, archive)).DecodeFile(path, PathJoin(patchedFilesFolder, path));
+    const std::string target = PathJoin(patchedFilesFolder, path);
+    PatchArchive(PathJoin(patchFolder, archive)).DecodeFile(path, target);
+    FlushToDisk(target);
+}
+
+// Stage two starts to depend on the prepared files with its first record:
+// a power cut after it must not find them empty or missing. The files'
+// data is flushed as each is written; here their names follow, every
+// folder from the installation down to each prepared file.
+void PatchApplier::MakePreparedFilesDurable() {
+    std::vector<std::string> prepared;
+    CollectFiles(patchedFilesFolder, prepared);
+    std::set<std::string> folders;
+    const std::string root =
+        RelativeBelow(patchedFilesFolder, installationFolder).empty() ? patchedFilesFolder : installationFolder;
+    for (const std::string& file : prepared) {
+        for (const std::string& folder : FoldersFromRootTo(file, root)) folders.insert(folder);
+    }
+    for (const std::string& folder : folders) SyncFolder(folder);
+}
+
+void PatchApplier::NoteChanged(const std::string& path) {
+    for (const std::string& folder : FoldersFromRootTo(path, installationFolder)) changedFolders.insert(folder);
 }
 
 void PatchApplier::ApplyPatch() {
@@ -160,32 +216,43 @@ void PatchApplier::ApplyPatch() {
     CheckItemPaths();
     std::string path;
     while (patchInfo->NextDeletedFile(path)) {
-        if (ShouldApply(path)) RemoveFile(PathJoin(installationFolder, path));
+        const std::string target = PathJoin(installationFolder, path);
+        if (ShouldApply(path)) RemoveFile(target);
+        NoteChanged(target);
         ++filesDone;
         ReportProgress(path);
     }
     while (patchInfo->NextDeletedDirectory(path)) {
-        if (ShouldApply(path)) DeleteDirectory(PathJoin(installationFolder, path), true);
+        const std::string target = PathJoin(installationFolder, path);
+        if (ShouldApply(path)) DeleteDirectory(target, true);
+        NoteChanged(target);
         ++filesDone;
         ReportProgress(path);
     }
     while (patchInfo->NextNewDirectory(path)) {
-        if (ShouldApply(path)) MakeDirectories(PathJoin(installationFolder, path));
+        const std::string target = PathJoin(installationFolder, path);
+        if (ShouldApply(path)) MakeDirectories(target);
+        NoteChanged(target);
         ++filesDone;
         ReportProgress(path);
     }
 
+    // The moves begin. From here on a resumed run must not repeat any
+    // deletion: the item it would repeat may already have been replaced by
+    // a moved file of the same name (a file deleted and added anew, or a
+    // folder that became a file). A record past the last action says so.
+    Record(actionCounter, "");
+    progressFile->resuming = false;
+
     std::vector<std::string> prepared;
     CollectFiles(patchedFilesFolder, prepared);
-    for (const std::string& file : prepared) FlushToDisk(file);
-    std::set<std::string> touchedFolders;
     for (const std::string& file : prepared) {
         const std::string destination = DestinationOf(file);
         MoveWithRetry(file, destination);
-        touchedFolders.insert(GetParentDirectory(destination));
+        NoteChanged(destination);
     }
-    // The moves must be durable before the caller records the new version.
-    for (const std::string& folder : touchedFolders) SyncFolder(folder);
+    // Everything must be durable before the caller records the new version.
+    for (const std::string& folder : changedFolders) SyncFolder(folder);
 }
 
 // The write-ahead gate. Normally each action is recorded before it is
@@ -197,9 +264,7 @@ void PatchApplier::ApplyPatch() {
 // would throw away files already moved into it.
 bool PatchApplier::ShouldApply(const std::string& path) {
     if (!progressFile->resuming) {
-        progressFile->SetActionIndex(actionCounter);
-        progressFile->SetFile(path);
-        progressFile->WriteRecord();
+        Record(actionCounter, path);
         ++actionCounter;
         return true;
     }
@@ -212,6 +277,16 @@ bool PatchApplier::ShouldApply(const std::string& path) {
     return true;
 }
 
+// An action that could not be recorded is not carried out: after a crash
+// the next run would not know it had begun.
+void PatchApplier::Record(int32_t action, const std::string& path) {
+    progressFile->SetActionIndex(action);
+    progressFile->SetFile(path);
+    if (!progressFile->WriteRecord()) {
+        throw Exception("Failed to write the progress record " + progressFile->GetRecordPath(), ErrorCode::StepFailed);
+    }
+}
+
 std::string PatchApplier::DestinationOf(const std::string& preparedFile) const {
     // Every collected file lies below the patched-files folder; only that
     // leading part is exchanged for the installation folder.
@@ -219,7 +294,7 @@ std::string PatchApplier::DestinationOf(const std::string& preparedFile) const {
     return PathJoin(installationFolder, preparedFile.substr(patchedFilesFolder.size()));
 }
 
-void PatchApplier::MoveWithRetry(const std::string& source, const std::string& destination) const {
+void PatchApplier::MoveWithRetry(const std::string& source, const std::string& destination) {
     // A prepared file's folder normally exists by now (a "new" folder item,
     // or an earlier file); when a description forgot it, make it rather
     // than ask the player to fix what they cannot.

@@ -2,6 +2,7 @@
 
 #include <atomic>
 #include <cstdint>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -45,12 +46,18 @@ public:
     // Who is asked when a move fails; without one (null) the first failed
     // move ends stage two. Not owned; kept across Init.
     void SetRetryQuestion(IMoveRetryQuestion* question) { retryQuestion = question; }
+    // Names in the installation (relative) that belong to the program, such
+    // as its installation record: no item may name them or lie inside them.
+    // The work folders and the progress record are protected anyway. Kept
+    // across Init.
+    void ProtectNames(const std::vector<std::string>& names) { protectedNames = names; }
 
     // Stage one. Throws Exception on every failure; the installation is
-    // not changed.
+    // not changed. When it returns, every prepared file is on the disk.
     void PreparePatch();
     // Stage two. Throws Exception when a prepared file cannot be moved and
-    // the user gives up.
+    // the user gives up, or when an action cannot be recorded. When it
+    // returns, every change is on the disk.
     void ApplyPatch();
 
     // From the window's thread: stage one stops at its next check.
@@ -61,8 +68,12 @@ private:
     void ReportProgress(const std::string& path) const;
     void WaitForArchive(const std::string& archiveName) const;
     bool ShouldApply(const std::string& path);
-    void MoveWithRetry(const std::string& source, const std::string& destination) const;
+    void Record(int32_t action, const std::string& path);
+    void MoveWithRetry(const std::string& source, const std::string& destination);
     void CheckItemPaths();
+    void RequireSafe(const std::string& path, const std::vector<std::string>& ownNames) const;
+    void MakePreparedFilesDurable();
+    void NoteChanged(const std::string& path);
     void PrepareDiffFile(const std::string& path, const std::string& archive);
     void PrepareNewFile(const std::string& path, const std::string& archive);
     std::string DestinationOf(const std::string& preparedFile) const;
@@ -75,6 +86,9 @@ private:
     IStatusView* statusView = nullptr;
     IArchiveSource* archives = nullptr;
     IMoveRetryQuestion* retryQuestion = nullptr;
+    std::vector<std::string> protectedNames;
+    // Folders whose entries stage two changed, synced before it returns.
+    std::set<std::string> changedFolders;
     int32_t filesDone = 0;
     int32_t filesTotal = 0;
     std::atomic<bool> cancelRequested{false};

@@ -4,7 +4,8 @@
 
 #include "base/exception.h"
 #include "base/file_operations.h"
-#include "base/relative_path.h"
+#include "base/item_path.h"
+#include "base/log.h"
 #include "patch/patch_applier.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
@@ -15,7 +16,7 @@ std::vector<std::string> ArchivesInFetchOrder(PatchInfoFile& info) {
     const auto add = [&](const std::string& archive) {
         // The name becomes a file name in the patch folder before the
         // applier ever sees the description.
-        if (!IsContainedRelativePath(archive)) {
+        if (!IsSafeItemPath(archive)) {
             throw Exception("Unsafe archive name in patch description: \"" + archive + "\"");
         }
         if (seen.insert(archive).second) names.push_back(archive);
@@ -30,6 +31,7 @@ std::vector<std::string> ArchivesInFetchOrder(PatchInfoFile& info) {
 }
 
 void PatchStages::Prepare(const PatchBatch& batch, IArchiveSource* source, IStatusView* view) {
+    applier.ProtectNames(batch.protectedNames);
     applier.Init(&info, &progress, batch.installationFolder, batch.patchedFilesFolder, batch.patchFolder, view, source);
     prepared = true;
     applier.PreparePatch();
@@ -38,22 +40,58 @@ void PatchStages::Prepare(const PatchBatch& batch, IArchiveSource* source, IStat
 void PatchStages::Apply(const PatchBatch& batch, IStatusView* view, const VersionStore& storeVersion) {
     // A resumed batch did not run stage one in this process.
     if (!prepared) {
+        applier.ProtectNames(batch.protectedNames);
         applier.Init(&info, &progress, batch.installationFolder, batch.patchedFilesFolder, batch.patchFolder, view,
                      nullptr);
     }
-    if (storeVersion) storeVersion("-1");
     progress.SetPatchPath(batch.patchFolder);
     progress.SetPatchedFilesPath(batch.patchedFilesFolder);
     progress.SetPatchUri(batch.patchUri);
     progress.SetVersion(batch.version);
+    // The record comes before the mark "-1": interrupted between the two,
+    // the installation still carries its old version, so the next start
+    // drops the record and the old installation stands. The other way
+    // round it would find "-1" without a record and reinstall everything.
     if (!progress.resuming) {
         progress.SetActionIndex(-1);
         progress.SetFile("");
-        progress.WriteRecord();
+        if (!progress.WriteRecord()) {
+            throw Exception("Failed to write the progress record " + progress.GetRecordPath(), ErrorCode::StepFailed);
+        }
     }
+    Store(storeVersion, "-1");
     applier.ApplyPatch();
-    if (storeVersion) storeVersion(batch.version);
+    Store(storeVersion, batch.version);
     // The spare copy first: found alone, it would be taken for the record.
     RemoveFile(progress.GetAlternativeRecordPath());
     RemoveFile(progress.GetRecordPath());
+}
+
+void PatchStages::Store(const VersionStore& storeVersion, const std::string& version) {
+    if (storeVersion && !storeVersion(version)) {
+        throw Exception("Failed to store the installed version " + version, ErrorCode::StepFailed);
+    }
+}
+
+InterruptedBatch FindInterruptedBatch(const std::string& installedVersion, PatchProgressFile& progress) {
+    progress.resuming = false;
+    if (installedVersion != "-1") {
+        // Stage two writes its first record before it marks the
+        // installation as in change and removes the record only after it
+        // stored the new version: a record beside any other version is a
+        // leftover of a batch that never began or already ended.
+        for (const std::string& record : {progress.GetAlternativeRecordPath(), progress.GetRecordPath()}) {
+            if (FileExists(record)) {
+                LOG(Info) << "Removing the leftover progress record " << record;
+                RemoveFile(record);
+            }
+        }
+        return InterruptedBatch::None;
+    }
+    try {
+        progress.resuming = progress.Recover();
+    } catch (const Exception& error) {
+        LOG(Error) << error.message;
+    }
+    return progress.resuming ? InterruptedBatch::Resume : InterruptedBatch::Reinstall;
 }

@@ -3,9 +3,9 @@
 #include <algorithm>
 
 #include "base/file_operations.h"
+#include "base/item_path.h"
 #include "base/log.h"
 #include "base/paths.h"
-#include "base/relative_path.h"
 #include "patch/patch_info_file.h"
 
 namespace {
@@ -70,8 +70,8 @@ void Uninstaller::AddChanges(const std::string& patchInfoPath, bool qualify) {
             full = name;
             return true;
         }
-        if (!IsContainedRelativePath(name)) {
-            LOG(Error) << "Not recording a path outside the installation: " << name;
+        if (!IsSafeItemPath(name)) {
+            LOG(Error) << "Not recording an unsafe path: " << name;
             return false;
         }
         full = PathJoin(installDirectory, name);

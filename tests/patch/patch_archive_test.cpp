@@ -106,9 +106,19 @@ TEST(DecodeLzma, DecodesEveryShapeAndRefusesBrokenStreams) {
     }
 }
 
-TEST(DecodeLzma, StopsQuietlyWhenQuitIsRequested) {
+// A stopped extraction must never pass for a finished, shorter member.
+TEST(DecodeLzma, AQuitRequestEndsWithUserCancelled) {
+    std::string lzma = EncodeLzma("text");
+    Stream input;
+    Stream output;
+    input.Attach(reinterpret_cast<uint8_t*>(&lzma[0]), static_cast<int32_t>(lzma.size()));
     quitRequested = true;
-    EXPECT_EQ(Decode(EncodeLzma("text")), "");
+    try {
+        DecodeLzma(input, output);
+        ADD_FAILURE() << "the stopped extraction returned";
+    } catch (const Exception& error) {
+        EXPECT_EQ(error.Code(), ErrorCode::UserCancelled);
+    }
     quitRequested = false;
 }
 

@@ -6,6 +6,7 @@
 
 #include "base/exception.h"
 #include "base/file_stream.h"
+#include "base/item_path.h"
 #include "base/paths.h"
 
 namespace {
@@ -13,12 +14,20 @@ namespace {
 // A member name's length is stored in one byte.
 constexpr size_t kMaximumPathLength = 255;
 
+// What the updater keeps for itself in an installation: its work folder
+// and its records. The updater refuses a patch that names them.
+const std::vector<std::string> kUpdaterOwnNames = {"tempPatch", "PPF.xml", "_PPF.xml", "InstallationData.xml",
+                                                   "Uninstall.xml"};
+
 void CheckRelativePath(const std::string& relative, const std::string& name) {
     if (name.find_first_of("\\:") != std::string::npos) {
         throw Exception("A patch cannot carry a name holding a backslash or colon: " + relative);
     }
     if (relative.size() > kMaximumPathLength) {
         throw Exception("A patch cannot carry a path longer than 255 bytes: " + relative);
+    }
+    if (!IsSafeItemPath(relative, kUpdaterOwnNames)) {
+        throw Exception("A patch cannot carry this name (the updater would refuse it): " + relative);
     }
 }
 

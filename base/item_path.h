@@ -1,0 +1,21 @@
+#pragma once
+
+#include <string>
+#include <vector>
+
+// The one check every name from a patch description or an uninstall record
+// passes before it touches the disk. True when path is a plain relative
+// path that stays inside the folder it is joined to and names exactly one
+// thing there on Windows and on POSIX alike:
+// - not empty, and every component (either slash separates) is a real
+//   name: not empty, not "." or "..", not ending in a dot or a space
+//   (Windows drops those, so two names would reach one file);
+// - no root, drive letter, colon or UNC prefix;
+// - no wildcard or other character Windows forbids in names (* ? < > | "
+//   and control characters);
+// - no component that is a device name (CON, PRN, AUX, NUL, COM1-COM9,
+//   LPT1-LPT9, in any case, with or without an extension).
+// ownNames are relative paths the updater keeps for itself (its work
+// folders and records): the item may neither name one nor lie inside one
+// (compared by components, ignoring ASCII case as Windows does).
+bool IsSafeItemPath(const std::string& path, const std::vector<std::string>& ownNames = {});
