@@ -28,8 +28,8 @@ std::string RelativeBelow(const std::string& path, const std::string& root) {
 }
 
 // Every folder from root down to the one that holds path, root included,
-// when path lies below root: the folders whose entries change when path
-// is created, moved or removed.
+// when path lies below root: the folders whose entries may change when
+// path is created with its missing parents.
 std::vector<std::string> FoldersFromRootTo(const std::string& path, const std::string& root) {
     const std::string relative = RelativeBelow(path, root);
     if (relative.empty()) return {};
@@ -211,28 +211,37 @@ void PatchApplier::NoteChanged(const std::string& path) {
     for (const std::string& folder : FoldersFromRootTo(path, installationFolder)) changedFolders.insert(folder);
 }
 
+// Each action is on the disk before the next one is recorded: a record
+// that outlived a power cut must never name an action after one the cut
+// undid, or the resumed run would skip the undone one.
 void PatchApplier::ApplyPatch() {
     LogEntry(LogLevel::Trace, kLogSource, 161).Stream() << "ApplyPatch Start";
     CheckItemPaths();
     std::string path;
     while (patchInfo->NextDeletedFile(path)) {
         const std::string target = PathJoin(installationFolder, path);
-        if (ShouldApply(path)) RemoveFile(target);
-        NoteChanged(target);
+        if (ShouldApply(path)) {
+            RemoveFile(target);
+            SyncFolder(GetParentDirectory(target));
+        }
         ++filesDone;
         ReportProgress(path);
     }
     while (patchInfo->NextDeletedDirectory(path)) {
         const std::string target = PathJoin(installationFolder, path);
-        if (ShouldApply(path)) DeleteDirectory(target, true);
-        NoteChanged(target);
+        if (ShouldApply(path)) {
+            DeleteDirectory(target, true);
+            SyncFolder(GetParentDirectory(target));
+        }
         ++filesDone;
         ReportProgress(path);
     }
     while (patchInfo->NextNewDirectory(path)) {
         const std::string target = PathJoin(installationFolder, path);
-        if (ShouldApply(path)) MakeDirectories(target);
-        NoteChanged(target);
+        if (ShouldApply(path)) {
+            MakeDirectories(target);
+            for (const std::string& folder : FoldersFromRootTo(target, installationFolder)) SyncFolder(folder);
+        }
         ++filesDone;
         ReportProgress(path);
     }

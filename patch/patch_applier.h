@@ -60,6 +60,11 @@ public:
     // returns, every change is on the disk.
     void ApplyPatch();
 
+    // Throws Exception when any name of the batch may not touch the disk.
+    // Both stages begin with it; stage two's caller calls it before it
+    // writes anything of its own.
+    void CheckItemPaths();
+
     // From the window's thread: stage one stops at its next check.
     void RequestCancel() { cancelRequested = true; }
 
@@ -70,7 +75,6 @@ private:
     bool ShouldApply(const std::string& path);
     void Record(int32_t action, const std::string& path);
     void MoveWithRetry(const std::string& source, const std::string& destination);
-    void CheckItemPaths();
     void RequireSafe(const std::string& path, const std::vector<std::string>& ownNames) const;
     void MakePreparedFilesDurable();
     void NoteChanged(const std::string& path);
@@ -87,7 +91,7 @@ private:
     IArchiveSource* archives = nullptr;
     IMoveRetryQuestion* retryQuestion = nullptr;
     std::vector<std::string> protectedNames;
-    // Folders whose entries stage two changed, synced before it returns.
+    // Folders the moves changed, synced before stage two returns.
     std::set<std::string> changedFolders;
     int32_t filesDone = 0;
     int32_t filesTotal = 0;

@@ -44,6 +44,8 @@ void PatchStages::Apply(const PatchBatch& batch, IStatusView* view, const Versio
         applier.Init(&info, &progress, batch.installationFolder, batch.patchedFilesFolder, batch.patchFolder, view,
                      nullptr);
     }
+    // A description changed since stage one must fail before the record.
+    applier.CheckItemPaths();
     progress.SetPatchPath(batch.patchFolder);
     progress.SetPatchedFilesPath(batch.patchedFilesFolder);
     progress.SetPatchUri(batch.patchUri);
