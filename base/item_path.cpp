@@ -24,8 +24,8 @@ bool IsDeviceName(const std::string& component) {
     for (const char* device : kDevices) {
         if (stem == device) return true;
     }
-    return stem.size() == 4 && (stem.compare(0, 3, "com") == 0 || stem.compare(0, 3, "lpt") == 0) &&
-           stem[3] >= '1' && stem[3] <= '9';
+    return stem.size() == 4 && (stem.compare(0, 3, "com") == 0 || stem.compare(0, 3, "lpt") == 0) && stem[3] >= '1' &&
+           stem[3] <= '9';
 }
 
 bool IsSafeComponent(const std::string& component) {
