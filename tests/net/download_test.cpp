@@ -8,6 +8,7 @@
 #include <tuple>
 
 #include "base/exception.h"
+#include "base/file_operations.h"
 #include "base/paths.h"
 #include "net/http_downloader.h"
 #include "net/location.h"

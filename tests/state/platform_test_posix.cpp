@@ -6,6 +6,7 @@
 #include <random>
 
 #include "base/exception.h"
+#include "base/file_operations.h"
 #include "base/paths.h"
 #include "registry_sandbox.h"
 #include "state/registry_manager.h"

@@ -187,22 +187,25 @@ void BatchRun::OnApplyProgress(const std::string& fileName, int32_t permille) {
 }
 
 BatchRun::BatchRun(const TestBatch& patchBatch)
-    : batch(patchBatch), work{batch.Installation(), batch.PatchFolder(), batch.PatchedFiles(), "", "2"} {
+    : batch(patchBatch), work{batch.Installation(), batch.PatchFolder(), batch.PatchedFiles(), "", "2", {}} {
     info.Load(PathJoin(batch.Root(), "patchinfo.xml"));
     progress.SetDirectory(batch.Root());
 }
 
 void BatchRun::Apply() {
-    stages.Apply(work, this, [this](const std::string& version) { WriteTextFile(batch.VersionFile(), version); });
+    stages.Apply(work, this, [this](const std::string& version) {
+        WriteTextFile(batch.VersionFile(), version);
+        return true;
+    });
 }
 
 void BatchRun::Resume() {
-    try {
-        progress.resuming = progress.Recover();
-    } catch (const Exception& error) {
-        if (error.Code() != ErrorCode::ReinstallRequired) throw;
+    switch (FindInterruptedBatch(ReadTextFile(batch.VersionFile()), progress)) {
+        case InterruptedBatch::Resume:
+            return Apply();
+        case InterruptedBatch::None:
+            return;
+        case InterruptedBatch::Reinstall:
+            throw std::runtime_error("the next start would reinstall the complete build");
     }
-    const bool finished = ReadTextFile(batch.VersionFile()) == work.version;
-    if (finished) RemoveFile(progress.GetRecordPath());
-    if (!finished) Apply();
 }

@@ -66,9 +66,9 @@ public:
     void OnFileDone(const std::string&) override {}
     void Prepare() { stages.Prepare(work, this, this); }
     void Apply();  // stage two, storing the version in the batch's file
-    // Stage two as the next start finishes an interrupted batch: with the new
-    // version stored only the record was left; an unreadable record was cut
-    // short while first written, before any action.
+    // What the next start does after an interruption, by the updater's own
+    // decision: stage two finished from its record, or (the batch had not
+    // marked the installation yet) the old installation left as it was.
     void Resume();
 
     const TestBatch& batch;

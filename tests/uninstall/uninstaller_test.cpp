@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include "base/exception.h"
+#include "base/file_operations.h"
 #include "base/paths.h"
 #include "tests/support/test_files.h"
 
