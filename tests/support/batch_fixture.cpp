@@ -186,21 +186,22 @@ void BatchRun::OnApplyProgress(const std::string& fileName, int32_t permille) {
     if (onReport) onReport(fileName);
 }
 
-BatchRun::BatchRun(const TestBatch& patchBatch)
-    : batch(patchBatch), work{batch.Installation(), batch.PatchFolder(), batch.PatchedFiles(), "", "2", {}} {
-    info.Load(PathJoin(batch.Root(), "patchinfo.xml"));
-    progress.SetDirectory(batch.Root());
+BatchRun::BatchRun(const std::string& root)
+    : versionFile(PathJoin(root, "version")),
+      work{PathJoin(root, "install"), PathJoin(root, "patch"), PathJoin(root, "patched"), "", "2", {}} {
+    info.Load(PathJoin(root, "patchinfo.xml"));
+    progress.SetDirectory(root);
 }
 
 void BatchRun::Apply() {
     stages.Apply(work, this, [this](const std::string& version) {
-        WriteTextFile(batch.VersionFile(), version);
+        WriteTextFile(versionFile, version);
         return true;
     });
 }
 
 void BatchRun::Resume() {
-    switch (FindInterruptedBatch(ReadTextFile(batch.VersionFile()), progress)) {
+    switch (FindInterruptedBatch(ReadTextFile(versionFile), progress)) {
         case InterruptedBatch::Resume:
             return Apply();
         case InterruptedBatch::None:

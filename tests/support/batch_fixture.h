@@ -59,7 +59,9 @@ private:
 // applier's reports are kept and handed to onReport (a cancel, a crash).
 class BatchRun final : public IArchiveSource, public IStatusView {
 public:
-    explicit BatchRun(const TestBatch& batch);
+    // The batch a TestBatch laid out below root (perhaps in another process).
+    explicit BatchRun(const std::string& root);
+    explicit BatchRun(const TestBatch& batch) : BatchRun(batch.Root()) {}
     ArchiveState WaitForArchive(const std::string&) override { return state; }
     void OnApplyProgress(const std::string& fileName, int32_t permille) override;
     void OnFileProgress(const std::string&, uint32_t, uint32_t) override {}
@@ -71,7 +73,7 @@ public:
     // marked the installation yet) the old installation left as it was.
     void Resume();
 
-    const TestBatch& batch;
+    const std::string versionFile;
     PatchBatch work;
     PatchInfoFile info;
     PatchProgressFile progress;

@@ -1,0 +1,51 @@
+#include <signal.h>
+#include <spawn.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <climits>
+#include <stdexcept>
+
+#include "base/paths.h"
+#include "tests/support/child_process.h"
+
+extern char** environ;
+
+ChildProcess::ChildProcess(const std::string& program, const std::vector<std::string>& arguments) {
+    std::vector<std::string> words{program};
+    words.insert(words.end(), arguments.begin(), arguments.end());
+    std::vector<char*> argv;
+    for (std::string& word : words) argv.push_back(word.data());
+    argv.push_back(nullptr);
+    pid_t child = 0;
+    if (posix_spawn(&child, program.c_str(), nullptr, nullptr, argv.data(), environ) != 0) {
+        throw std::runtime_error("cannot start " + program);
+    }
+    handle = child;
+}
+
+ChildProcess::~ChildProcess() {
+    if (!waited) {
+        Kill();
+        Wait();
+    }
+}
+
+void ChildProcess::Kill() { kill(static_cast<pid_t>(handle), SIGKILL); }
+
+int ChildProcess::Wait() {
+    if (!waited) {
+        int status = 0;
+        waitpid(static_cast<pid_t>(handle), &status, 0);
+        exitCode = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+        waited = true;
+    }
+    return exitCode;
+}
+
+std::string TestProgramPath(const std::string& name) {
+    char self[PATH_MAX] = {};
+    const ssize_t length = readlink("/proc/self/exe", self, sizeof(self) - 1);
+    if (length <= 0) throw std::runtime_error("cannot find the test program");
+    return PathJoin(PathJoin(GetParentDirectory(self), "support/programs"), name);
+}
