@@ -158,14 +158,16 @@ void GuiManager::Show() {
     ui->Draw(*this, true);
 }
 
+// Like the window's thread messages, reports reach the bar only while the
+// front end runs.
 void GuiManager::SetOverallProgress(int32_t permille) {
     std::lock_guard<std::mutex> lock(ui->mutex);
-    if (progress.SetOverall(permille)) ui->Draw(*this, false);
+    if (ui->running && progress.SetOverall(permille)) ui->Draw(*this, false);
 }
 
 void GuiManager::SetFileProgress(int32_t permille) {
     std::lock_guard<std::mutex> lock(ui->mutex);
-    if (progress.SetFile(permille)) ui->Draw(*this, false);
+    if (ui->running && progress.SetFile(permille)) ui->Draw(*this, false);
 }
 
 void GuiManager::SetStatusText(const std::wstring& text) {

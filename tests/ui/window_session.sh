@@ -8,6 +8,22 @@ game_key='HKCU\Software\Halvard\Ironvale'
 driver_log="$(dirname "$log")/window_driver.log"
 scratch=$(mktemp -d)
 
+# A private Xvfb, its process id in xvfb. The server picks a free display
+# number itself and says it once it is ready: other tests on this machine
+# run displays of their own, and a display shared by chance ends when its
+# owner kills it.
+start_display() {
+  Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp 3>"$scratch/display" >/dev/null 2>&1 &
+  xvfb=$!
+  for _ in $(seq 200); do [ -s "$scratch/display" ] && break; sleep 0.05; done
+  [ -s "$scratch/display" ] || fail "Xvfb did not start"
+  export DISPLAY=:$(head -1 "$scratch/display")
+}
+
+# Without a window manager Wine waits two seconds for one to acknowledge
+# each closed box. The driver's windows are left unmanaged instead.
+"$run" reg add 'HKCU\Software\Wine\AppDefaults\window_driver.exe\X11 Driver' /v Managed /t REG_SZ /d N /f >/dev/null
+
 # The values a test sets in the game's key go again on the way out: the
 # prefix is shared with the start-up tests, which expect none.
 end_session() {

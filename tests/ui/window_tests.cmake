@@ -10,7 +10,7 @@ if(WIN32)
   ironvale_warnings(window_driver)
 
   add_executable(window_probe "${programs}/window_probe.cpp")
-  target_link_libraries(window_probe PRIVATE user32 gdi32)
+  target_link_libraries(window_probe PRIVATE user32)
   target_link_options(window_probe PRIVATE -municode)
   ironvale_warnings(window_probe)
 

@@ -22,13 +22,15 @@ measure() {
             "$root/resources/pictures/background.png" | sed 's/^\([a-z]*\) \(.*\)/\1="\2"/')"
 }
 
-# bar_reaches LENGTH: waits for the window to repaint the bar.
+# bar_reaches LENGTH: waits for the window to repaint the bar. A failure
+# keeps the screenshot beside the test results.
 bar_reaches() {
-  for _ in $(seq 20); do
+  for _ in $(seq 40); do
     measure
     [ "$bar" -eq "$1" ] && [ "$status" -gt 100 ] && return 0
     sleep 0.25
   done
+  cp "$scratch/screen.png" "$(dirname "$program")/test-results/window_wine-failed.png" 2>/dev/null || true
   fail "bar drawn $bar px long (status line: $status changed pixels), expected $1"
 }
 

@@ -4,8 +4,6 @@
 //   window_probe combo CAPTION ID         "item NAME" for every entry of
 //                                         the combo box, then "selected NAME"
 //   window_probe select CAPTION ID NAME   selects the entry NAME
-//   window_probe font CAPTION             "font FACE HEIGHT WEIGHT" of the
-//                                         font the box's text uses
 // Waits up to 20 s for the box; exit 2 when none appeared, 3 when the
 // control or entry is missing. Output is UTF-8.
 #include <windows.h>
@@ -61,7 +59,7 @@ std::wstring ComboEntry(HWND combo, LRESULT index) {
 
 int wmain(int argc, wchar_t** argv) {
     if (argc < 3) {
-        std::fprintf(stderr, "usage: window_probe buttons|combo|select|font CAPTION [ID [NAME]]\n");
+        std::fprintf(stderr, "usage: window_probe buttons|combo|select CAPTION [ID [NAME]]\n");
         return 1;
     }
     _setmode(_fileno(stdout), _O_BINARY);
@@ -75,16 +73,10 @@ int wmain(int argc, wchar_t** argv) {
         std::fprintf(stderr, "window_probe: no dialog with that caption appeared\n");
         return 2;
     }
-    // Let the box finish its initialisation (labels, font, list).
+    // Let the box finish its initialisation (labels, list).
     Sleep(200);
     if (command == L"buttons") {
         EnumChildWindows(dialog, PrintButton, 0);
-    } else if (command == L"font") {
-        HFONT font = reinterpret_cast<HFONT>(SendMessageW(dialog, WM_GETFONT, 0, 0));
-        LOGFONTW description = {};
-        if (font == nullptr || GetObjectW(font, sizeof(description), &description) == 0) return 3;
-        Print(L"font '" + std::wstring(description.lfFaceName) + L"' " + std::to_wstring(description.lfHeight) + L" " +
-              std::to_wstring(description.lfWeight));
     } else if (argc >= 4) {
         HWND combo = GetDlgItem(dialog, _wtoi(argv[3]));
         if (combo == nullptr) return 3;
