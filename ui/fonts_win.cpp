@@ -54,6 +54,8 @@ HFONT CreateBestFont(const std::vector<FontCandidate>& candidates, int32_t defau
         const FontCandidate* chosen = ChooseFontCandidate(candidates, installed);
         if (chosen != nullptr) font = MakeFont(chosen->faceName, chosen->height, chosen->weight);
         if (font == nullptr) font = MakeFont("", defaultHeight, defaultWeight);
+    }
+    if (font != nullptr) {
         // The face the system really gave us, which for an empty name is
         // its own choice.
         char face[LF_FACESIZE] = {};

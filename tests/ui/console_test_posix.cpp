@@ -18,7 +18,6 @@
 #include <sstream>
 #include <string>
 
-#include "base/exception.h"
 #include "patch/lzma_decoder.h"
 #include "text/localization.h"
 #include "ui/gui_manager.h"
@@ -199,23 +198,6 @@ TEST_F(Console, CtrlCAsksAndOnlyYesCancelsOnce) {
     struct sigaction after = {};
     sigaction(SIGINT, nullptr, &after);
     EXPECT_EQ(after.sa_handler, before.sa_handler);
-}
-
-TEST_F(Console, StartWhileRunningIsRefused) {
-    FILE* file = std::tmpfile();
-    StderrRedirect redirect(fileno(file));
-    GuiManager gui;
-    gui.Start(nullptr);
-    try {
-        gui.Start(nullptr);
-        ADD_FAILURE() << "a second Start was accepted";
-    } catch (const Exception& error) {
-        EXPECT_EQ(error.message, "GuiManager is already running.");
-    }
-    gui.Stop();
-    gui.Start(nullptr);
-    gui.Stop();
-    std::fclose(file);
 }
 
 TEST_F(Console, LanguageQuestion) {

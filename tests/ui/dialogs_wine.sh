@@ -40,25 +40,24 @@ answer
 expect_reply "language Polish"
 "$run" reg query "$game_key" /v Language | tr -d '\r' | grep -q 'REG_SZ *Polish$' || fail "Polish not stored"
 
-post "ask Weiter?"
-expect_buttons "6 Ja" "7 Nein"
-press 7 >/dev/null
-answer
-expect_reply "answer no"
 post retry
 expect_buttons "4 Wiederholen" "2 Abbrechen"
 press 2 >/dev/null
 answer
 expect_reply "answer cancel"
-for kind in error info; do
-  post "$kind Hinweis"
-  expect_buttons "1 OK"
-  press 1 >/dev/null
-  answer
-done
-# The confirmation comes from the window's own thread and its own hook.
+post "error Hinweis"
+expect_buttons "1 OK"
+press 1 >/dev/null
+answer
+# A question of the main thread owned by the window, and the confirmation
+# from the window's own thread with its own hook.
 send start
 window_rect
+post "ask Weiter?"
+expect_buttons "6 Ja" "7 Nein"
+press 7 >/dev/null
+answer
+expect_reply "answer no"
 click 435 443
 expect_buttons "6 Ja" "7 Nein"
 press 7 >/dev/null

@@ -8,10 +8,10 @@
 //   overall N | file N    progress reports from another thread: "ok"
 //   status TEXT           the status line (UTF-8): "ok"
 //   rect                  "rect LEFT TOP RIGHT BOTTOM", or "rect none"
-//   wait                  WaitWhileConfirming, then the state line
-//   state                 "state cancelled=0|1 cancels=N quit=0|1 window=0|1"
+//   wait                  WaitWhileConfirming, then the state line:
+//                         "state cancelled=0|1 cancels=N quit=0|1 window=0|1"
 //   stop                  Stop, then the state line
-//   ask|error|info TEXT   a box owned by the window: "answer yes|no|ok"
+//   ask|error TEXT        a box owned by the window: "answer yes|no|ok"
 //   retry                 the question after a failed move: "answer retry|cancel"
 //   language              the language dialog; a choice is stored in the
 //                         registry as the updater stores it:
@@ -142,8 +142,6 @@ int main() {
             } else if (command == "wait") {
                 gui.WaitWhileConfirming();
                 Reply(State(gui, cancelable));
-            } else if (command == "state") {
-                Reply(State(gui, cancelable));
             } else if (command == "stop") {
                 gui.Stop();
                 Reply(State(gui, cancelable));
@@ -152,8 +150,6 @@ int main() {
             } else if (command == "error") {
                 gui.ShowError(argument);
                 Reply("answer ok");
-            } else if (command == "info") {
-                Reply(gui.ShowInfo(FromUtf8(argument)) ? "answer ok" : "answer cancel");
             } else if (command == "retry") {
                 MoveRetryBox question;
                 Reply(question.AskRetryMove("C:\\Patched\\a.pak", "C:\\Games\\a.pak") ? "answer retry"
