@@ -11,6 +11,7 @@
 #include "state/registry_manager.h"
 #include "text/localization.h"
 #include "ui/message_box.h"
+#include "ui/ui_services.h"
 
 const char* const kLogFileName = "IronvaleUpdater.log";
 
@@ -75,12 +76,17 @@ int32_t RunUpdaterProcess(const std::string& commandLine) {
     }
     LOG_AS("Main", Info) << arguments->Describe();
 
+    // The button hook comes first, so that the instance-running box below
+    // has its buttons in the player's language too.
+    UiServices ui;
+    ui.InstallMessageBoxHook();
     SingleInstance instance;
     if (!arguments->internallyElevated && !instance.Acquire()) {
         LOG_AS("Main", Error) << "There is already another updater instance running.";
         ShowBox(Localize("INSTALLER_INSTANCE_RUNNING"), MessageIcon::Warning);
         return -1;
     }
+    ui.StartGraphics();
 
     int32_t exitCode = -1;
     {
@@ -90,6 +96,7 @@ int32_t RunUpdaterProcess(const std::string& commandLine) {
         } catch (const Exception& error) {
             ReportEscapedException(error);
         }
+        ui.Shutdown();
         instance.Release();
         Log::Close();
     }

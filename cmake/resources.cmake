@@ -11,14 +11,26 @@ add_custom_command(
   DEPENDS "${PROJECT_SOURCE_DIR}/resources/strings.tsv" "${PROJECT_SOURCE_DIR}/cmake/make_string_table.py"
   COMMENT "Building the string table")
 
-# name type file, for every resource the program reads by name.
+# name type file, for every resource the program reads by name on both
+# platforms. The pictures, the font and the dialog serve only the window of
+# the Windows program and go into its .rc alone.
 set(IRONVALE_NAMED_RESOURCES IDS_STRINGS CSV "${IRONVALE_STRING_TABLE}")
 
 if(WIN32)
   enable_language(RC)
+  # The main window draws its texts in a font of its own: DejaVu Sans Bold
+  # from Debian's fonts-dejavu-core, copied in at build time, never kept in
+  # the repository.
+  set(IRONVALE_FONT_FILE /usr/share/fonts/truetype/dejavu/DejaVuSans-Bold.ttf)
+  if(NOT EXISTS "${IRONVALE_FONT_FILE}")
+    message(FATAL_ERROR "DejaVuSans-Bold.ttf not found: install fonts-dejavu-core (scripts/setup.sh)")
+  endif()
+  set(embedded_font "${CMAKE_CURRENT_BINARY_DIR}/resources/embedded_font.ttf")
+  configure_file("${IRONVALE_FONT_FILE}" "${embedded_font}" COPYONLY)
+  file(GLOB pictures "${PROJECT_SOURCE_DIR}/resources/pictures/*.png")
   set(IRONVALE_RC_FILE "${PROJECT_SOURCE_DIR}/resources/ironvale.rc")
   set_source_files_properties("${IRONVALE_RC_FILE}" PROPERTIES
-    OBJECT_DEPENDS "${IRONVALE_STRING_TABLE};${PROJECT_SOURCE_DIR}/resources/ironvale.ico;${PROJECT_SOURCE_DIR}/resources/IronvaleUpdater.manifest")
+    OBJECT_DEPENDS "${IRONVALE_STRING_TABLE};${PROJECT_SOURCE_DIR}/resources/ironvale.ico;${PROJECT_SOURCE_DIR}/resources/IronvaleUpdater.manifest;${PROJECT_SOURCE_DIR}/resources/resource_ids.h;${embedded_font};${pictures}")
   # windres finds the generated table through the include path.
   set(CMAKE_RC_FLAGS "${CMAKE_RC_FLAGS} -I${CMAKE_CURRENT_BINARY_DIR}/resources -I${PROJECT_SOURCE_DIR}/resources")
   add_library(ironvale_resources OBJECT "${IRONVALE_RC_FILE}")

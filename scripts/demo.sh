@@ -5,6 +5,8 @@
 # patch with the updater's own applier. Then runs the updater once with a
 # sample command line: the Windows program under Wine when Wine is
 # installed, the native build otherwise, and prints the log the run wrote.
+# Under Wine it also shows the updater's window with some progress on a
+# private X display and saves a screenshot of it in the build folder.
 set -euo pipefail
 root=$(cd "$(dirname "$0")/.." && pwd)
 cd "$root"
@@ -52,8 +54,9 @@ sample=(-latestVersion 2 -hostname demo.ironvale.test -serverDeltaTime 5)
 if [ -x /usr/lib/wine/wine64 ] && command -v x86_64-w64-mingw32-g++-posix >/dev/null; then
   echo "== building the Windows program"
   cmake --preset windows >/dev/null
-  cmake --build --preset windows --target IronvaleUpdater >/dev/null
+  cmake --build --preset windows --target IronvaleUpdater window_driver >/dev/null
   export WINEPREFIX=$root/build/windows/wineprefix
+  under_wine=1
   echo "== running IronvaleUpdater.exe ${sample[*]} under Wine"
   set +e
   scripts/wine-run.sh build/windows/IronvaleUpdater.exe "${sample[@]}"
@@ -78,3 +81,25 @@ echo "== the run's lines of $log"
 # The last run starts at the last separator line (one line before it is empty).
 start=$(grep -n -- '-\{103\}' "$log" | tail -1 | cut -d: -f1)
 tail -n +"$((start - 1))" "$log" | tr -d '\r'
+
+if [ -n "${under_wine:-}" ]; then
+  echo "== the updater's window under Wine, at 60 % of a run"
+  shot=$root/build/windows/window.png
+  Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp 3>"$demo/display" >/dev/null 2>&1 &
+  xvfb=$!
+  for _ in $(seq 200); do [ -s "$demo/display" ] && break; sleep 0.05; done
+  export DISPLAY=:$(head -1 "$demo/display")
+  coproc DRIVER { scripts/wine-run.sh build/windows/tests/window_driver.exe 2>/dev/null; }
+  for command in start "status File: data/levels/level2.map" "overall 600" "file 600" rect; do
+    echo "$command" >&"${DRIVER[1]}"
+    read -r -t 60 reply <&"${DRIVER[0]}"
+  done
+  read -r _ left top right bottom <<<"${reply%$'\r'}"
+  sleep 1  # the window repaints on its own thread
+  import -display "$DISPLAY" -window root -crop "$((right - left))x$((bottom - top))+$left+$top" +repage "$shot"
+  echo stop >&"${DRIVER[1]}"
+  exec {DRIVER[1]}>&-
+  wait "$DRIVER_PID" 2>/dev/null || true
+  kill "$xvfb"
+  echo "== screenshot: $shot"
+fi

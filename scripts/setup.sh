@@ -25,6 +25,7 @@ packages=(
   g++-mingw-w64-x86-64-posix gcc-mingw-w64-x86-64-posix binutils-mingw-w64-x86-64
   mingw-w64-x86-64-dev libz-mingw-w64-dev
   wine64 xvfb
+  fonts-dejavu-core fonts-ipafont-gothic imagemagick python3-pil xdotool
   libtinyxml-dev lzma-dev zlib1g-dev libcurl4-openssl-dev libssl-dev
   googletest libgtest-dev libgmock-dev libbenchmark-dev
   clang libclang-rt-14-dev clang-format
