@@ -1,11 +1,13 @@
 # Shared set-up of the tests that run IronvaleUpdater.exe under Wine,
 # sourced with the script's arguments (the updater, hold_instance,
-# dialog_answer). Sets `root`, `run`, `WINEPREFIX` and `log`, and starts a
-# display for message boxes, stopped on exit after the caller's `cleanup`.
+# dialog_answer) unless the caller already set program, holder_exe and
+# answer_exe. Sets `root`, `run`, `WINEPREFIX` and `log`, and starts a
+# private display for the boxes, stopped on exit after the caller's
+# `cleanup` (if it defines one).
 set -euo pipefail
-program=$(realpath "$1")
-holder_exe=$(realpath "$2")
-answer_exe=$(realpath "$3")
+program=${program:-$(realpath "$1")}
+holder_exe=${holder_exe:-$(realpath "$2")}
+answer_exe=${answer_exe:-$(realpath "$3")}
 here=$(cd "$(dirname "${BASH_SOURCE[0]}")" && pwd)
 root=$(cd "$here/../.." && pwd)
 run="$root/scripts/wine-run.sh"
@@ -16,11 +18,16 @@ export WINEPREFIX="$(dirname "$program")/wineprefix"
 "$run" "$holder_exe" 0 >/dev/null 2>&1 || true
 log="$WINEPREFIX/drive_c/users/$(id -un)/Temp/IronvaleUpdater.log"
 [ -d "$(dirname "$log")" ] || log="$WINEPREFIX/drive_c/users/$(id -un)/AppData/Local/Temp/IronvaleUpdater.log"
-export DISPLAY=:$((90 + RANDOM % 100))
-Xvfb "$DISPLAY" -screen 0 1024x768x24 -nolisten tcp >/dev/null 2>&1 &
+
+# The X server picks a free display number itself and says it once it is
+# ready: other tests on the machine run displays of their own.
+display_file=$(mktemp)
+Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp 3>"$display_file" >/dev/null 2>&1 &
 xvfb=$!
-trap '! declare -F cleanup >/dev/null || cleanup; kill $xvfb 2>/dev/null || true' EXIT
-sleep 1
+trap '! declare -F cleanup >/dev/null || cleanup; kill $xvfb 2>/dev/null || true; rm -f "$display_file"' EXIT
+for _ in $(seq 200); do [ -s "$display_file" ] && break; sleep 0.05; done
+[ -s "$display_file" ] || fail "Xvfb did not start"
+export DISPLAY=:$(head -1 "$display_file")
 
 # second_start CAPTION [ARGS...]: the updater started while hold_instance
 # has the single-instance guard must say so in a box (its text lands in

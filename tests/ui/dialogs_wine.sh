@@ -12,7 +12,6 @@ driver_exe=$(realpath "$3")
 probe_exe=$(realpath "$4")
 answer_exe=$(realpath "$5")
 source "$(dirname "$0")/window_session.sh"
-start_display
 
 set_value() { "$run" reg add "$game_key" /v "$1" /t REG_SZ /d "$2" /f >/dev/null; }
 # The updater finds its key by the installation folder.
@@ -99,7 +98,7 @@ fonts_in() {  # NAME FOLDER...: a fontconfig that knows only these folders
 }
 fonts_in latin /usr/share/fonts/truetype/dejavu
 fonts_in japanese /usr/share/fonts/truetype/dejavu /usr/share/fonts/opentype/ipafont-gothic
-trap 'forget_fonts; end_session' EXIT
+cleanup() { forget_fonts; end_session; }
 
 # No Japanese font: no font is made, and each request searches again.
 forget_fonts

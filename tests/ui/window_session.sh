@@ -8,18 +8,6 @@ game_key='HKCU\Software\Halvard\Ironvale'
 driver_log="$(dirname "$log")/window_driver.log"
 scratch=$(mktemp -d)
 
-# A private Xvfb, its process id in xvfb. The server picks a free display
-# number itself and says it once it is ready: other tests on this machine
-# run displays of their own, and a display shared by chance ends when its
-# owner kills it.
-start_display() {
-  Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp 3>"$scratch/display" >/dev/null 2>&1 &
-  xvfb=$!
-  for _ in $(seq 200); do [ -s "$scratch/display" ] && break; sleep 0.05; done
-  [ -s "$scratch/display" ] || fail "Xvfb did not start"
-  export DISPLAY=:$(head -1 "$scratch/display")
-}
-
 # Without a window manager Wine waits two seconds for one to acknowledge
 # each closed box. The driver's windows are left unmanaged instead.
 "$run" reg add 'HKCU\Software\Wine\AppDefaults\window_driver.exe\X11 Driver' /v Managed /t REG_SZ /d N /f >/dev/null
@@ -29,10 +17,9 @@ start_display() {
 end_session() {
   [ -n "${DRIVER_PID:-}" ] && kill "$DRIVER_PID" 2>/dev/null
   "$run" reg delete "$game_key" /f >/dev/null 2>&1 || true
-  [ -n "${xvfb:-}" ] && kill "$xvfb" 2>/dev/null
   rm -rf "$scratch"
 }
-trap end_session EXIT
+cleanup() { end_session; }
 
 # start_driver [NAME=VALUE...]: the driver with extra environment.
 start_driver() {

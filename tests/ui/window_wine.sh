@@ -12,7 +12,6 @@ probe_exe=$(realpath "$4")
 answer_exe=$(realpath "$5")
 source "$(dirname "$0")/window_session.sh"
 "$run" reg delete "$game_key" /f >/dev/null 2>&1 || true
-start_display
 
 # measure: a screenshot of the X server, measured against the background
 # picture; sets bar, title, status, cancel, keyed and pinkish.
