@@ -5,7 +5,7 @@
 #include <sstream>
 #include <vector>
 
-#include "app/command_line.h"
+#include "base/command_line.h"
 #include "base/string_helpers.h"
 
 const char* const kDefaultHostName = "updates.ironvale-game.com";

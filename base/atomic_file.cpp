@@ -7,12 +7,21 @@
 #include "base/file_stream.h"
 #include "base/paths.h"
 
-bool ReplaceFileAtomically(const std::string& path, const std::string& content) {
-    const std::string name = GetFileName(path);
+namespace {
+
+std::string TemporaryFor(const std::string& path) {
+    const std::string name = "~" + GetFileName(path) + ".tmp";
     const std::string folder = GetParentDirectory(path);
-    const std::string temporary = folder.empty() ? "~" + name + ".tmp" : PathJoin(folder, "~" + name + ".tmp");
-    return ReplaceFileAtomically(path, content, temporary);
+    return folder.empty() ? name : PathJoin(folder, name);
 }
+
+}  // namespace
+
+bool ReplaceFileAtomically(const std::string& path, const std::string& content) {
+    return ReplaceFileAtomically(path, content, TemporaryFor(path));
+}
+
+void RemoveLeftoverReplacement(const std::string& path) { RemoveFile(TemporaryFor(path)); }
 
 bool ReplaceFileAtomically(const std::string& path, const std::string& content, const std::string& temporaryPath) {
     try {

@@ -9,6 +9,10 @@
 // (leaving the old file as it was) when any step fails.
 bool ReplaceFileAtomically(const std::string& path, const std::string& content);
 
+// A replacement cut short (a crash, a power cut) leaves its temporary file
+// beside path; this removes it.
+void RemoveLeftoverReplacement(const std::string& path);
+
 // The same with the temporary name chosen by the caller (it must lie in the
 // same folder as path).
 bool ReplaceFileAtomically(const std::string& path, const std::string& content, const std::string& temporaryPath);

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <string>
 #include <vector>
 
@@ -23,6 +24,12 @@ void SyncFolder(const std::string& folder);
 bool DeleteDirectory(const std::string& path, bool recursive);
 // Creates a folder with every missing parent; true when it exists afterwards.
 bool MakeDirectories(const std::string& path);
+// The bytes the calling user may still write on the volume of folder;
+// false when the system cannot tell.
+bool GetFreeDiskSpace(const std::string& folder, int64_t& bytes);
+// The names of the files (not folders) directly in folder; empty when it
+// cannot be listed.
+std::vector<std::string> ListFileNames(const std::string& folder);
 // Appends the full path of every file below folder: the folder's own files
 // first, then everything below each subfolder, in the order the file system
 // lists them. A folder that cannot be listed adds nothing.

@@ -1,6 +1,7 @@
 #include <dirent.h>
 #include <fcntl.h>
 #include <sys/stat.h>
+#include <sys/statvfs.h>
 #include <unistd.h>
 
 #include <cstdio>
@@ -83,4 +84,24 @@ void CollectFiles(const std::string& folder, std::vector<std::string>& list) {
     }
     ::closedir(listing);
     for (const std::string& subfolder : subfolders) CollectFiles(subfolder, list);
+}
+
+bool GetFreeDiskSpace(const std::string& folder, int64_t& bytes) {
+    struct statvfs info;
+    if (::statvfs(folder.c_str(), &info) != 0) return false;
+    bytes = static_cast<int64_t>(info.f_bavail) * static_cast<int64_t>(info.f_frsize);
+    return true;
+}
+
+std::vector<std::string> ListFileNames(const std::string& folder) {
+    std::vector<std::string> names;
+    DIR* listing = ::opendir(folder.c_str());
+    if (listing == nullptr) return names;
+    while (const dirent* entry = ::readdir(listing)) {
+        struct stat info;
+        const std::string name = entry->d_name;
+        if (::lstat((folder + "/" + name).c_str(), &info) == 0 && S_ISREG(info.st_mode)) names.push_back(name);
+    }
+    ::closedir(listing);
+    return names;
 }

@@ -84,3 +84,22 @@ void CollectFiles(const std::string& folder, std::vector<std::string>& list) {
     FindClose(search);
     for (const std::string& subfolder : subfolders) CollectFiles(subfolder, list);
 }
+
+bool GetFreeDiskSpace(const std::string& folder, int64_t& bytes) {
+    ULARGE_INTEGER available;
+    if (GetDiskFreeSpaceExA(folder.c_str(), &available, nullptr, nullptr) == FALSE) return false;
+    bytes = static_cast<int64_t>(available.QuadPart);
+    return true;
+}
+
+std::vector<std::string> ListFileNames(const std::string& folder) {
+    std::vector<std::string> names;
+    WIN32_FIND_DATAA entry;
+    HANDLE search = FindFirstFileA((folder + "\\*").c_str(), &entry);
+    if (search == INVALID_HANDLE_VALUE) return names;
+    do {
+        if ((entry.dwFileAttributes & FILE_ATTRIBUTE_DIRECTORY) == 0) names.push_back(entry.cFileName);
+    } while (FindNextFileA(search, &entry));
+    FindClose(search);
+    return names;
+}

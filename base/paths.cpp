@@ -39,3 +39,10 @@ std::string GetFileName(const std::string& path) {
     const size_t last = text.rfind(kPathSeparator);
     return last == std::string::npos ? text : text.substr(last + 1);
 }
+
+std::string PathBelow(const std::string& path, const std::string& folder) {
+    const std::string prefix = PathJoin(folder, "");
+    const std::string full = PathJoin(path, "");
+    if (full.size() <= prefix.size() || full.compare(0, prefix.size(), prefix) != 0) return "";
+    return full.substr(prefix.size(), full.size() - prefix.size() - 1);
+}

@@ -1,4 +1,9 @@
+#include <unistd.h>
+
 #include <cstdlib>
+#include <vector>
+
+#include "base/exception.h"
 
 #include "base/paths.h"
 
@@ -9,4 +14,23 @@ std::string GetTempDirectory() {
     std::string folder = (tmp != nullptr && *tmp != '\0') ? tmp : "/tmp";
     if (folder.back() != '/') folder += '/';
     return folder;
+}
+
+std::string MakeTempFileName(const std::string& prefix) {
+    std::string pattern = GetTempDirectory() + prefix + "XXXXXX";
+    std::vector<char> name(pattern.begin(), pattern.end());
+    name.push_back('\0');
+    const int fd = ::mkstemp(name.data());
+    if (fd < 0) throw Exception("GetTempFileName failed");
+    ::close(fd);
+    return name.data();
+}
+
+// The desktop's documents folder when it is set, else ~/Documents.
+std::string GetDocumentsFolder() {
+    const char* documents = std::getenv("XDG_DOCUMENTS_DIR");
+    if (documents != nullptr && *documents != '\0') return documents;
+    const char* home = std::getenv("HOME");
+    if (home == nullptr || *home == '\0') return "";
+    return PathJoin(home, "Documents");
 }

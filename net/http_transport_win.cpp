@@ -1,6 +1,8 @@
 #include <windows.h>
 #include <wininet.h>
 
+#include <vector>
+
 #include "net/http_transport.h"
 
 namespace {
@@ -23,7 +25,8 @@ const char kAgent[] = "IronvaleUpdater";
 const char kHeaders[] = "Accept: */*\r\n\r\n";
 const DWORD kHeadersLength = 15;
 // WinINet reads in these pieces; progress is reported after every one.
-const DWORD kReadSize = 1000;
+// Each call is costly (under Wine far more so), so the pieces are large.
+const DWORD kReadSize = 64 * 1024;
 
 }  // namespace
 
@@ -44,12 +47,12 @@ HttpOutcome HttpGet(const std::string& address, HttpResponseSink& sink) {
         HttpQueryInfoA(request.get(), HTTP_QUERY_CONTENT_LENGTH | HTTP_QUERY_FLAG_NUMBER, &length, &size, nullptr);
     if (!sink.OnResponse(statusText, lengthKnown != FALSE, length)) return HttpOutcome::Abandoned;
 
-    char buffer[kReadSize];
+    std::vector<char> buffer(kReadSize);
     while (sink.KeepReading()) {
         DWORD read = 0;
-        if (!InternetReadFile(request.get(), buffer, kReadSize, &read)) return HttpOutcome::ReadFailed;
+        if (!InternetReadFile(request.get(), buffer.data(), kReadSize, &read)) return HttpOutcome::ReadFailed;
         if (read == 0) return HttpOutcome::Complete;
-        if (!sink.OnData(buffer, read)) return HttpOutcome::Abandoned;
+        if (!sink.OnData(buffer.data(), read)) return HttpOutcome::Abandoned;
     }
     return HttpOutcome::Stopped;
 }

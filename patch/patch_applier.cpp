@@ -18,20 +18,11 @@ namespace {
 const char* const kLogSource = "PatchApplier";
 const char* const kDeltaFileName = "diffTempFile.dz";
 
-// The path below root (with the platform's separators), or empty when
-// path does not lie below root.
-std::string RelativeBelow(const std::string& path, const std::string& root) {
-    const std::string prefix = PathJoin(root, "");
-    const std::string full = PathJoin(path, "");
-    if (full.size() <= prefix.size() || full.compare(0, prefix.size(), prefix) != 0) return "";
-    return full.substr(prefix.size(), full.size() - prefix.size() - 1);
-}
-
 // Every folder from root down to the one that holds path, root included,
 // when path lies below root: the folders whose entries may change when
 // path is created with its missing parents.
 std::vector<std::string> FoldersFromRootTo(const std::string& path, const std::string& root) {
-    const std::string relative = RelativeBelow(path, root);
+    const std::string relative = PathBelow(path, root);
     if (relative.empty()) return {};
     std::string top = PathJoin(root, "");
     top.pop_back();
@@ -103,11 +94,11 @@ void PatchApplier::RequireSafe(const std::string& path, const std::vector<std::s
 void PatchApplier::CheckItemPaths() {
     std::vector<std::string> ownNames = protectedNames;
     for (const std::string& folder : {patchFolder, patchedFilesFolder}) {
-        const std::string relative = RelativeBelow(folder, installationFolder);
+        const std::string relative = PathBelow(folder, installationFolder);
         if (!relative.empty()) ownNames.push_back(relative);
     }
     for (const std::string& record : {progressFile->GetRecordPath(), progressFile->GetAlternativeRecordPath()}) {
-        const std::string relative = RelativeBelow(record, installationFolder);
+        const std::string relative = PathBelow(record, installationFolder);
         if (!relative.empty()) ownNames.push_back(relative);
     }
     patchInfo->ResetIterators();
@@ -200,7 +191,7 @@ void PatchApplier::MakePreparedFilesDurable() {
     CollectFiles(patchedFilesFolder, prepared);
     std::set<std::string> folders;
     const std::string root =
-        RelativeBelow(patchedFilesFolder, installationFolder).empty() ? patchedFilesFolder : installationFolder;
+        PathBelow(patchedFilesFolder, installationFolder).empty() ? patchedFilesFolder : installationFolder;
     for (const std::string& file : prepared) {
         for (const std::string& folder : FoldersFromRootTo(file, root)) folders.insert(folder);
     }

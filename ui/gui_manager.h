@@ -51,6 +51,8 @@ public:
     // patched, each 0..1000. Safe from any thread.
     void SetOverallProgress(int32_t permille);
     void SetFileProgress(int32_t permille);
+    // The bar itself, 0..1000, for the version check's own animation.
+    void SetProgressTotal(int32_t permille);
     void SetStatusText(const std::wstring& text);
 
     // Returns once the player has answered a confirmation the window put

@@ -170,6 +170,11 @@ void GuiManager::SetFileProgress(int32_t permille) {
     if (ui->running && progress.SetFile(permille)) ui->Draw(*this, false);
 }
 
+void GuiManager::SetProgressTotal(int32_t permille) {
+    std::lock_guard<std::mutex> lock(ui->mutex);
+    if (ui->running && progress.SetTotal(permille)) ui->Draw(*this, false);
+}
+
 void GuiManager::SetStatusText(const std::wstring& text) {
     {
         std::lock_guard<std::mutex> lock(statusMutex);

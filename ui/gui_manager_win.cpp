@@ -372,6 +372,10 @@ void GuiManager::SetFileProgress(int32_t permille) {
     }
 }
 
+void GuiManager::SetProgressTotal(int32_t permille) {
+    if (progress.SetTotal(permille)) ui->Invalidate(MainWindowLayout::kProgressRect);
+}
+
 void GuiManager::SetStatusText(const std::wstring& text) {
     {
         std::lock_guard<std::mutex> lock(statusMutex);

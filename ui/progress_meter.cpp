@@ -12,6 +12,11 @@ bool ProgressMeter::SetOverall(int32_t permille) { return Update(overallComponen
 
 bool ProgressMeter::SetFile(int32_t permille) { return Update(fileComponent, permille, kFileWeight); }
 
+bool ProgressMeter::SetTotal(int32_t permille) {
+    const int32_t value = std::clamp(permille, 0, 1000);
+    return total.exchange(value) != value;
+}
+
 bool ProgressMeter::Update(int32_t& component, int32_t permille, double weight) {
     const auto weighted = static_cast<int32_t>(std::floor(permille * weight));
     if (weighted == component) return false;

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <atomic>
 #include <cstdint>
 
 // The progress bar's value (0..1000) from two reports: the overall
@@ -11,13 +12,19 @@ public:
     // redrawn; a report that changes nothing after weighting is dropped.
     bool SetOverall(int32_t permille);
     bool SetFile(int32_t permille);
+    // Sets the bar itself, past the two reports: the version check fills
+    // it on its own while the latest-version file arrives. True when it
+    // changed.
+    bool SetTotal(int32_t permille);
 
     int32_t Total() const { return total; }
 
 private:
     bool Update(int32_t& component, int32_t permille, double weight);
 
-    int32_t total = 0;
+    // Written by the version check on the main thread, read by the
+    // painting thread.
+    std::atomic<int32_t> total{0};
     int32_t overallComponent = 0;
     int32_t fileComponent = 0;
 };

@@ -2,7 +2,7 @@
 
 #include <utility>
 
-#include "app/command_line.h"
+#include "base/command_line.h"
 #include "app/updater_arguments.h"
 
 namespace {

@@ -1,4 +1,4 @@
-#include "app/command_line.h"
+#include "base/command_line.h"
 
 namespace {
 bool IsBlank(char c) { return c == '\t' || c == '\n' || c == '\r' || c == ' '; }
