@@ -1,5 +1,7 @@
 #include "state/configuration.h"
 
+#include "net/location.h"
+
 void Configuration::Clear() {
     latestVersionUrl.clear();
     patchUrl.clear();
@@ -16,10 +18,10 @@ void Configuration::Clear() {
     supportedOsNames.clear();
 }
 
-void Configuration::SetDefaults() {
-    latestVersionUrl = "version.txt";
-    patchUrl = "";
-    completeInstallUrl = "";
+void Configuration::SetDefaults(const std::string& updateLocation) {
+    latestVersionUrl = updateLocation.empty() ? "version.txt" : JoinLocation(updateLocation, "version.txt");
+    patchUrl = updateLocation;
+    completeInstallUrl = updateLocation;
     patchInstallPath = "tempPatch";
     patchedFilesPath = "patched";
     patchInfoFilename = "patchinfo.xml";

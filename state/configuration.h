@@ -11,7 +11,11 @@ public:
     virtual ~Configuration() = default;
 
     void Clear();
-    void SetDefaults();
+    // The built-in values. updateLocation, when not empty, is where the
+    // publisher serves the latest-version file, the patches and the builds
+    // (an http:// address, say); empty, they are found by their names
+    // beside the program.
+    void SetDefaults(const std::string& updateLocation = "");
 
     std::string GetLatestVersionUrl() const { return latestVersionUrl; }
     std::string GetPatchUrl() const { return patchUrl; }

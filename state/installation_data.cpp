@@ -7,6 +7,8 @@
 #include "base/paths.h"
 #include "base/xml_file.h"
 
+const char* const kInstallationDataFileName = "InstallationData.xml";
+
 namespace {
 
 const char kReadFailure[] = "Failed to read InstallationData file.";
@@ -32,7 +34,7 @@ void ReadHashes(const std::string& text, std::map<std::string, std::string>& has
 
 void InstallationData::SetDirectory(const std::string& folder) {
     directory = folder;
-    filePath = PathJoin(directory, "InstallationData.xml");
+    filePath = PathJoin(directory, kInstallationDataFileName);
 }
 
 void InstallationData::Load(const std::string& folder) {

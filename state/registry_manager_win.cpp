@@ -20,6 +20,12 @@ HKEY RootKey(RegistryHive hive) {
     return nullptr;
 }
 
+// The game's installer and the earlier updaters were 32-bit programs: on a
+// 64-bit Windows their HKEY_LOCAL_MACHINE\SOFTWARE keys live in the 32-bit
+// view, which a 64-bit process sees only when it asks for it (the flag
+// changes nothing on a 32-bit Windows).
+constexpr REGSAM kView = KEY_WOW64_32KEY;
+
 // An open key, closed on every way out.
 class OpenKey {
 public:
@@ -40,7 +46,7 @@ bool QueryValue(RegistryHive hive, const std::string& keyPath, const std::string
     const HKEY root = RootKey(hive);
     if (root == nullptr) return false;
     OpenKey opened;
-    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_READ, &opened.key) != ERROR_SUCCESS) return false;
+    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_READ | kView, &opened.key) != ERROR_SUCCESS) return false;
     DWORD size = 0;
     if (RegQueryValueExA(opened.key, valueName.c_str(), nullptr, nullptr, nullptr, &size) != ERROR_SUCCESS ||
         size == 0) {
@@ -59,8 +65,8 @@ bool CreateKey(RegistryHive hive, const std::string& keyPath) {
     if (root == nullptr) return false;
     OpenKey created;
     DWORD disposition = 0;
-    const LONG result = RegCreateKeyExA(root, keyPath.c_str(), 0, nullptr, REG_OPTION_NON_VOLATILE, KEY_WRITE, nullptr,
-                                        &created.key, &disposition);
+    const LONG result = RegCreateKeyExA(root, keyPath.c_str(), 0, nullptr, REG_OPTION_NON_VOLATILE, KEY_WRITE | kView,
+                                        nullptr, &created.key, &disposition);
     return result == ERROR_SUCCESS && (disposition == REG_CREATED_NEW_KEY || disposition == REG_OPENED_EXISTING_KEY);
 }
 
@@ -69,7 +75,7 @@ bool SetStringValue(RegistryHive hive, const std::string& keyPath, const std::st
     const HKEY root = RootKey(hive);
     if (root == nullptr) return false;
     OpenKey opened;
-    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_WRITE, &opened.key) != ERROR_SUCCESS) return false;
+    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_WRITE | kView, &opened.key) != ERROR_SUCCESS) return false;
     const DWORD size = static_cast<DWORD>(text.size() + 1);
     return RegSetValueExA(opened.key, valueName.c_str(), 0, REG_SZ, reinterpret_cast<const BYTE*>(text.c_str()),
                           size) == ERROR_SUCCESS;

@@ -8,6 +8,8 @@
 #include "base/paths.h"
 #include "patch/patch_info_file.h"
 
+const char* const kUninstallRecordName = "Uninstall.xml";
+
 namespace {
 
 // Registry key paths are backslash-separated on every platform.
@@ -102,8 +104,17 @@ bool Uninstaller::Save() const {
                                registryGroups.Items(), hive, registryPath);
 }
 
-void Uninstaller::Remove() {
+void Uninstaller::Remove(const std::string& installDir) {
+    // The record is a file on disk anyone may edit: a name that leaves the
+    // installation, names the folder itself or could match more than one
+    // thing is skipped, never deleted.
+    const auto inside = [&installDir](const std::string& path) {
+        if (IsSafeItemPath(PathBelow(path, installDir))) return true;
+        LOG(Error) << "Not removing a path outside the installation: " << path;
+        return false;
+    };
     for (const std::string& file : files.Items()) {
+        if (!inside(file)) continue;
         if (!RemoveFile(file)) {
             LOG(Trace) << "Could not delete file: " << file;
             undeletableFiles.push_back(file);
@@ -113,6 +124,7 @@ void Uninstaller::Remove() {
     std::stable_sort(ordered.begin(), ordered.end(),
                      [](const std::string& a, const std::string& b) { return a.size() > b.size(); });
     for (const std::string& directory : ordered) {
+        if (!inside(directory)) continue;
         if (!DeleteDirectory(directory, false)) {
             LOG(Trace) << "Could not remove directory: " << directory;
             unremovableDirectories.push_back(directory);

@@ -10,6 +10,9 @@
 // patches put into the installation and no later patch took away - files,
 // directories, registry keys and groups - plus the hive and key of the
 // game's settings. Written in the patch description's schema.
+// "Uninstall.xml", the record's name in the installation folder.
+extern const char* const kUninstallRecordName;
+
 class Uninstaller {
 public:
     // Reading form: the record at recordPath, names as stored. Throws
@@ -40,9 +43,10 @@ public:
     // known; a failed write is logged and returns false.
     bool Save() const;
     // Deletes the listed files, then removes the listed directories that
-    // are empty by then, deepest first. What cannot go is remembered and
-    // skipped. Registry entries are left alone.
-    void Remove();
+    // are empty by then, deepest first. Only what lies inside installDir is
+    // touched; what cannot go is remembered and skipped. Registry entries
+    // are left alone.
+    void Remove(const std::string& installDir);
 
     const std::vector<std::string>& GetFiles() const { return files.Items(); }
     const std::vector<std::string>& GetDirectories() const { return directories.Items(); }

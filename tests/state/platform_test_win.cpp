@@ -14,6 +14,7 @@ namespace {
 // Run at the start too, in case an earlier run was cut short.
 void Clear(const RegistrySandbox& sandbox) {
     for (const HKEY hive : {HKEY_LOCAL_MACHINE, HKEY_CURRENT_USER}) SHDeleteKeyA(hive, "SOFTWARE\\IronvaleTests");
+    SHDeleteKeyA(HKEY_LOCAL_MACHINE, "SOFTWARE\\Wow6432Node\\IronvaleTests");
     SHDeleteKeyA(HKEY_USERS, sandbox.userSid.c_str());
 }
 
@@ -35,6 +36,19 @@ TEST(RegistryRegExe, ReadsWhatTheManagerWroteAndTheOtherWayRound) {
     EXPECT_NE(output.find("Install Dir    REG_SZ    C:\\Games\\Iron vale"), std::string::npos) << output;
     CommandOutput("reg.exe add \"HKCU\\" + sandbox.keyPath + "\" /v Language /t REG_SZ /d Polish /f");
     EXPECT_EQ(registry.GetLanguage(), "Polish");
+}
+
+// The game's 32-bit installer wrote its machine-wide key into the 32-bit
+// view; the updater must find it there and only there.
+TEST(RegistryRegExe, MachineWideKeysAreReadInThe32BitView) {
+    RegistrySandbox sandbox;
+    const std::string key = "\"HKLM\\" + sandbox.keyPath + "\"";
+    CommandOutput("reg.exe add " + key + " /v \"Install Dir\" /t REG_SZ /d C:\\Thirty /reg:32 /f");
+    CommandOutput("reg.exe add " + key + " /v Language /t REG_SZ /d German /reg:64 /f");
+    const RegistryManager registry(RegistryHive::LocalMachine, sandbox.keyPath);
+    EXPECT_EQ(registry.GetInstallDir(), "C:\\Thirty");
+    EXPECT_EQ(registry.GetLanguage(), "");
+    CommandOutput("reg.exe delete " + key + " /reg:64 /f");
 }
 
 }  // namespace

@@ -55,6 +55,8 @@ TEST_F(UninstallerTest, SavesTheRecordThenAContinuedOneRemovesFilesAndDirectorie
     WriteTextFile(folder / "data/x/a.bin", "a");
     WriteTextFile(folder / "saves/user.sav", "not recorded");
     const std::string recordPath = folder / "Uninstall.xml";
+    const std::string decoy = folder.Path() + "-decoy.txt";
+    WriteTextFile(decoy, "beside the game");
     EXPECT_EQ(Uninstaller("G", "Key", "U.xml", "", false, "", false).GetHive(), RegistryHive::CurrentUser);
     {
         // Per user, started by another user: that user's hive.
@@ -68,6 +70,10 @@ TEST_F(UninstallerTest, SavesTheRecordThenAContinuedOneRemovesFilesAndDirectorie
               "<RegistryGroupChanges><new Path=\"G\" /></RegistryGroupChanges>");
         record.AddFile(recordPath);
         record.AddRecordFile();  // listed once
+        // An edited record may name anything: only the installation's own
+        // files may go.
+        record.AddFile(decoy);
+        record.AddFile(folder / "data/../../" + GetFileName(decoy));
         ASSERT_TRUE(record.Save());
     }
     // Hive and registry path of a continued record come from the file.
@@ -78,7 +84,9 @@ TEST_F(UninstallerTest, SavesTheRecordThenAContinuedOneRemovesFilesAndDirectorie
     EXPECT_EQ(continued.GetRegistryGroups(), List{"S-1\\Software\\Ironvale\\G"});
     EXPECT_EQ(continued.GetHive(), RegistryHive::Users);
     EXPECT_EQ(continued.GetRegistryPath(), "S-1\\Software\\Ironvale");
-    continued.Remove();
+    continued.Remove(folder.Path());
+    EXPECT_EQ(ReadTextFile(decoy), "beside the game");
+    RemoveFile(decoy);
     EXPECT_FALSE(PathExists(folder / "data"));
     EXPECT_FALSE(PathExists(recordPath));
     EXPECT_TRUE(PathExists(folder / "saves/user.sav"));
