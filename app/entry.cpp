@@ -50,7 +50,7 @@ void ReportEscapedException(const Exception& error) {
 
 }  // namespace
 
-int32_t RunUpdaterProcess(const std::string& commandLine) {
+int32_t RunUpdaterProcess(const std::string& commandLine, const std::string& updateLocation) {
     Localization::Initialize();
     try {
         Log::Open(kLogFileName);
@@ -90,7 +90,7 @@ int32_t RunUpdaterProcess(const std::string& commandLine) {
 
     int32_t exitCode = -1;
     {
-        auto updater = std::make_unique<Updater>();
+        auto updater = std::make_unique<Updater>(updateLocation);
         try {
             exitCode = updater->Run(*arguments);
         } catch (const Exception& error) {

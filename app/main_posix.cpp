@@ -1,12 +1,12 @@
 #include <string>
 #include <vector>
 
-#include "app/command_line.h"
+#include "base/command_line.h"
 #include "app/entry.h"
 
 int main(int argc, char** argv) {
     // The Windows program receives one command-line text; rebuild it from
     // the words the shell already split.
     std::vector<std::string> words(argv + 1, argv + argc);
-    return RunUpdaterProcess(JoinCommandLine(words));
+    return RunUpdaterProcess(JoinCommandLine(words), kBuiltInUpdateLocation);
 }

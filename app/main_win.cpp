@@ -3,5 +3,5 @@
 #include "app/entry.h"
 
 int WINAPI WinMain(HINSTANCE, HINSTANCE, LPSTR commandLine, int) {
-    return RunUpdaterProcess(commandLine != nullptr ? commandLine : "");
+    return RunUpdaterProcess(commandLine != nullptr ? commandLine : "", kBuiltInUpdateLocation);
 }

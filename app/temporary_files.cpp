@@ -1,0 +1,21 @@
+#include "app/temporary_files.h"
+
+#include "base/file_operations.h"
+#include "base/paths.h"
+#include "base/string_helpers.h"
+
+void CleanTemporaryFiles(const std::string& patchDir, const std::string& patchedDir) {
+    DeleteDirectory(patchedDir, true);
+    if (patchDir.empty()) return;
+    // The names the system wildcards "diff*.*", "patch*.*" and "tmp_*.*"
+    // match: the dot is optional there, and Windows ignores letter case.
+    for (const std::string& name : ListFileNames(patchDir)) {
+        for (const char* prefix : {"diff", "patch", "tmp_"}) {
+            if (StartsWithIgnoringCase(name, prefix)) {
+                RemoveFile(PathJoin(patchDir, name));
+                break;
+            }
+        }
+    }
+    DeleteDirectory(patchDir, false);
+}
