@@ -8,15 +8,21 @@ work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
 export TMPDIR=$work/tmp IRONVALE_REGISTRY_ROOT=$work/registry
 mkdir -p "$TMPDIR"
+# A machine with DirectX but no game installed: the language question is
+# answered with Enter (the current one), the rest ends at the missing game.
+mkdir -p "$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Microsoft/DirectX"
+printf 'Version\t4.09.00.0904\n' >"$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Microsoft/DirectX/.values"
+echo >"$work/answers"
 
 expect_exit() {  # CODE ARGS...; the program never inherits the guard (descriptor 9)
   local expected=$1 code=0
   shift
-  "$program" "$@" </dev/null >"$work/out" 2>&1 9>&- || code=$?
+  "$program" "$@" <"$work/answers" >"$work/out" 2>&1 9>&- || code=$?
   [ "$code" -eq "$expected" ] || fail "'$*' ended with $code, expected $expected: $(cat "$work/out")"
 }
 
 expect_exit 1 -serverDeltaTime -3.7 -hostname "test host"
+grep -q "The game is not installed" "$work/out" || fail "no not-installed message: $(cat "$work/out")"
 # The program sees one command line rebuilt from its words.
 check_opening_lines "$TMPDIR/IronvaleUpdater.log" '-serverDeltaTime -3.7 -hostname "test host"'
 

@@ -4,9 +4,16 @@
 # language stored in the game's registry key: the current user's, or that
 # of the user named by -SID (as an elevated copy reads it).
 source "$(dirname "$0")/wine_session.sh"
+# No game installed and no language chosen: the language dialog (OK keeps
+# the current one), then the box that says the game is not installed.
 code=0
-"$run" "$program" -serverDeltaTime -3.7 -hostname "test host" || code=$?
+"$run" "$program" -serverDeltaTime -3.7 -hostname "test host" &
+first=$!
+"$run" "$answer_exe" "Ironvale - Updater" 1 30000 >/dev/null || fail "no language dialog"
+text=$("$run" "$answer_exe" "Ironvale - Updater" 1 30000 | tr -d '\r') || fail "no box after the language dialog"
+wait "$first" || code=$?
 [ "$code" -eq 1 ] || fail "exit code $code, expected 1"
+grep -q "The game is not installed" <<<"$text" || fail "box text: $text"
 check_opening_lines "$log" '-serverDeltaTime -3.7 -hostname "test host"'
 second_start "Ironvale - Updater" -hostname "test host"
 grep -q "Another copy of the updater is already running." <<<"$text" || fail "box text: $text"

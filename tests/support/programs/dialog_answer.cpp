@@ -3,7 +3,7 @@
 // Waits for a dialog box (class #32770) with the given caption, prints its
 // message text (UTF-8), then "[button] " and the label of the button with
 // the given control id, and presses that button. Exit 0 when pressed, 2
-// when no dialog appeared.
+// when no dialog appeared. Returns once the dialog has closed.
 #include <windows.h>
 
 #include <fcntl.h>
@@ -74,5 +74,8 @@ int wmain(int argc, wchar_t** argv) {
     std::fwrite(labelOut.data(), 1, labelOut.size(), stdout);
     std::fflush(stdout);
     PostMessageW(dialog, WM_COMMAND, MAKEWPARAM(buttonId, BN_CLICKED), reinterpret_cast<LPARAM>(button));
+    // Gone before we return, so that the next box a caller waits for is
+    // never this one again.
+    for (int waited = 0; waited < 5000 && IsWindow(dialog); waited += 20) Sleep(20);
     return 0;
 }

@@ -1,0 +1,316 @@
+// Whole runs of the updater, as a process of its own, against patches and
+// builds made by the publisher's tool and served over HTTP on 127.0.0.1,
+// with the player's answers on standard input.
+#include <gtest/gtest.h>
+#include <signal.h>
+#include <sys/stat.h>
+
+#include <chrono>
+#include <cstdlib>
+#include <random>
+#include <thread>
+
+#include "base/file_operations.h"
+#include "base/paths.h"
+#include "patch/patch_applier.h"
+#include "patch/patch_info_file.h"
+#include "patch/patch_progress_file.h"
+#include "patch/patch_stages.h"
+#include "state/installation_data.h"
+#include "state/registry_manager.h"
+#include "tests/support/batch_fixture.h"
+#include "tests/support/child_process.h"
+#include "tests/support/console_run.h"
+#include "tests/support/http_test_server.h"
+#include "tools/publisher/patch_builder.h"
+
+namespace {
+
+// The game: it notes how it was started.
+const char kGame[] = "#!/bin/sh\necho \"$@\" > \"$TMPDIR/started.txt\"\n";
+
+// Archives in place, and a power cut after the first action of stage two.
+class Interruption final : public IArchiveSource, public IStatusView {
+public:
+    ArchiveState WaitForArchive(const std::string&) override { return ArchiveState::Arrived; }
+    void OnApplyProgress(const std::string&, int32_t) override {
+        if (cutAfterReports > 0 && --cutAfterReports == 0) throw std::runtime_error("interrupted");
+    }
+    void OnFileProgress(const std::string&, uint32_t, uint32_t) override {}
+    void OnFileDone(const std::string&) override {}
+    int cutAfterReports = 0;
+};
+
+Tree Version(int number) {
+    Tree tree = RandomTree(1);
+    for (int next = 2; next <= number; ++next) tree = NextVersion(tree, static_cast<unsigned>(next));
+    return tree.File("IronvaleGame.exe", kGame);
+}
+
+class UpdateRun : public ::testing::Test {
+protected:
+    // The runs see the test's own registry, temporary folder and server.
+    void SetUp() override {
+        const char* tmp = std::getenv("TMPDIR");
+        savedTmp = tmp != nullptr ? tmp : "";
+        setenv("IRONVALE_REGISTRY_ROOT", (temp / "registry").c_str(), 1);
+        setenv("TMPDIR", (temp / "tmp").c_str(), 1);
+        setenv("IRONVALE_TEST_UPDATE_LOCATION", server.Url("/").c_str(), 1);
+        MakeDirectories(temp / "tmp");
+        MakeDirectories(temp / "server");
+        server.ServeFolder("/", temp / "server", {});
+        const RegistryManager game(RegistryHive::LocalMachine, "SOFTWARE\\Halvard\\Ironvale");
+        game.SetInstallDir(install);
+        game.SetLanguage("English");
+        RegistryManager(RegistryHive::LocalMachine, "SOFTWARE\\Microsoft\\DirectX")
+            .WriteString("Version", "4.09.00.0904");
+        Install(Version(1), "1");
+    }
+
+    void TearDown() override {
+        if (savedTmp.empty()) {
+            unsetenv("TMPDIR");
+        } else {
+            setenv("TMPDIR", savedTmp.c_str(), 1);
+        }
+    }
+
+    void Install(const Tree& tree, const std::string& version) {
+        DeleteDirectory(install, true);
+        WriteTree(install, tree);
+        chmod(PathJoin(install, "IronvaleGame.exe").c_str(), 0755);
+        SetVersion(version);
+    }
+
+    void SetVersion(const std::string& version) {
+        InstallationData data;
+        data.SetDirectory(install);
+        data.currentVersion = version;
+        data.SetPatcherVersion(3.0f);
+        data.Save();
+    }
+
+    std::string InstalledVersion() {
+        InstallationData data;
+        data.Load(install);
+        return data.currentVersion;
+    }
+
+    // The patch from version from to version to and the complete build of
+    // to, with version.txt naming to.
+    std::string Publish(int from, int to) {
+        DeleteDirectory(temp / "old", true);
+        DeleteDirectory(temp / "new", true);
+        WriteTree(temp / "old", Version(from));
+        WriteTree(temp / "new", Version(to));
+        BuildOptions options;
+        options.fromDir = temp / "old";
+        options.toDir = temp / "new";
+        options.version = std::to_string(to);
+        options.outDir = temp / "server";
+        options.maxArchiveSize = 4000;
+        const std::string patch = BuildPatch(options);
+        options.fromDir.clear();
+        BuildPatch(options);
+        WriteTextFile(temp / "server/version.txt", "  " + options.version + " and more words\n");
+        return patch;
+    }
+
+    ConsoleRun Run(const std::string& answers, const std::vector<std::string>& arguments = {}) {
+        return RunConsoleProgram(TestProgramPath("served_updater"), arguments, answers);
+    }
+
+    // The installation without the updater's records.
+    Tree Game() {
+        Tree tree = ReadTree(install);
+        for (const char* own : {"InstallationData.xml", "Uninstall.xml", "UpdateHistory.log"}) tree.files.erase(own);
+        return tree;
+    }
+
+    // The game runs on after the updater ended; it gets a moment to show.
+    bool GameStarted() {
+        for (int wait = 0; wait < 50 && !PathExists(temp / "tmp/started.txt"); ++wait) {
+            std::this_thread::sleep_for(std::chrono::milliseconds(20));
+        }
+        return PathExists(temp / "tmp/started.txt");
+    }
+
+    // Nothing of the batch is left: no work folder, no record.
+    void ExpectNoLeftovers() {
+        for (const char* own : {"tempPatch", "PPF.xml", "_PPF.xml"}) {
+            EXPECT_FALSE(PathExists(PathJoin(install, own))) << own;
+        }
+    }
+
+    std::string savedTmp;
+    TempFolder temp;
+    HttpTestServer server;
+    std::string install = temp / "Ironvale";
+};
+
+TEST_F(UpdateRun, PatchesToTheLatestVersionAndStartsTheGame) {
+    Publish(1, 2);
+    const ConsoleRun run = Run("y\ny\n");
+    EXPECT_EQ(run.exitCode, 1) << run.output;
+    EXPECT_EQ(Game(), Version(2));
+    EXPECT_EQ(InstalledVersion(), "2");
+    ExpectNoLeftovers();
+    const std::string history = ReadTextFile(PathJoin(install, "UpdateHistory.log"));
+    EXPECT_EQ(history.substr(history.find(' ', history.find(' ') + 1)), " " + server.Url("/patch_515195_2\r\n"));
+    // The uninstall record, started by this run, lists what the patch added.
+    const std::string record = ReadTextFile(PathJoin(install, "Uninstall.xml"));
+    for (const auto& file : Version(2).files) {
+        if (Version(1).files.count(file.first) == 0) {
+            EXPECT_NE(record.find(GetFileName(file.first)), std::string::npos) << file.first;
+        }
+    }
+    EXPECT_EQ(ReadTextFile(temp / "tmp/started.txt"), "+webSiteHostName updates.ironvale-game.com\n");
+    // The patch's own addresses carry the signature; the version file's does not.
+    for (const std::string& request : server.Requests()) {
+        const bool signedRequest = request.find("&h=") != std::string::npos || request.find("?e=") != std::string::npos;
+        EXPECT_EQ(signedRequest, request.find("version.txt") == std::string::npos) << request;
+    }
+}
+
+// The record of an interrupted batch is finished without a question, then
+// the run starts over and offers the newer version.
+TEST_F(UpdateRun, ResumesAnInterruptedPatchThenPatchesOnToTheNewest) {
+    for (const char* recordName : {"PPF.xml", "_PPF.xml"}) {
+        SCOPED_TRACE(recordName);
+        Install(Version(1), "1");
+        const std::string patch = Publish(1, 2);
+        const std::string work = PathJoin(install, "tempPatch");
+        WriteTree(work, ReadTree(patch));
+        PatchInfoFile info;
+        info.Load(PathJoin(work, "patchinfo.xml"));
+        PatchProgressFile progress;
+        progress.SetDirectory(install);
+        PatchApplier applier;
+        PatchStages stages(info, progress, applier);
+        const PatchBatch batch{install, work, PathJoin(work, "patched"), server.Url("/patch_515195_2"), "2", {}};
+        Interruption interruption;
+        stages.Prepare(batch, &interruption, &interruption);
+        interruption.cutAfterReports = 2;
+        EXPECT_THROW(stages.Apply(batch, &interruption,
+                                  [this](const std::string& version) {
+                                      SetVersion(version);
+                                      return true;
+                                  }),
+                     std::runtime_error);
+        if (std::string(recordName) != "PPF.xml") {
+            ASSERT_TRUE(RenameFile(PathJoin(install, "PPF.xml"), PathJoin(install, recordName)));
+        }
+        Publish(2, 3);
+        const ConsoleRun run = Run("y\nn\n", {"-latestVersion", "3"});
+        EXPECT_EQ(run.exitCode, 1) << run.output;
+        EXPECT_EQ(Game(), Version(3));
+        EXPECT_EQ(InstalledVersion(), "3");
+        ExpectNoLeftovers();
+        EXPECT_FALSE(GameStarted());
+    }
+}
+
+// An installation left in change without its record (here with a file
+// lost and one cut short) gets the complete build again.
+TEST_F(UpdateRun, AnInstallationInChangeWithoutItsRecordGetsTheCompleteBuild) {
+    Publish(1, 2);
+    Tree damaged = Version(2);
+    damaged.files.erase(damaged.files.begin());
+    damaged.files.rbegin()->second.resize(1);
+    Install(damaged, "-1");
+    const ConsoleRun run = Run("n\n", {"-latestVersion", "2"});
+    EXPECT_EQ(run.exitCode, 1) << run.output;
+    EXPECT_EQ(Game(), Version(2));
+    EXPECT_EQ(InstalledVersion(), "2");
+    ExpectNoLeftovers();
+}
+
+// What ends a run early leaves the installation as it was; the game is
+// started only when the player says so, or when there was nothing to do.
+TEST_F(UpdateRun, EndsWithoutChangesWhenUpToDateDeclinedMissingOrBroken) {
+    Publish(1, 2);
+    const Tree old = Version(1);
+    std::string changed;  // an installed file the patch rebuilds from a delta
+    for (const auto& file : Version(2).files) {
+        if (old.files.count(file.first) != 0 && old.files.at(file.first) != file.second) changed = file.first;
+    }
+    const struct {
+        const char* what;
+        std::vector<std::string> arguments;
+        std::string answers;
+        std::string installedVersion;
+        std::string shown;  // in the output
+        bool started;
+    } cases[] = {
+        {"up to date", {"-latestVersion", "2"}, "", "2", "", true},
+        {"declined", {"-latestVersion", "2"}, "n\n", "1", "Do you want to update the game now?", false},
+        // Versions are numbers: 9 is older than 10.
+        {"9 to 10", {"-latestVersion", "10"}, "n\n", "9", "Latest version: 10", false},
+        {"missing, play", {"-latestVersion", "5"}, "y\ny\n", "1", "play the installed version instead", true},
+        {"missing, quit", {"-latestVersion", "5"}, "y\nn\n", "1", "play the installed version instead", false},
+        {"installed file changed", {"-latestVersion", "2"}, "y\n", "1", "Failed to apply delta file", false},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        Install(old, c.installedVersion);
+        if (std::string(c.what) == "installed file changed") WriteTextFile(PathJoin(install, changed), "modded");
+        RemoveFile(temp / "tmp/started.txt");
+        const ConsoleRun run = Run(c.answers, c.arguments);
+        EXPECT_EQ(run.exitCode, 1) << run.output;
+        EXPECT_NE(run.output.find(c.shown), std::string::npos) << run.output;
+        EXPECT_EQ(InstalledVersion(), c.installedVersion);
+        EXPECT_EQ(GameStarted(), c.started);
+        if (std::string(c.what) != "installed file changed") {
+            EXPECT_EQ(Game(), old);
+        }
+        DeleteDirectory(PathJoin(install, "tempPatch"), true);
+    }
+}
+
+TEST_F(UpdateRun, RefusesAPatchTheDiskCannotHoldBeforeDownloadingIt) {
+    const std::string patch = Publish(1, 2);
+    const std::string description = PathJoin(patch, "patchinfo.xml");
+    std::string text = ReadTextFile(description);
+    const size_t start = text.find("<SpaceRequirement>") + 18;
+    text.replace(start, text.find('<', start) - start, "9000000000000000000");
+    WriteTextFile(description, text);
+    const ConsoleRun run = Run("y\n", {"-latestVersion", "2"});
+    EXPECT_EQ(run.exitCode, 1) << run.output;
+    EXPECT_NE(run.output.find("9000000000000 MB of free space is required."), std::string::npos) << run.output;
+    EXPECT_EQ(Game(), Version(1));
+    for (const std::string& request : server.Requests()) EXPECT_EQ(request.find(".lzma"), std::string::npos);
+}
+
+// The updater killed at seeded moments of a whole run, then started again
+// until it reports success: the new version, complete, and nothing left.
+TEST_F(UpdateRun, KilledAtAnyMomentTheNextStartsFinishTheUpdate) {
+    Publish(1, 2);
+    std::mt19937 random(1206);
+    long long fullRun = 0;
+    for (int trial = 0; trial <= 24; ++trial) {
+        Install(Version(1), "1");
+        const auto start = std::chrono::steady_clock::now();
+        if (trial == 0) {
+            ASSERT_EQ(Run("y\nn\n", {"-latestVersion", "2"}).exitCode, 1);
+            fullRun =
+                std::chrono::duration_cast<std::chrono::microseconds>(std::chrono::steady_clock::now() - start).count();
+        } else {
+            WriteTextFile(temp / "answers", "y\nn\n");
+            ChildProcess child("/bin/sh", {"-c", "exec \"$0\" -latestVersion 2 < \"$1\" >/dev/null 2>&1",
+                                           TestProgramPath("served_updater"), temp / "answers"});
+            std::this_thread::sleep_for(std::chrono::microseconds(random() % fullRun));
+            child.Kill();
+            child.Wait();
+            // The next start (and the one after, should that one be needed).
+            for (int again = 0; again == 0 || (again < 3 && InstalledVersion() != "2"); ++again) {
+                Run("y\nn\n", {"-latestVersion", "2"});
+            }
+        }
+        SCOPED_TRACE("trial " + std::to_string(trial));
+        EXPECT_EQ(InstalledVersion(), "2");
+        EXPECT_EQ(Game(), Version(2));
+        ExpectNoLeftovers();
+    }
+}
+
+}  // namespace

@@ -1,0 +1,15 @@
+// The updater as tests run it against a server of their own: the same
+// program, with the location of its patches taken from the environment
+// (IRONVALE_TEST_UPDATE_LOCATION) instead of being built in.
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+#include "app/entry.h"
+#include "base/command_line.h"
+
+int main(int argc, char** argv) {
+    const char* location = std::getenv("IRONVALE_TEST_UPDATE_LOCATION");
+    return RunUpdaterProcess(JoinCommandLine(std::vector<std::string>(argv + 1, argv + argc)),
+                             location != nullptr ? location : "");
+}
