@@ -1,8 +1,8 @@
 #include <string>
 #include <vector>
 
-#include "base/command_line.h"
 #include "app/entry.h"
+#include "base/command_line.h"
 
 int main(int argc, char** argv) {
     // The Windows program receives one command-line text; rebuild it from

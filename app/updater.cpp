@@ -141,10 +141,10 @@ bool Updater::HandleUpdateFailure(const Exception& error) {
 }
 
 void Updater::StartGame() {
-    RunProcess(PathJoin(registry.GetInstallDir(), configuration.GetGameExecutable()),
-               GameParameters(configuration.GetGameParameters(), arguments.sessionId, arguments.dataCenters,
-                              webSiteHostName),
-               false);
+    RunProcess(
+        PathJoin(registry.GetInstallDir(), configuration.GetGameExecutable()),
+        GameParameters(configuration.GetGameParameters(), arguments.sessionId, arguments.dataCenters, webSiteHostName),
+        false);
 }
 
 void Updater::OnApplyProgress(const std::string& fileName, int32_t permille) {

@@ -75,9 +75,9 @@ bool Updater::EnsureRights(bool internallyElevated, int32_t& exitCode, bool need
             return false;
         }
         case RightsOutcome::NoRightsForRemoval:
-            ShowCheckBox(Localize("INSTALLER_POWERUSER_NOT_ENOUGH") + L"\n" +
-                             Localize("INSTALLER_LOG_ON_AS_ADMINISTRATOR"),
-                         MessageIcon::Warning);
+            ShowCheckBox(
+                Localize("INSTALLER_POWERUSER_NOT_ENOUGH") + L"\n" + Localize("INSTALLER_LOG_ON_AS_ADMINISTRATOR"),
+                MessageIcon::Warning);
             return false;
         case RightsOutcome::NoRights:
             ShowCheckBox(IsVistaOrWindows7(facts.OsName())

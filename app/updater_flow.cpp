@@ -73,12 +73,11 @@ void Updater::RunUpdate() {
                     patchUrl = JoinLocation(configuration.GetPatchUrl(), PatchName(kPatchBaseVersion, latestVersion));
                     gui.WaitWhileConfirming();
                     if (gui.IsCancelled()) throw Exception("User declined update.", ErrorCode::UserCancelled);
-                    const std::wstring text = Localize("INSTALLER_PATCH_CURRENT_VERSION") + L" " +
-                                              WidenFromCodePage(localVersion) + L"\n" +
-                                              Localize("INSTALLER_PATCH_LATEST_VERSION") + L" " +
-                                              WidenFromCodePage(latestVersion) + L"\n\n" +
-                                              Localize("INSTALLER_PATCH_NEED_LATEST_VERSION") + L"\n" +
-                                              Localize("INSTALLER_PATCH_CONFIRM_UPADATE") + L"\n";
+                    const std::wstring text =
+                        Localize("INSTALLER_PATCH_CURRENT_VERSION") + L" " + WidenFromCodePage(localVersion) + L"\n" +
+                        Localize("INSTALLER_PATCH_LATEST_VERSION") + L" " + WidenFromCodePage(latestVersion) + L"\n\n" +
+                        Localize("INSTALLER_PATCH_NEED_LATEST_VERSION") + L"\n" +
+                        Localize("INSTALLER_PATCH_CONFIRM_UPADATE") + L"\n";
                     if (!gui.AskYesNo(text)) throw Exception("User declined update.", ErrorCode::UserCancelled);
                     int32_t exitCode = -1;
                     if (!EnsureRights(false, exitCode, true)) {
@@ -131,7 +130,8 @@ void Updater::RunUpdate() {
             StageOne(installed);
             // A cancel confirmed while stage one finished must not let
             // stage two begin.
-            if (cancelled) throw Exception("User cancelled before the installation was changed.", ErrorCode::UserCancelled);
+            if (cancelled)
+                throw Exception("User cancelled before the installation was changed.", ErrorCode::UserCancelled);
             StageTwo(installed);
         }
         AppendUpdateHistory(installDir, patchUrl);

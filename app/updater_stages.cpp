@@ -66,8 +66,8 @@ std::list<DownloadEntry> Updater::BuildDownloadList() {
 }
 
 PatchBatch Updater::CurrentBatch() const {
-    return PatchBatch{installDir, patchDir, patchedDir, patchUrl, latestVersion,
-                      {kInstallationDataFileName, kUninstallRecordName}};
+    return PatchBatch{installDir, patchDir,      patchedDir,
+                      patchUrl,   latestVersion, {kInstallationDataFileName, kUninstallRecordName}};
 }
 
 // The record lists what every patch added; a missing one starts afresh

@@ -68,7 +68,8 @@ void Updater::DownloadPatchInfo(const std::string& location, const std::string& 
     downloader.SetStatusView(nullptr);
     downloader.Download(JoinLocation(location, configuration.GetPatchInfoFilename()), patchInfoPath, true);
     if (!downloader.WaitForWorker() || downloader.Entries().front().status != DownloadStatus::Done) {
-        if (cancelled) throw Exception("User cancelled while fetching the patch description.", ErrorCode::UserCancelled);
+        if (cancelled)
+            throw Exception("User cancelled while fetching the patch description.", ErrorCode::UserCancelled);
         throw Exception("Failed to download patch info file.", ErrorCode::PatchNotFound);
     }
     patchInfo.Load(patchInfoPath);

@@ -21,8 +21,8 @@ ProgramCall ElevatedCall(const std::string& parameters, const std::string& progr
     return call;
 }
 
-std::string GameParameters(const std::string& configured, const std::string& sessionId,
-                           const std::string& dataCenters, const std::string& hostName) {
+std::string GameParameters(const std::string& configured, const std::string& sessionId, const std::string& dataCenters,
+                           const std::string& hostName) {
     std::string parameters = configured;
     if (!sessionId.empty()) parameters += " +sessionId " + sessionId;
     if (!dataCenters.empty()) parameters += " +dataCenters " + dataCenters;

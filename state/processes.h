@@ -33,8 +33,8 @@ ProgramCall ElevatedCall(const std::string& parameters, const std::string& progr
 // The game's command line: the configured parameters, then " +sessionId ",
 // " +dataCenters " and " +webSiteHostName " each with its value, for each
 // value that is not empty.
-std::string GameParameters(const std::string& configured, const std::string& sessionId,
-                           const std::string& dataCenters, const std::string& hostName);
+std::string GameParameters(const std::string& configured, const std::string& sessionId, const std::string& dataCenters,
+                           const std::string& hostName);
 
 // The edition sold through Steam has "GDFBinary.dll" in its folder; this
 // updater must not patch it.

@@ -2,8 +2,8 @@
 
 #include <utility>
 
-#include "base/command_line.h"
 #include "app/updater_arguments.h"
+#include "base/command_line.h"
 
 namespace {
 

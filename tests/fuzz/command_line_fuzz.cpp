@@ -1,8 +1,8 @@
 // The command line is untrusted: any text must parse without a crash, and
 // joining and splitting again must give the words back whenever no word
 // holds a double quote (which a joined line cannot carry).
-#include "base/command_line.h"
 #include "app/updater_arguments.h"
+#include "base/command_line.h"
 #include "tests/fuzz/fuzz_files.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
