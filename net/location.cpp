@@ -9,7 +9,11 @@ std::string JoinLocation(const std::string& base, const std::string& tail) {
     // address; the path behind it takes the platform's separator.
     if (StartsWithIgnoringCase(base, "file://")) return base.substr(0, 7) + PathJoin(base.substr(7), tail);
     if (IsUncLocation(base)) return PathJoin(base, tail);
-    return PathJoin(base, tail, '/');
+    // An empty base (the built-in locations) leaves the tail relative to
+    // the program's folder, not rooted at "/", which POSIX would take for
+    // the root of the file system.
+    const std::string joined = PathJoin(base, tail, '/');
+    return base.empty() ? joined.substr(1) : joined;
 }
 
 LocationKind ClassifyLocation(const std::string& url) {

@@ -6,7 +6,7 @@
 // kind uses: "/" for HTTP addresses and anything unrecognised, the path
 // separator for UNC paths and for the path of a file:// address (whose
 // "file://" stays as it is). Slashes of the other kind in either part become
-// that separator.
+// that separator. An empty base gives the tail alone.
 std::string JoinLocation(const std::string& base, const std::string& tail);
 
 // The host name of an address; empty when the address cannot be split or

@@ -190,6 +190,7 @@ TEST(Locations, JoinWithTheSeparatorOfTheirKindAndNameTheirHost) {
         {"HTTP://Host/base/", "\\sub\\f.bin", "HTTP://Host/base/sub/f.bin"},
         {"\\\\server\\share/patches", "a/b.bin", PathJoin("\\\\server\\share\\patches", "a\\b.bin")},
         {"patches\\1.0", "a.bin", "patches/1.0/a.bin"},
+        {"", "patch_515195_2", "patch_515195_2"},  // the built-in location: beside the program
         // A file:// base stays a file:// address.
         {"FILE://" + sep + "srv" + sep, "/x\\a.bin", "FILE://" + sep + "srv" + sep + "x" + sep + "a.bin"},
     };
