@@ -45,8 +45,14 @@ namespace RegistryPlatform {
 bool QueryValue(RegistryHive hive, const std::string& keyPath, const std::string& valueName, std::string& data) {
     const HKEY root = RootKey(hive);
     if (root == nullptr) return false;
+    // A key only the system's own view has (a 64-bit-only system such as a
+    // Wine prefix without 32-bit support keeps DirectX's key there alone)
+    // is still read.
     OpenKey opened;
-    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_READ | kView, &opened.key) != ERROR_SUCCESS) return false;
+    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_READ | kView, &opened.key) != ERROR_SUCCESS &&
+        RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_READ, &opened.key) != ERROR_SUCCESS) {
+        return false;
+    }
     DWORD size = 0;
     if (RegQueryValueExA(opened.key, valueName.c_str(), nullptr, nullptr, nullptr, &size) != ERROR_SUCCESS ||
         size == 0) {
