@@ -20,9 +20,10 @@ log="$WINEPREFIX/drive_c/users/$(id -un)/Temp/IronvaleUpdater.log"
 [ -d "$(dirname "$log")" ] || log="$WINEPREFIX/drive_c/users/$(id -un)/AppData/Local/Temp/IronvaleUpdater.log"
 
 # The X server picks a free display number itself and says it once it is
-# ready: other tests on the machine run displays of their own.
+# ready: other tests on the machine run displays of their own. It must not
+# reset when its last client leaves: Wine's windows made later would fail.
 display_file=$(mktemp)
-Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp 3>"$display_file" >/dev/null 2>&1 &
+Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp -noreset 3>"$display_file" >/dev/null 2>&1 &
 xvfb=$!
 trap '! declare -F cleanup >/dev/null || cleanup; kill $xvfb 2>/dev/null || true; rm -f "$display_file"' EXIT
 for _ in $(seq 200); do [ -s "$display_file" ] && break; sleep 0.05; done
