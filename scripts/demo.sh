@@ -2,11 +2,12 @@
 # Builds what is missing, makes a sample game of version 1 and 2 with the
 # version file, the patch from 1 to 2 and the complete build of 2 (with the
 # publisher's ironvale-patch), prints the patch description and checks the
-# patch with the updater's own applier. Then runs the updater once with a
-# sample command line: the Windows program under Wine when Wine is
-# installed, the native build otherwise, and prints the log the run wrote.
-# Under Wine it also shows the updater's window with some progress on a
-# private X display and saves a screenshot of it in the build folder.
+# patch with the updater's own applier. Then updates an installation of
+# version 1 with the program itself: the Windows program under Wine (its
+# window on a virtual display, the questions answered by a helper, a
+# screenshot of the window) when Wine is installed, the native build with
+# answers on its input otherwise; prints the log of the run, the tree, the
+# new version and UpdateHistory.log.
 set -euo pipefail
 root=$(cd "$(dirname "$0")/.." && pwd)
 cd "$root"
@@ -49,31 +50,56 @@ mkdir -p "$demo/empty"
 "$tool" verify "$demo/server/patch_515195_2" "$demo/v1" "$demo/v2"
 "$tool" verify "$demo/server/build_2" "$demo/empty" "$demo/v2"
 
-sample=(-latestVersion 2 -hostname demo.ironvale.test -serverDeltaTime 5)
+# The real update: version 1 installed and registered, the program copied
+# beside the server's files (its built-in locations are relative to its own
+# folder), the questions answered: update Yes, start the game No.
+install=$demo/install
+cp -r "$demo/v1" "$install"
+printf '<?xml version="1.0" ?>\n<InstallationData>\n    <CurrentVersion>1</CurrentVersion>\n    <PatcherVersion>3</PatcherVersion>\n</InstallationData>\n' \
+  >"$install/InstallationData.xml"
 
 if [ -x /usr/lib/wine/wine64 ] && command -v x86_64-w64-mingw32-g++-posix >/dev/null; then
   echo "== building the Windows program"
   cmake --preset windows >/dev/null
-  cmake --build --preset windows --target IronvaleUpdater window_driver >/dev/null
-  export WINEPREFIX=$root/build/windows/wineprefix
-  under_wine=1
-  echo "== running IronvaleUpdater.exe ${sample[*]} under Wine"
-  set +e
-  scripts/wine-run.sh build/windows/IronvaleUpdater.exe "${sample[@]}"
-  code=$?
-  set -e
+  cmake --build --preset windows --target IronvaleUpdater dialog_answer >/dev/null
+  export WINEPREFIX=$root/build/windows/wineprefix WINEDEBUG=-all
+  run=scripts/wine-run.sh
+  cp build/windows/IronvaleUpdater.exe "$demo/server/"
+  key='HKLM\Software\Halvard\Ironvale'
+  "$run" reg add "$key" /v "Install Dir" /t REG_SZ /d "Z:${install//\//\\}\\" /reg:32 /f >/dev/null
+  "$run" reg add "$key" /v Language /t REG_SZ /d English /reg:32 /f >/dev/null
+  Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp -noreset 3>"$demo/display" >/dev/null 2>&1 &
+  xvfb=$!
+  trap 'kill $xvfb 2>/dev/null; "$run" reg delete "$key" /reg:32 /f >/dev/null 2>&1 || true' EXIT
+  for _ in $(seq 200); do [ -s "$demo/display" ] && break; sleep 0.05; done
+  export DISPLAY=:$(head -1 "$demo/display")
+  echo "== running IronvaleUpdater.exe under Wine (beside its patches, in $demo/server)"
+  "$run" "$demo/server/IronvaleUpdater.exe" -hostname demo.ironvale.test 2>/dev/null &
+  updater=$!
+  # The window is on screen while the version check runs (three seconds).
+  sleep 2
+  shot=$root/build/windows/window.png
+  import -display "$DISPLAY" -window root -crop 532x481+246+143 +repage "$shot"
+  answer=build/windows/tests/support/programs/dialog_answer.exe
+  echo "== the update question"; "$run" "$answer" "Ironvale - Updater" 6 60000 | tr -d '\r'
+  echo "== the last question"; "$run" "$answer" "Ironvale - Updater" 7 60000 | tr -d '\r'
+  code=0
+  wait "$updater" || code=$?
   log=$(find "$WINEPREFIX/drive_c/users" -name IronvaleUpdater.log | head -1)
 else
   echo "== building the native program"
   cmake --preset native >/dev/null
   cmake --build --preset native --target IronvaleUpdater >/dev/null
-  export TMPDIR=$root/build/native/demo-tmp
-  mkdir -p "$TMPDIR"
-  echo "== running IronvaleUpdater ${sample[*]}"
-  set +e
-  build/native/IronvaleUpdater "${sample[@]}" </dev/null
-  code=$?
-  set -e
+  cp build/native/IronvaleUpdater "$demo/server/"
+  export TMPDIR=$demo/tmp IRONVALE_REGISTRY_ROOT=$demo/registry
+  mkdir -p "$TMPDIR" "$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Halvard/Ironvale" \
+    "$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Microsoft/DirectX"
+  printf 'Install Dir\t%s\nLanguage\tEnglish\n' "$install" \
+    >"$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Halvard/Ironvale/.values"
+  printf 'Version\t4.09.00.0904\n' >"$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Microsoft/DirectX/.values"
+  echo "== running IronvaleUpdater (beside its patches, in $demo/server), answering y, then n"
+  code=0
+  printf 'y\nn\n' | "$demo/server/IronvaleUpdater" -hostname demo.ironvale.test || code=$?
   log=$TMPDIR/IronvaleUpdater.log
 fi
 echo "== exit code: $code"
@@ -81,25 +107,14 @@ echo "== the run's lines of $log"
 # The last run starts at the last separator line (one line before it is empty).
 start=$(grep -n -- '-\{103\}' "$log" | tail -1 | cut -d: -f1)
 tail -n +"$((start - 1))" "$log" | tr -d '\r'
-
-if [ -n "${under_wine:-}" ]; then
-  echo "== the updater's window under Wine, at 60 % of a run"
-  shot=$root/build/windows/window.png
-  Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp 3>"$demo/display" >/dev/null 2>&1 &
-  xvfb=$!
-  for _ in $(seq 200); do [ -s "$demo/display" ] && break; sleep 0.05; done
-  export DISPLAY=:$(head -1 "$demo/display")
-  coproc DRIVER { scripts/wine-run.sh build/windows/tests/window_driver.exe 2>/dev/null; }
-  for command in start "status File: data/levels/level2.map" "overall 600" "file 600" rect; do
-    echo "$command" >&"${DRIVER[1]}"
-    read -r -t 60 reply <&"${DRIVER[0]}"
-  done
-  read -r _ left top right bottom <<<"${reply%$'\r'}"
-  sleep 1  # the window repaints on its own thread
-  import -display "$DISPLAY" -window root -crop "$((right - left))x$((bottom - top))+$left+$top" +repage "$shot"
-  echo stop >&"${DRIVER[1]}"
-  exec {DRIVER[1]}>&-
-  wait "$DRIVER_PID" 2>/dev/null || true
-  kill "$xvfb"
-  echo "== screenshot: $shot"
+echo "== the installation now ($install)"
+(cd "$install" && find . -type f | sort)
+echo "== installed version: $(sed -n 's:.*<CurrentVersion>\(.*\)</CurrentVersion>.*:\1:p' "$install/InstallationData.xml")"
+echo "== UpdateHistory.log"
+tr -d '\r' <"$install/UpdateHistory.log"
+if "$tool" verify "$demo/server/build_2" "$demo/empty" "$demo/v2" >/dev/null && diff -r -q -x 'InstallationData.xml' \
+   -x 'Uninstall.xml' -x UpdateHistory.log "$install" "$demo/v2" >/dev/null; then
+  echo "== the installation equals version 2"
 fi
+[ -n "${shot:-}" ] && echo "== screenshot of the window: $shot"
+exit 0

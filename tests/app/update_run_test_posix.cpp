@@ -116,8 +116,9 @@ protected:
         return patch;
     }
 
-    ConsoleRun Run(const std::string& answers, const std::vector<std::string>& arguments = {}) {
-        return RunConsoleProgram(TestProgramPath("served_updater"), arguments, answers);
+    ConsoleRun Run(const std::string& answers, const std::vector<std::string>& arguments = {},
+                   const std::string& workingFolder = "") {
+        return RunConsoleProgram(TestProgramPath("served_updater"), arguments, answers, workingFolder);
     }
 
     // The installation without the updater's records.
@@ -311,6 +312,45 @@ TEST_F(UpdateRun, KilledAtAnyMomentTheNextStartsFinishTheUpdate) {
         EXPECT_EQ(Game(), Version(2));
         ExpectNoLeftovers();
     }
+}
+
+// The three modes the game's uninstaller calls touch the installation only:
+// never a file of the same name where the program was started, never a
+// recorded name outside the installation.
+TEST_F(UpdateRun, UninstallerModesStayInsideTheInstallationAndTheDocuments) {
+    WriteTree(temp / "cwd", TreeOf("corvid.dll=decoy"));
+    for (const bool present : {false, true}) {
+        if (present) WriteTextFile(PathJoin(install, "corvid.dll"), "component");
+        EXPECT_EQ(Run("", {"-kdl_gl_remove", "-silent", "-delete_corvid"}, temp / "cwd").exitCode, 1);
+        EXPECT_EQ(GameStarted(), present);
+        EXPECT_FALSE(PathExists(PathJoin(install, "corvid.dll")));
+        EXPECT_EQ(ReadTextFile(temp / "cwd/corvid.dll"), "decoy");
+    }
+    EXPECT_EQ(ReadTextFile(temp / "tmp/started.txt"), "-kdl_gl_remove -silent\n");
+
+    setenv("XDG_DOCUMENTS_DIR", (temp / "documents").c_str(), 1);
+    for (const bool yes : {false, true}) {
+        WriteTree(temp / "documents", TreeOf("Ironvale/saves/slot1.sav=progress|keep.txt=mine"));
+        EXPECT_EQ(Run(yes ? "y\n" : "n\n", {"-doRemoveSettings", "true"}).exitCode, 1);
+        EXPECT_EQ(PathExists(temp / "documents/Ironvale"), !yes);
+        EXPECT_TRUE(PathExists(temp / "documents/keep.txt"));
+    }
+    unsetenv("XDG_DOCUMENTS_DIR");
+
+    // A record someone edited to list a file beside the game and the game's
+    // folder itself.
+    const std::string recorded = Version(1).files.rbegin()->first;
+    WriteTextFile(temp / "beside.txt", "beside the game");
+    WriteTextFile(PathJoin(install, "Uninstall.xml"),
+                  "<IronvaleWestPatch><FileChanges><new Path=\"" + PathJoin(install, recorded) + "\" /><new Path=\"" +
+                      temp / "beside.txt" + "\" /></FileChanges><DirectoryChanges><new Path=\"" + install +
+                      "\" /></DirectoryChanges><RegistryHive>HKEY_LOCAL_MACHINE</RegistryHive></IronvaleWestPatch>");
+    WriteTextFile(PathJoin(install, "GL.ini"), "settings");
+    EXPECT_EQ(Run("", {"-doUninstallCleanup", "true"}).exitCode, 1);
+    EXPECT_FALSE(PathExists(PathJoin(install, recorded)));
+    EXPECT_FALSE(PathExists(PathJoin(install, "GL.ini")));
+    EXPECT_EQ(ReadTextFile(temp / "beside.txt"), "beside the game");
+    EXPECT_TRUE(PathExists(PathJoin(install, "IronvaleGame.exe")));
 }
 
 }  // namespace

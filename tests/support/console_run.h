@@ -10,4 +10,4 @@ struct ConsoleRun {
     std::string output;
 };
 ConsoleRun RunConsoleProgram(const std::string& program, const std::vector<std::string>& arguments,
-                             const std::string& input);
+                             const std::string& input, const std::string& workingFolder = "");

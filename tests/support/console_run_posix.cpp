@@ -12,7 +12,7 @@
 extern char** environ;
 
 ConsoleRun RunConsoleProgram(const std::string& program, const std::vector<std::string>& arguments,
-                             const std::string& input) {
+                             const std::string& input, const std::string& workingFolder) {
     // Files rather than pipes: the program may stop reading its input early.
     char inputPath[] = "/tmp/ivl-input-XXXXXX";
     char outputPath[] = "/tmp/ivl-output-XXXXXX";
@@ -31,6 +31,7 @@ ConsoleRun RunConsoleProgram(const std::string& program, const std::vector<std::
         posix_spawn_file_actions_adddup2(&actions, inputFile, 0);
         posix_spawn_file_actions_adddup2(&actions, outputFile, 1);
         posix_spawn_file_actions_adddup2(&actions, outputFile, 2);
+        if (!workingFolder.empty()) posix_spawn_file_actions_addchdir_np(&actions, workingFolder.c_str());
         pid_t child = 0;
         int status = 0;
         if (posix_spawn(&child, program.c_str(), &actions, nullptr, argv.data(), environ) == 0 &&

@@ -2,8 +2,9 @@
 //
 // Waits for a dialog box (class #32770) with the given caption, prints its
 // message text (UTF-8), then "[button] " and the label of the button with
-// the given control id, and presses that button. Exit 0 when pressed, 2
-// when no dialog appeared. Returns once the dialog has closed.
+// the given control id, and presses that button (id 0: none, the box stays
+// for a later call to answer). Exit 0 when done, 2 when no dialog
+// appeared. Returns once a pressed dialog has closed.
 #include <windows.h>
 
 #include <fcntl.h>
@@ -73,6 +74,7 @@ int wmain(int argc, wchar_t** argv) {
     std::string labelOut = "[button] " + ToUtf8(label) + "\n";
     std::fwrite(labelOut.data(), 1, labelOut.size(), stdout);
     std::fflush(stdout);
+    if (buttonId == 0) return 0;
     PostMessageW(dialog, WM_COMMAND, MAKEWPARAM(buttonId, BN_CLICKED), reinterpret_cast<LPARAM>(button));
     // Gone before we return, so that the next box a caller waits for is
     // never this one again.
