@@ -12,10 +12,6 @@
 
 #include "base/file_operations.h"
 #include "base/paths.h"
-#include "patch/patch_applier.h"
-#include "patch/patch_info_file.h"
-#include "patch/patch_progress_file.h"
-#include "patch/patch_stages.h"
 #include "state/installation_data.h"
 #include "state/registry_manager.h"
 #include "tests/support/batch_fixture.h"
@@ -28,18 +24,6 @@ namespace {
 
 // The game: it notes how it was started.
 const char kGame[] = "#!/bin/sh\necho \"$@\" > \"$TMPDIR/started.txt\"\n";
-
-// Archives in place, and a power cut after the first action of stage two.
-class Interruption final : public IArchiveSource, public IStatusView {
-public:
-    ArchiveState WaitForArchive(const std::string&) override { return ArchiveState::Arrived; }
-    void OnApplyProgress(const std::string&, int32_t) override {
-        if (cutAfterReports > 0 && --cutAfterReports == 0) throw std::runtime_error("interrupted");
-    }
-    void OnFileProgress(const std::string&, uint32_t, uint32_t) override {}
-    void OnFileDone(const std::string&) override {}
-    int cutAfterReports = 0;
-};
 
 Tree Version(int number) {
     Tree tree = RandomTree(1);
@@ -171,59 +155,6 @@ TEST_F(UpdateRun, PatchesToTheLatestVersionAndStartsTheGame) {
         const bool signedRequest = request.find("&h=") != std::string::npos || request.find("?e=") != std::string::npos;
         EXPECT_EQ(signedRequest, request.find("version.txt") == std::string::npos) << request;
     }
-}
-
-// The record of an interrupted batch is finished without a question, then
-// the run starts over and offers the newer version.
-TEST_F(UpdateRun, ResumesAnInterruptedPatchThenPatchesOnToTheNewest) {
-    for (const char* recordName : {"PPF.xml", "_PPF.xml"}) {
-        SCOPED_TRACE(recordName);
-        Install(Version(1), "1");
-        const std::string patch = Publish(1, 2);
-        const std::string work = PathJoin(install, "tempPatch");
-        WriteTree(work, ReadTree(patch));
-        PatchInfoFile info;
-        info.Load(PathJoin(work, "patchinfo.xml"));
-        PatchProgressFile progress;
-        progress.SetDirectory(install);
-        PatchApplier applier;
-        PatchStages stages(info, progress, applier);
-        const PatchBatch batch{install, work, PathJoin(work, "patched"), server.Url("/patch_515195_2"), "2", {}};
-        Interruption interruption;
-        stages.Prepare(batch, &interruption, &interruption);
-        interruption.cutAfterReports = 2;
-        EXPECT_THROW(stages.Apply(batch, &interruption,
-                                  [this](const std::string& version) {
-                                      SetVersion(version);
-                                      return true;
-                                  }),
-                     std::runtime_error);
-        if (std::string(recordName) != "PPF.xml") {
-            ASSERT_TRUE(RenameFile(PathJoin(install, "PPF.xml"), PathJoin(install, recordName)));
-        }
-        Publish(2, 3);
-        const ConsoleRun run = Run("y\nn\n", {"-latestVersion", "3"});
-        EXPECT_EQ(run.exitCode, 1) << run.output;
-        EXPECT_EQ(Game(), Version(3));
-        EXPECT_EQ(InstalledVersion(), "3");
-        ExpectNoLeftovers();
-        EXPECT_FALSE(GameStarted());
-    }
-}
-
-// An installation left in change without its record (here with a file
-// lost and one cut short) gets the complete build again.
-TEST_F(UpdateRun, AnInstallationInChangeWithoutItsRecordGetsTheCompleteBuild) {
-    Publish(1, 2);
-    Tree damaged = Version(2);
-    damaged.files.erase(damaged.files.begin());
-    damaged.files.rbegin()->second.resize(1);
-    Install(damaged, "-1");
-    const ConsoleRun run = Run("n\n", {"-latestVersion", "2"});
-    EXPECT_EQ(run.exitCode, 1) << run.output;
-    EXPECT_EQ(Game(), Version(2));
-    EXPECT_EQ(InstalledVersion(), "2");
-    ExpectNoLeftovers();
 }
 
 // What ends a run early leaves the installation as it was; the game is
