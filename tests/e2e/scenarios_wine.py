@@ -67,7 +67,10 @@ class Session:
                           if (t := self.build.parent / p / "tools/ironvale-patch").exists()), None)
         if self.tool is None:
             fail("build the native ironvale-patch first (cmake --preset native; cmake --build --preset native)")
-        # No reset when the last client leaves: Wine's later windows would fail.
+        # No reset when the last client leaves. Wine's desktop process stays
+        # tied to the display it was started on: the prefix's Wine processes
+        # end before the session begins and again before its display goes.
+        self.end_wine()
         read, write = os.pipe()
         self.xvfb = subprocess.Popen(["Xvfb", "-displayfd", str(write), "-screen", "0", "1024x768x24", "-nolisten",
                                       "tcp", "-noreset"], pass_fds=[write], stdout=subprocess.DEVNULL,
@@ -108,8 +111,12 @@ class Session:
             time.sleep(0.05)
         fail("nginx did not start")
 
+    def end_wine(self):
+        subprocess.run(["/usr/lib/wine/wineserver", "-k"], env=self.env, stderr=subprocess.DEVNULL)
+
     def close(self):
         self.wine("reg", "delete", "HKLM\\Software\\Halvard", "/reg:32", "/f", check=False)
+        self.end_wine()
         for process in (self.nginx, self.xvfb):
             process.terminate()
             process.wait()
