@@ -69,10 +69,10 @@ if [ -x /usr/lib/wine/wine64 ] && command -v x86_64-w64-mingw32-g++-posix >/dev/
   "$run" reg add "$key" /v "Install Dir" /t REG_SZ /d "Z:${install//\//\\}\\" /reg:32 /f >/dev/null
   "$run" reg add "$key" /v Language /t REG_SZ /d English /reg:32 /f >/dev/null
   # Wine's desktop stays tied to the display it started on: a fresh one.
-  /usr/lib/wine/wineserver -k 2>/dev/null || true
+  { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true
   Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp -noreset 3>"$demo/display" >/dev/null 2>&1 &
   xvfb=$!
-  trap '"$run" reg delete "$key" /reg:32 /f >/dev/null 2>&1; /usr/lib/wine/wineserver -k 2>/dev/null; kill $xvfb' EXIT
+  trap '"$run" reg delete "$key" /reg:32 /f >/dev/null 2>&1; { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null; kill $xvfb' EXIT
   for _ in $(seq 200); do [ -s "$demo/display" ] && break; sleep 0.05; done
   export DISPLAY=:$(head -1 "$demo/display")
   echo "== running IronvaleUpdater.exe under Wine (beside its patches, in $demo/server)"

@@ -112,7 +112,8 @@ class Session:
         fail("nginx did not start")
 
     def end_wine(self):
-        subprocess.run(["/usr/lib/wine/wineserver", "-k"], env=self.env, stderr=subprocess.DEVNULL)
+        for flag in ("-k", "-w"):  # -k signals the server; -w waits until it is gone
+            subprocess.run(["/usr/lib/wine/wineserver", flag], env=self.env, stderr=subprocess.DEVNULL)
 
     def close(self):
         self.wine("reg", "delete", "HKLM\\Software\\Halvard", "/reg:32", "/f", check=False)

@@ -24,11 +24,11 @@ log="$WINEPREFIX/drive_c/users/$(id -un)/Temp/IronvaleUpdater.log"
 # reset when its last client leaves. Wine's desktop process stays tied to
 # the display it was started on, so the prefix's Wine processes end before
 # the session begins and again before its display goes.
-/usr/lib/wine/wineserver -k 2>/dev/null || true
+{ /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true
 display_file=$(mktemp)
 Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp -noreset 3>"$display_file" >/dev/null 2>&1 &
 xvfb=$!
-trap '! declare -F cleanup >/dev/null || cleanup; /usr/lib/wine/wineserver -k 2>/dev/null || true
+trap '! declare -F cleanup >/dev/null || cleanup; { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true
       kill $xvfb 2>/dev/null || true; rm -f "$display_file"' EXIT
 for _ in $(seq 200); do [ -s "$display_file" ] && break; sleep 0.05; done
 [ -s "$display_file" ] || fail "Xvfb did not start"
