@@ -1,69 +1,60 @@
 #!/usr/bin/python3
-"""Measures the updater's main window on a screenshot of the X server.
+"""Checks the updater's main window on the X server ($DISPLAY).
 
-usage: window_picture.py SCREENSHOT LEFT TOP BACKGROUND
+usage: window_picture.py LEFT TOP LENGTH BACKGROUND FAILED_PNG
 
-LEFT TOP: where the window is on the screen; BACKGROUND: the window's
-background picture. Compares the screen with that picture and prints:
-  bar N          columns of the progress bar drawn, from its origin on
-  title N        pixels of the title area that differ from the picture
-  status N       the same for the status line
-  cancel N       the same for the "Cancel" label
-  keyed N/M      of the M colour-key pixels inside the window's visible
-                 area, N show the screen behind the window
-  pinkish N      pixels of the window near the colour key (a fringe)
+LEFT TOP: where the window is on the screen; BACKGROUND: its background
+picture, which the screen is compared with. Waits up to ten seconds for a
+screen where the bar is drawn LENGTH px long, the title, status line and
+"Cancel" label are drawn, every colour-key pixel shows the screen behind
+the window and no pixel is near the colour key (a pink fringe). Prints the
+measures; on failure saves the screenshot as FAILED_PNG and exits 1.
 Needs Debian's python3-pil.
 """
+import os
 import sys
+import time
 
-from PIL import Image
+from PIL import Image, ImageGrab
 
 KEY = (236, 0, 140)
-BAR_ORIGIN, BAR_FULL, BAR_ROW = (26, 432), 330, 443
+BAR_LEFT, BAR_ROW = 26, 443
 
 
-def differs(a, b, threshold=48):
-    return sum(abs(x - y) for x, y in zip(a[:3], b[:3])) > threshold
+def differs(a, b):
+    return sum(abs(x - y) for x, y in zip(a, b)) > 48
 
 
-def main(argv):
-    screen = Image.open(argv[1]).convert("RGB")
-    left, top = int(argv[2]), int(argv[3])
-    picture = Image.open(argv[4]).convert("RGB")
-    width, height = picture.size
-    at = lambda x, y: screen.getpixel((left + x, top + y))
+def measure(screen, left, top, picture):
+    shown, drawn = screen.load(), picture.load()
+    at = lambda x, y: shown[left + x, top + y]
+    changed = lambda x0, y0, x1, y1: sum(differs(at(x, y), drawn[x, y]) for x in range(x0, x1) for y in range(y0, y1))
+    bar = next((x for x in range(BAR_LEFT, BAR_LEFT + 340) if not differs(at(x, BAR_ROW), drawn[x, BAR_ROW])), 999)
+    # The window's region leaves out its outermost pixels; the screen's
+    # corner is never covered by it.
+    inside = [(x, y) for y in range(1, picture.height - 1) for x in range(1, picture.width - 1)]
+    keyed = [at(x, y) for x, y in inside if drawn[x, y] == KEY]
+    return {"bar": bar - BAR_LEFT, "title": changed(11, 5, 260, 26), "status": changed(22, 408, 322, 428),
+            "cancel": changed(395, 433, 475, 452), "keyed": len(keyed),
+            "keyed_opaque": sum(pixel != shown[0, 0] for pixel in keyed),
+            "pinkish": sum(r >= 150 and g <= 90 and b >= 70 for r, g, b in (at(x, y) for x, y in inside))}
 
-    bar = 0
-    for x in range(BAR_ORIGIN[0], BAR_ORIGIN[0] + BAR_FULL + 10):
-        if not differs(at(x, BAR_ROW), picture.getpixel((x, BAR_ROW))):
+
+def main(left, top, length, background, failed):
+    picture = Image.open(background).convert("RGB")
+    for _ in range(40):
+        screen = ImageGrab.grab(xdisplay=os.environ["DISPLAY"]).convert("RGB")
+        seen = measure(screen, int(left), int(top), picture)
+        good = (seen["bar"] == int(length) and seen["title"] > 100 and seen["status"] > 100 and seen["cancel"] > 50
+                and seen["keyed"] > 0 and seen["keyed_opaque"] == 0 and seen["pinkish"] == 0)
+        if good:
             break
-        bar += 1
-    print("bar", bar)
-
-    def changed(x0, y0, x1, y1):
-        return sum(differs(at(x, y), picture.getpixel((x, y)))
-                   for x in range(x0, x1) for y in range(y0, y1))
-
-    print("title", changed(11, 5, 260, 26))
-    print("status", changed(22, 408, 322, 428))
-    print("cancel", changed(395, 433, 475, 452))
-
-    # The screen behind the window, from a corner the window does not
-    # cover.
-    behind = screen.getpixel((0, 0))
-    keyed = shown = 0
-    pinkish = 0
-    for y in range(1, height - 1):
-        for x in range(1, width - 1):
-            pixel = at(x, y)
-            if picture.getpixel((x, y)) == KEY:
-                keyed += 1
-                shown += not differs(pixel, behind, 0)
-            if pixel[0] >= 150 and pixel[1] <= 90 and pixel[2] >= 70:
-                pinkish += 1
-    print(f"keyed {shown}/{keyed}")
-    print("pinkish", pinkish)
+        time.sleep(0.25)
+    else:
+        screen.save(failed)
+    print(seen)
+    return 0 if good else 1
 
 
 if __name__ == "__main__":
-    main(sys.argv)
+    sys.exit(main(*sys.argv[1:]))

@@ -1,97 +1,114 @@
 #!/usr/bin/env bash
-# The main window under Wine and Xvfb, as the player sees it on the X
-# server: the bar's drawn length for a run at 0, 500 and 1000, the title,
-# the status line and the "Cancel" label drawn, the colour key transparent
-# without a pink fringe; "Cancel" and the close spot answered No and Yes;
-# a drag. The clicks are real pointer events from xdotool.
-set -euo pipefail
-program=$(realpath "$1")
-holder_exe=$(realpath "$2")
-driver_exe=$(realpath "$3")
-probe_exe=$(realpath "$4")
-answer_exe=$(realpath "$5")
-source "$(dirname "$0")/window_session.sh"
-"$run" reg delete "$game_key" /f >/dev/null 2>&1 || true
-
-# measure: a screenshot of the X server, measured against the background
-# picture; sets bar, title, status, cancel, keyed and pinkish.
-measure() {
-  import -display "$DISPLAY" -window root "$scratch/screen.png"
-  eval "$(/usr/bin/python3 "$root/tests/ui/window_picture.py" "$scratch/screen.png" "$left" "$top" \
-            "$root/resources/pictures/background.png" | sed 's/^\([a-z]*\) \(.*\)/\1="\2"/')"
-}
-
-# bar_reaches LENGTH: waits for the window to repaint the bar. A failure
-# keeps the screenshot beside the test results.
-bar_reaches() {
-  for _ in $(seq 40); do
-    measure
-    [ "$bar" -eq "$1" ] && [ "$status" -gt 100 ] && return 0
-    sleep 0.25
+# The Windows program's window, boxes and fonts under Wine and Xvfb, as the
+# player meets them, in German, whose button labels differ from the
+# system's: window_driver shows them as the update run does and answers
+# its boxes, xdotool clicks and drags, window_picture.py reads the screen.
+#   window_wine.sh UPDATER HOLD_INSTANCE DIALOG_ANSWER WINDOW_DRIVER
+source "$(dirname "$0")/../e2e/wine_session.sh"
+driver_exe=$(realpath "$4")
+key='HKCU\Software\Halvard\Ironvale'
+driver_log="$(dirname "$log")/window_driver.log"
+scratch=$(mktemp -d)
+# Without a window manager Wine waits two seconds for one after each box.
+"$run" reg add 'HKCU\Software\Wine\AppDefaults\window_driver.exe\X11 Driver' /v Managed /t REG_SZ /d N /f >/dev/null
+set_value() { "$run" reg add "$key" /v "$1" /t REG_SZ /d "$2" /f >/dev/null; }
+german() { awk -F'\t' -v key="$1" '$1 == key { print $4 }' "$root/resources/strings.tsv"; }
+# Wine finds fonts through fontconfig and remembers them in its registry.
+forget_fonts() {
+  for k in Cache 'External Fonts'; do "$run" reg delete "HKCU\\Software\\Wine\\Fonts\\$k" /f >/dev/null 2>&1 || true; done
+  for face in IPAGothic IPAPGothic @IPAGothic @IPAPGothic; do
+    "$run" reg delete 'HKLM\Software\Microsoft\Windows NT\CurrentVersion\Fonts' /v "$face (TrueType)" /f >/dev/null 2>&1 || true
   done
-  cp "$scratch/screen.png" "$(dirname "$program")/test-results/window_wine-failed.png" 2>/dev/null || true
-  fail "bar drawn $bar px long (status line: $status changed pixels), expected $1"
+}
+# The prefix is shared with the other Wine tests, which expect neither the
+# game's key nor the Japanese font.
+cleanup() {
+  [ -z "${DRIVER_PID:-}" ] || kill "$DRIVER_PID" 2>/dev/null || true
+  forget_fonts
+  "$run" reg delete "$key" /f >/dev/null 2>&1 || true
+  rm -rf "$scratch"
 }
 
+start_driver() {  # [NAME=VALUE...]: the driver with extra environment
+  : >"$driver_log"
+  coproc DRIVER { env "$@" "$run" "$driver_exe" 2>>"$scratch/driver.err"; }
+}
+stop_driver() { exec {DRIVER[1]}>&-; wait "$DRIVER_PID" 2>/dev/null || true; }
+send() {
+  echo "$1" >&"${DRIVER[1]}"
+  read -r -t 60 reply <&"${DRIVER[0]}" || fail "no answer to '$1' (stderr: $(cat "$scratch/driver.err"))"
+  reply=${reply%$'\r'}
+}
+expect() { send "$1"; [ "$reply" = "$2" ] || fail "'$1' answered '$reply', expected '$2'"; }
+click() { xdotool mousemove "$((left + $1))" "$((top + $2))" click 1; }
+
+set_value "Install Dir" 'C:\Games\Ironvale'  # the updater finds its key by it
+set_value Language German
 start_driver
-send start
-window_rect
-[ "$left" -eq $(((1024 - 532) / 2)) ] && [ "$top" -eq $(((768 - 481) / 2)) ] || fail "window at $left,$top, not centred"
-send "status File: data/levels/level2.map"
+expect "language 1 Polish" \
+  "Polish | [1 OK] [2 Abbrechen] {English French German Italian Japanese Polish Russian Spanish} German"
+"$run" reg query "$key" /v Language | grep -q 'REG_SZ *Polish' || fail "the choice was not stored"
+expect "retry 2" "cancel | $(german INSTALLER_FAILED_TO_MOVE_THE_FILE) [4 Wiederholen] [2 Abbrechen]"
+expect start started
+expect rect "246 143"  # centred on the 1024 x 768 screen
+left=246 top=143
+# A question of the main thread owned by the window, then the confirmations
+# of the window's thread (with its own hook) answered No: the run goes on.
+yes_no="[6 Ja] [7 Nein]"
+expect "ask 7 Weiter?" "no | Weiter? $yes_no"
+going="cancelled=0 cancels=0 quit=0 window=1"
+click 435 443  # "Cancel"
+expect "confirm 7" "$going | $(german INSTALLER_CONFIRM_CANCEL) $yes_no"
+click 515 15  # the close spot
+expect "confirm 7" "$going | $(german INSTALLER_CONFIRM_QUIT) $yes_no"
 for step in "0 0" "500 165" "1000 330"; do
   read -r value length <<<"$step"
-  send "overall $value"
-  send "file $value"
-  bar_reaches "$length"
-  echo "progress $value: bar $length px, title $title, status $status, cancel $cancel, keyed $keyed, pinkish $pinkish"
-  [ "$title" -gt 100 ] && [ "$cancel" -gt 50 ] || fail "title or Cancel label not drawn"
-  [ "${keyed%/*}" = "${keyed#*/}" ] && [ "${keyed#*/}" -gt 0 ] || fail "colour-key pixels not transparent: $keyed"
-  [ "$pinkish" -eq 0 ] || fail "$pinkish pixels near the colour key (a fringe)"
+  expect "progress $value" ok
+  /usr/bin/python3 "$root/tests/ui/window_picture.py" $left $top "$length" "$root/resources/pictures/background.png" \
+    "$(dirname "$program")/test-results/window_wine-failed.png" || fail "progress $value: the window as drawn is wrong"
 done
-
-# "Cancel" answered No: the run goes on and the bar still follows it. The
-# main thread waits while the question is open.
-click 435 443
-post wait
-text=$(press 7)
-[ "$text" = "Are you sure you want to cancel?" ] || fail "Cancel asked: '$text'"
-answer
-expect_reply "state cancelled=0 cancels=0 quit=0 window=1"
-send "overall 0"
-send "file 0"
-bar_reaches 0
-
 # A drag from the title line moves the window by the pointer's way.
 xdotool mousemove $((left + 100)) $((top + 15)) mousedown 1 mousemove $((left + 150)) $((top + 45)) mouseup 1
-before="$left $top"
-for _ in $(seq 20); do
-  window_rect
-  [ "$left $top" != "$before" ] && break
-  sleep 0.1
-done
-[ "$left $top" = "296 173" ] || fail "dragged by 50,30 from $before, window now at $left $top"
-
-# The close spot answered Yes: cancelled once, the LZMA loop's flag set,
-# the window gone.
+for _ in $(seq 20); do send rect; [ "$reply" = "296 173" ] && break; sleep 0.1; done
+expect rect "296 173"
+left=296 top=173
+# Yes: cancelled once, the LZMA loop's flag set, the window gone.
 click 515 15
-text=$(press 6)
-[ "$text" = "Are you sure you want to quit?" ] || fail "close spot asked: '$text'"
-send wait
-expect_reply "state cancelled=1 cancels=1 quit=1 window=0"
-send stop
+expect "confirm 6" "cancelled=1 cancels=1 quit=1 window=0 | $(german INSTALLER_CONFIRM_QUIT) $yes_no"
 stop_driver
 
-# A new run: the close spot answered No, then "Cancel" answered Yes.
-start_driver
-send start
-window_rect
-click 515 15
-[ "$(press 7)" = "Are you sure you want to quit?" ] || fail "close spot asked something else"
-send wait
-expect_reply "state cancelled=0 cancels=0 quit=0 window=1"
-click 435 443
-[ "$(press 6)" = "Are you sure you want to cancel?" ] || fail "Cancel asked something else"
-send wait
-expect_reply "state cancelled=1 cancels=1 quit=1 window=0"
+# The updater's own first box, before any window: the instance-running
+# warning, whose OK differs from the system's in Spanish.
+set_value Language Spanish
+second_start "Ironvale - Actualizador"
+grep -qx '\[button\] Aceptar' <<<"$text" || fail "the instance-running box's button"
+
+# Japanese, each case with a fontconfig of its own and Wine's memory of the
+# Japanese fonts cleared.
+set_value Language Japanese
+with_fonts() {  # NAME FOLDER...: the driver, knowing only these fonts
+  forget_fonts
+  { echo '<?xml version="1.0"?><fontconfig>'
+    printf '<dir>%s</dir>' "${@:2}"
+    echo "<cachedir>$scratch/fontcache</cachedir></fontconfig>"; } >"$scratch/$1.conf"
+  start_driver FONTCONFIG_FILE="$scratch/$1.conf"
+}
+searched() {
+  [ "$(grep -c 'Trace: Finding dialog font\.\.\.' "$driver_log")" -eq "$1" ] || fail "dialog font not searched $1 times"
+}
+# No Japanese font: no font is made, and each request searches again.
+with_fonts latin /usr/share/fonts/truetype/dejavu
+expect dialogfont none
+expect dialogfont none
 stop_driver
+searched 2
+# A Japanese font, none of the candidates: the system's choice for an empty
+# face name at the default size, made once; the boxes, which the hook gives
+# that font, keep their labels.
+with_fonts japanese /usr/share/fonts/truetype/dejavu /usr/share/fonts/opentype/ipafont-gothic
+expect dialogfont "'' 14 400"
+expect "ask 6 OK?" "yes | OK? [6 はい] [7 いいえ]"
+stop_driver
+searched 1
+grep -q 'Info: Created font: IPAGothic' "$driver_log" || fail "the system did not choose IPAGothic"
 echo "window_wine: ok"

@@ -1,36 +1,34 @@
 // window_driver: the updater's main window and boxes, driven by commands on
-// stdin (one a line) the way the update run will drive them; each command
-// is answered by one line on stdout. Start-up follows the updater's own:
-// the language stored in the game's registry key, the button hook on the
-// main thread, GDI+. The log goes to window_driver.log in the temporary
-// folder.
-//   start                 Start, show the window: "started" once it is shown
-//   overall N | file N    progress reports from another thread: "ok"
-//   status TEXT           the status line (UTF-8): "ok"
-//   rect                  "rect LEFT TOP RIGHT BOTTOM", or "rect none"
-//   wait                  WaitWhileConfirming, then the state line:
-//                         "state cancelled=0|1 cancels=N quit=0|1 window=0|1"
-//   stop                  Stop, then the state line
-//   ask|error TEXT        a box owned by the window: "answer yes|no|ok"
-//   retry                 the question after a failed move: "answer retry|cancel"
-//   language              the language dialog; a choice is stored in the
-//                         registry as the updater stores it:
-//                         "language NAME" or "language cancelled"
-//   dialogfont            "dialogfont none", or "dialogfont FACE HEIGHT
-//                         WEIGHT REAL" (REAL: the face the system gave)
+// stdin the way the update run drives them, each answered by one line on
+// stdout. The player's answer to a box (button ID) comes from a thread of
+// its own; BOX describes that box: its text's first line, "[ID LABEL]" for
+// each button, "{ENTRIES} SELECTED" for a list. Start-up follows the
+// updater's: the language stored in the game's registry key, the button
+// hook on the main thread, GDI+; the log is window_driver.log in the
+// temporary folder.
+//   start              shows the window with a status line: "started"
+//   rect               "LEFT TOP" of the window
+//   progress N         overall and file progress: "ok"
+//   confirm ID         the confirmation a click put up, answered; then the
+//                      state once the window's thread has taken it in:
+//                      "cancelled=0|1 cancels=N quit=0|1 window=0|1 | BOX"
+//   ask ID TEXT        a question owned by the window: "yes|no | BOX"
+//   retry ID           the question after a failed move: "retry|cancel | BOX"
+//   language ID NAME   the language dialog, NAME chosen and stored as the
+//                      updater stores it: "NAME|cancelled | BOX"
+//   dialogfont         the Japanese dialog font: "none" or "'FACE' HEIGHT WEIGHT"
 #include <windows.h>
-
-#include <fcntl.h>
-#include <io.h>
 
 #include <atomic>
 #include <iostream>
+#include <sstream>
 #include <string>
 #include <thread>
 
-#include "base/exception.h"
+#include "base/encoding.h"
 #include "base/log.h"
 #include "patch/lzma_decoder.h"
+#include "resources/resource_ids.h"
 #include "state/configuration.h"
 #include "state/registry_manager.h"
 #include "text/localization.h"
@@ -48,129 +46,137 @@ public:
     std::atomic<int> calls{0};
 };
 
-std::wstring FromUtf8(const std::string& text) {
-    if (text.empty()) return std::wstring();
-    const int size = MultiByteToWideChar(CP_UTF8, 0, text.c_str(), static_cast<int>(text.size()), nullptr, 0);
-    std::wstring wide(static_cast<size_t>(size), L'\0');
-    MultiByteToWideChar(CP_UTF8, 0, text.c_str(), static_cast<int>(text.size()), &wide[0], size);
-    return wide;
+std::wstring TextOf(HWND window) {
+    wchar_t text[512] = {};
+    GetWindowTextW(window, text, 512);
+    return text;
 }
 
-void Reply(const std::string& line) { std::cout << line << "\n" << std::flush; }
+BOOL CALLBACK DescribeControl(HWND control, LPARAM description) {
+    std::wstring& seen = *reinterpret_cast<std::wstring*>(description);
+    wchar_t kind[16] = {};
+    GetClassNameW(control, kind, 16);
+    const int id = GetDlgCtrlID(control);
+    if (std::wstring(kind) == L"Static" && id == 0xFFFF) {  // a message box's text
+        const std::wstring text = TextOf(control);
+        seen = L" " + text.substr(0, text.find(L'\n')) + seen;
+    } else if (std::wstring(kind) == L"Button") {
+        seen += L" [" + std::to_wstring(id) + L" " + TextOf(control) + L"]";
+    } else if (std::wstring(kind) == L"ComboBox") {
+        wchar_t entry[64] = {};
+        const LRESULT count = SendMessageW(control, CB_GETCOUNT, 0, 0);
+        for (LRESULT i = 0; i < count; ++i) {
+            SendMessageW(control, CB_GETLBTEXT, static_cast<WPARAM>(i), reinterpret_cast<LPARAM>(entry));
+            seen += (i == 0 ? L" {" : L" ") + std::wstring(entry);
+        }
+        seen += L"} " + TextOf(control);
+    }
+    return TRUE;
+}
 
-std::string State(const GuiManager& gui, const CountingCancelable& cancelable) {
-    return "state cancelled=" + std::to_string(gui.IsCancelled() ? 1 : 0) +
-           " cancels=" + std::to_string(cancelable.calls.load()) + " quit=" + std::to_string(quitRequested ? 1 : 0) +
-           " window=" + std::to_string(IsWindow(static_cast<HWND>(gui.GetWindowHandle())) ? 1 : 0);
+// Plays the player at the next box of the program: describes it, chooses
+// choice in its list if given, presses the button and returns once the box
+// is gone.
+std::string Answer(int button, const std::wstring& choice) {
+    HWND box = nullptr;
+    for (int waited = 0; box == nullptr && waited < 20000; waited += 50) {
+        Sleep(50);
+        box = FindWindowW(L"#32770", GetWindowTitle().c_str());
+    }
+    if (box == nullptr) return "no box";
+    Sleep(200);  // the box finishes its initialisation (labels, list)
+    std::wstring seen;
+    EnumChildWindows(box, DescribeControl, reinterpret_cast<LPARAM>(&seen));
+    if (!choice.empty()) {
+        SendDlgItemMessageW(box, IDC_LANGUAGE_LIST, CB_SELECTSTRING, static_cast<WPARAM>(-1),
+                            reinterpret_cast<LPARAM>(choice.c_str()));
+    }
+    PostMessageW(box, WM_COMMAND, MAKEWPARAM(button, BN_CLICKED), 0);
+    for (int waited = 0; IsWindow(box) && waited < 5000; waited += 20) Sleep(20);
+    return NarrowToUtf8(seen);
+}
+
+// show() puts up a box and returns the answer it got from Answer.
+template <typename Show>
+std::string Answered(int button, const std::wstring& choice, Show show) {
+    std::string seen;
+    std::thread player([&] { seen = Answer(button, choice); });
+    const std::string result = show();
+    player.join();
+    return result + " |" + seen;
 }
 
 std::string DescribeDialogFont() {
-    HFONT font = GetDialogFont();
-    if (font == nullptr) return "dialogfont none";
-    LOGFONTA description = {};
-    GetObjectA(font, sizeof(description), &description);
-    HDC screen = GetDC(nullptr);
-    HGDIOBJ previous = SelectObject(screen, font);
-    char real[LF_FACESIZE] = {};
-    GetTextFaceA(screen, LF_FACESIZE, real);
-    SelectObject(screen, previous);
-    ReleaseDC(nullptr, screen);
-    return "dialogfont '" + std::string(description.lfFaceName) + "' " + std::to_string(description.lfHeight) + " " +
-           std::to_string(description.lfWeight) + " '" + real + "'";
+    LOGFONTA font = {};
+    if (GetObjectA(GetDialogFont(), sizeof(font), &font) == 0) return "none";
+    return "'" + std::string(font.lfFaceName) + "' " + std::to_string(font.lfHeight) + " " +
+           std::to_string(font.lfWeight);
 }
 
 }  // namespace
 
 int main() {
-    _setmode(_fileno(stdout), _O_BINARY);
     Localization::Initialize();
-    try {
-        Log::Open("window_driver.log");
-    } catch (const Exception&) {
-    }
+    Log::Open("window_driver.log");
     Configuration configuration;
     configuration.SetDefaults();
     RegistryManager registry;
     registry.Locate(configuration.GetRegistryKey(), "");
-    const std::string stored = registry.GetLanguage();
-    if (!stored.empty()) Localization::SetLanguage(stored);
-
+    if (!registry.GetLanguage().empty()) Localization::SetLanguage(registry.GetLanguage());
     UiServices services;
     services.InstallMessageBoxHook();
     services.StartGraphics();
     CountingCancelable cancelable;
-    {
-        GuiManager gui;
-        std::string line;
-        while (std::getline(std::cin, line)) {
-            if (!line.empty() && line.back() == '\r') line.pop_back();
-            const size_t space = line.find(' ');
-            const std::string command = line.substr(0, space);
-            const std::string argument = space == std::string::npos ? std::string() : line.substr(space + 1);
-            if (command == "start") {
-                gui.Start(&cancelable);
-                gui.Show();
-                // The window is shown by its own thread; answer once it is.
-                HWND window = static_cast<HWND>(gui.GetWindowHandle());
-                for (int waited = 0; window != nullptr && !IsWindowVisible(window) && waited < 10000; waited += 20) {
-                    Sleep(20);
-                }
-                Reply("started");
-            } else if (command == "overall" || command == "file") {
-                // From another thread, as the downloader reports.
-                const int value = std::stoi(argument);
-                std::thread([&gui, command, value] {
-                    if (command == "overall") {
-                        gui.SetOverallProgress(value);
-                    } else {
-                        gui.SetFileProgress(value);
-                    }
-                }).join();
-                Reply("ok");
-            } else if (command == "status") {
-                gui.SetStatusText(FromUtf8(argument));
-                Reply("ok");
-            } else if (command == "rect") {
-                RECT rect;
-                HWND window = static_cast<HWND>(gui.GetWindowHandle());
-                if (window != nullptr && GetWindowRect(window, &rect)) {
-                    Reply("rect " + std::to_string(rect.left) + " " + std::to_string(rect.top) + " " +
-                          std::to_string(rect.right) + " " + std::to_string(rect.bottom));
-                } else {
-                    Reply("rect none");
-                }
-            } else if (command == "wait") {
-                gui.WaitWhileConfirming();
-                Reply(State(gui, cancelable));
-            } else if (command == "stop") {
-                gui.Stop();
-                Reply(State(gui, cancelable));
-            } else if (command == "ask") {
-                Reply(gui.AskYesNo(FromUtf8(argument)) ? "answer yes" : "answer no");
-            } else if (command == "error") {
-                gui.ShowError(argument);
-                Reply("answer ok");
-            } else if (command == "retry") {
-                MoveRetryBox question;
-                Reply(question.AskRetryMove("C:\\Patched\\a.pak", "C:\\Games\\a.pak") ? "answer retry"
-                                                                                      : "answer cancel");
-            } else if (command == "language") {
-                LanguageDialog dialog;
+    GuiManager gui;
+    const auto window = [&gui] { return static_cast<HWND>(gui.GetWindowHandle()); };
+    std::string line;
+    while (std::getline(std::cin, line)) {
+        std::istringstream words(line);
+        std::string command, text;
+        int number = 0;
+        words >> command >> number;
+        std::getline(words >> std::ws, text);
+        std::string reply = "unknown command";
+        if (command == "start") {
+            gui.Start(&cancelable);
+            gui.SetStatusText(L"File: data/levels/level2.map");
+            gui.Show();
+            // The window's own thread shows it.
+            for (int waited = 0; !IsWindowVisible(window()) && waited < 10000; waited += 20) Sleep(20);
+            reply = "started";
+        } else if (command == "rect") {
+            RECT rect = {};
+            GetWindowRect(window(), &rect);
+            reply = std::to_string(rect.left) + " " + std::to_string(rect.top);
+        } else if (command == "progress") {
+            gui.SetOverallProgress(number);
+            gui.SetFileProgress(number);
+            reply = "ok";
+        } else if (command == "confirm") {
+            const std::string seen = Answer(number, L"");
+            gui.WaitWhileConfirming();
+            // After Yes the window's thread ends and takes the window.
+            for (int waited = 0; gui.IsCancelled() && IsWindow(window()) && waited < 5000; waited += 20) Sleep(20);
+            reply = "cancelled=" + std::to_string(gui.IsCancelled()) + " cancels=" + std::to_string(cancelable.calls) +
+                    " quit=" + std::to_string(quitRequested) + " window=" + std::to_string(IsWindow(window())) + " |" +
+                    seen;
+        } else if (command == "ask") {
+            reply = Answered(number, L"", [&] { return gui.AskYesNo(WidenFromCodePage(text)) ? "yes" : "no"; });
+        } else if (command == "retry") {
+            reply = Answered(number, L"", [] {
+                return MoveRetryBox().AskRetryMove("C:\\Patched\\a.pak", "C:\\Games\\a.pak") ? "retry" : "cancel";
+            });
+        } else if (command == "language") {
+            reply = Answered(number, WidenFromCodePage(text), [&] {
                 std::string chosen;
-                if (dialog.Run(chosen)) {
-                    if (!chosen.empty()) registry.SetLanguage(chosen);
-                    Reply("language " + chosen);
-                } else {
-                    Reply("language cancelled");
-                }
-            } else if (command == "dialogfont") {
-                Reply(DescribeDialogFont());
-            } else {
-                Reply("unknown command " + command);
-            }
+                if (!LanguageDialog().Run(chosen)) return std::string("cancelled");
+                registry.SetLanguage(chosen);
+                return chosen;
+            });
+        } else if (command == "dialogfont") {
+            reply = DescribeDialogFont();
         }
+        std::cout << reply << std::endl;
     }
-    services.Shutdown();
-    Log::Close();
     return 0;
 }
