@@ -1,19 +1,16 @@
 // The console front end of the native build: the progress line on stderr
 // (one line per change, or rewritten in place on a terminal), Ctrl+C with
-// the confirmation question, the boxes and the language question answered
-// on stdin.
+// the confirmation question, and the language question, answered on stdin.
 
 #include <gtest/gtest.h>
 
-#include <fcntl.h>
 #include <poll.h>
+#include <pty.h>
 #include <signal.h>
-#include <termios.h>
 #include <unistd.h>
 
 #include <atomic>
 #include <cstdio>
-#include <cstdlib>
 #include <iostream>
 #include <sstream>
 #include <string>
@@ -25,79 +22,40 @@
 
 namespace {
 
-// Swaps a stream's buffer for the lifetime of the object.
-class StreamSwap {
+// While it lives, std::cin reads the answers and descriptor 2 (where the
+// front end writes, and which it asks whether it is a terminal) is a pipe
+// or a terminal, whose other end Shown() reads.
+class Console {
 public:
-    StreamSwap(std::ios& swapped, std::streambuf* replacement) : stream(swapped), saved(swapped.rdbuf(replacement)) {}
-    ~StreamSwap() { stream.rdbuf(saved); }
-
-private:
-    std::ios& stream;
-    std::streambuf* saved;
-};
-
-// Points the process's stderr (descriptor 2, where the front end writes
-// and which it asks whether it is a terminal) elsewhere for the object's
-// lifetime.
-class StderrRedirect {
-public:
-    explicit StderrRedirect(int target) : saved(dup(STDERR_FILENO)) {
+    Console(bool terminal, const std::string& text) : answers(text), input(std::cin.rdbuf(answers.rdbuf())) {
+        Localization::Initialize();
+        EXPECT_EQ(terminal ? openpty(&ends[0], &ends[1], nullptr, nullptr, nullptr) : pipe(ends), 0);
         std::fflush(stderr);
-        dup2(target, STDERR_FILENO);
+        saved = dup(STDERR_FILENO);
+        dup2(ends[1], STDERR_FILENO);
     }
-    ~StderrRedirect() {
-        std::cerr.flush();
-        std::fflush(stderr);
+    ~Console() {
+        std::cin.rdbuf(input);
         dup2(saved, STDERR_FILENO);
-        close(saved);
+        for (int end : {saved, ends[0], ends[1]}) close(end);
     }
-
-private:
-    int saved;
-};
-
-std::string ReadBack(FILE* file) {
-    std::string text;
-    std::rewind(file);
-    for (int c = std::fgetc(file); c != EOF; c = std::fgetc(file)) text += static_cast<char>(c);
-    std::fclose(file);
-    return text;
-}
-
-// A terminal whose other end the test reads; raw, so that line ends pass
-// unchanged.
-class PseudoTerminal {
-public:
-    PseudoTerminal() : master(posix_openpt(O_RDWR | O_NOCTTY)) {
-        grantpt(master);
-        unlockpt(master);
-        terminal = open(ptsname(master), O_RDWR | O_NOCTTY);
-        termios mode;
-        tcgetattr(terminal, &mode);
-        cfmakeraw(&mode);
-        tcsetattr(terminal, TCSANOW, &mode);
-    }
-    ~PseudoTerminal() {
-        close(terminal);
-        close(master);
-    }
-    int Terminal() const { return terminal; }
     // Everything written so far: reads until nothing more comes for 200 ms.
-    std::string Drain() const {
+    std::string Shown() const {
+        std::cerr.flush();
         std::string text;
-        pollfd ready = {master, POLLIN, 0};
         char buffer[4096];
-        while (poll(&ready, 1, 200) > 0) {
-            const ssize_t count = read(master, buffer, sizeof(buffer));
-            if (count <= 0) break;
+        pollfd ready = {ends[0], POLLIN, 0};
+        for (ssize_t count = 0; poll(&ready, 1, 200) > 0 && (count = read(ends[0], buffer, sizeof(buffer))) > 0;) {
             text.append(buffer, static_cast<size_t>(count));
         }
         return text;
     }
 
 private:
-    int master;
-    int terminal = -1;
+    std::istringstream answers;
+    std::streambuf* input;
+    int ends[2] = {-1, -1};
+    int saved;
 };
 
 class CountingCancelable final : public ICancelable {
@@ -106,24 +64,9 @@ public:
     std::atomic<int> calls{0};
 };
 
-size_t Count(const std::string& text, const std::string& what) {
-    size_t count = 0;
-    for (size_t at = text.find(what); at != std::string::npos; at = text.find(what, at + 1)) ++count;
-    return count;
-}
-
-class Console : public ::testing::Test {
-protected:
-    void SetUp() override { Localization::Initialize(); }
-    // The flag is process-wide; a confirmed cancel must not stop the LZMA
-    // tests that run after this one.
-    void TearDown() override { quitRequested = false; }
-};
-
-TEST_F(Console, OneLinePerChangeOffATerminal) {
-    FILE* file = std::tmpfile();
+TEST(ConsoleFrontEnd, OneLinePerChangeOffATerminal) {
+    Console console(false, "");
     {
-        StderrRedirect redirect(fileno(file));
         GuiManager gui;
         gui.SetOverallProgress(100);  // before the front end runs: dropped
         gui.Start(nullptr);
@@ -133,9 +76,8 @@ TEST_F(Console, OneLinePerChangeOffATerminal) {
         gui.SetOverallProgress(501);  // the same after weighting
         gui.SetStatusText(L"File: a.pak");
         gui.SetFileProgress(1000);
-        gui.Stop();
     }
-    EXPECT_EQ(ReadBack(file),
+    EXPECT_EQ(console.Shown(),
               "Ironvale - Updater\n"
               "[------------------------------]   0.0%\n"
               "[------------------------------]   0.0%  File: a.pak\n"
@@ -143,87 +85,66 @@ TEST_F(Console, OneLinePerChangeOffATerminal) {
               "[#################-------------]  57.5%  File: a.pak\n");
 }
 
-TEST_F(Console, InPlaceOnATerminalWithQuestionsOnTheirOwnLines) {
-    PseudoTerminal terminal;
-    std::istringstream answers("y\n");
-    bool startGame = false;
+TEST(ConsoleFrontEnd, InPlaceOnATerminalWithQuestionsOnTheirOwnLines) {
+    Console console(true, "y\n");
     {
-        StreamSwap input(std::cin, answers.rdbuf());
-        StderrRedirect redirect(terminal.Terminal());
         GuiManager gui;
         gui.Start(nullptr);
         gui.Show();
         gui.SetOverallProgress(500);
-        startGame = gui.AskYesNo(L"Start the game?");
+        EXPECT_TRUE(gui.AskYesNo(L"Start the game?"));
         gui.SetFileProgress(1000);
-        gui.Stop();
     }
-    EXPECT_TRUE(startGame);
-    const std::string shown = terminal.Drain();
-    const std::string frames =
-        "Ironvale - Updater\n"
-        "\r[------------------------------]   0.0%\x1b[K"
-        "\r[############------------------]  42.5%\x1b[K\n";
-    EXPECT_EQ(shown.substr(0, frames.size()), frames) << shown;
-    EXPECT_NE(shown.find("\x1b[K\n[Question] Ironvale - Updater\nStart the game?\n"), std::string::npos) << shown;
-    // After the answer the line comes back below, and Stop ends it.
-    const std::string last =
-        "\r[############------------------]  42.5%\x1b[K\r[#################-------------]  57.5%\x1b[K\n";
-    ASSERT_GE(shown.size(), last.size());
-    EXPECT_EQ(shown.substr(shown.size() - last.size()), last) << shown;
+    // The question ends the line; after the answer the line comes back
+    // below, and Stop ends it.
+    EXPECT_EQ(console.Shown(),
+              "Ironvale - Updater\r\n"
+              "\r[------------------------------]   0.0%\x1b[K"
+              "\r[############------------------]  42.5%\x1b[K\r\n"
+              "[Question] Ironvale - Updater\r\nStart the game?\r\n[Y]es / [n]o? "
+              "\r[############------------------]  42.5%\x1b[K"
+              "\r[#################-------------]  57.5%\x1b[K\r\n");
 }
 
-TEST_F(Console, CtrlCAsksAndOnlyYesCancelsOnce) {
-    struct sigaction before = {};
+TEST(ConsoleFrontEnd, CtrlCAsksAndOnlyYesCancelsOnce) {
+    struct sigaction before = {}, after = {};
     sigaction(SIGINT, nullptr, &before);
-    std::istringstream answers("n\ny\n");
-    FILE* file = std::tmpfile();
+    Console console(false, "n\ny\n");
     CountingCancelable cancelable;
-    {
-        StreamSwap input(std::cin, answers.rdbuf());
-        StderrRedirect redirect(fileno(file));
-        GuiManager gui;
-        gui.Start(&cancelable);
-        gui.Show();
-        // The first is answered No, and the run goes on to hear the second.
-        raise(SIGINT);
-        raise(SIGINT);
-        gui.Stop();
-        EXPECT_TRUE(gui.IsCancelled());
-    }
+    GuiManager gui;
+    gui.Start(&cancelable);
+    gui.Show();
+    // The first is answered No, and the run goes on to hear the second.
+    raise(SIGINT);
+    raise(SIGINT);
+    gui.Stop();
+    EXPECT_TRUE(gui.IsCancelled());
     EXPECT_EQ(cancelable.calls, 1);
     EXPECT_TRUE(quitRequested);
-    EXPECT_EQ(Count(ReadBack(file), "Are you sure you want to cancel?"), 2u);
+    const std::string question = "[Question] Ironvale - Updater\nAre you sure you want to cancel?\n[Y]es / [n]o? ";
+    EXPECT_EQ(console.Shown(), "Ironvale - Updater\n[------------------------------]   0.0%\n" + question + question);
     // After a confirmed cancel, Ctrl+C ends the program again.
-    struct sigaction after = {};
     sigaction(SIGINT, nullptr, &after);
     EXPECT_EQ(after.sa_handler, before.sa_handler);
+    quitRequested = false;  // process-wide: the LZMA tests run after this one
 }
 
-TEST_F(Console, LanguageQuestion) {
-    struct Case {
+TEST(ConsoleFrontEnd, LanguageQuestion) {
+    const struct {
         const char* answers;
-        bool confirmed;
-        std::string name;
+        const char* chosen;  // null: cancelled
+    } cases[] = {
+        {"\n", "English"},  // the current one
+        {" german \n", "German"},
+        {"0\n9\nKlingon\n2\n", "French"},  // asked again until the answer names a language
+        {"", nullptr},
     };
-    const Case cases[] = {
-        {"\n", true, "English"},
-        {"6\n", true, "Polish"},
-        {" german \n", true, "German"},
-        {"9\nKlingon\n2\n", true, "French"},
-        {"", false, ""},
-        {"0\n", false, ""},
-    };
-    for (const Case& c : cases) {
-        std::istringstream answers(c.answers);
-        std::ostringstream shown;
-        StreamSwap input(std::cin, answers.rdbuf());
-        StreamSwap output(std::cerr, shown.rdbuf());
-        LanguageDialog dialog;
+    for (const auto& c : cases) {
+        Console console(false, c.answers);
         std::string name;
-        EXPECT_EQ(dialog.Run(name), c.confirmed) << c.answers;
-        EXPECT_EQ(name, c.name) << c.answers;
-        EXPECT_NE(shown.str().find("1) English (current)\n"), std::string::npos) << shown.str();
+        EXPECT_EQ(LanguageDialog().Run(name), c.chosen != nullptr) << c.answers;
+        EXPECT_EQ(name, c.chosen != nullptr ? c.chosen : "") << c.answers;
+        EXPECT_NE(console.Shown().find("  1) English (current)\n"), std::string::npos);
     }
 }
 
