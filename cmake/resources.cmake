@@ -47,8 +47,16 @@ function(ironvale_resource_library name)
   if(WIN32)
     add_library(${name} OBJECT "${IRONVALE_RC_FILE}")
     if(key)
-      target_compile_definitions(${name} PRIVATE "IRONVALE_PUBLIC_KEY_FILE=\"${key}\"")
-      set_property(SOURCE "${IRONVALE_RC_FILE}" APPEND PROPERTY OBJECT_DEPENDS "${key}")
+      # windres loses the quotes of a file name passed in a definition, so
+      # the key is copied to a fixed name in a folder of this library.
+      set(key_dir "${CMAKE_CURRENT_BINARY_DIR}/${name}")
+      add_custom_command(
+        OUTPUT "${key_dir}/public_key.pem"
+        COMMAND ${CMAKE_COMMAND} -E copy "${key}" "${key_dir}/public_key.pem"
+        DEPENDS "${key}")
+      set_property(SOURCE "${IRONVALE_RC_FILE}" APPEND PROPERTY OBJECT_DEPENDS "${key_dir}/public_key.pem")
+      target_compile_definitions(${name} PRIVATE IRONVALE_PUBLIC_KEY)
+      target_include_directories(${name} BEFORE PRIVATE "${key_dir}")
     endif()
   else()
     set(embedded "${CMAKE_CURRENT_BINARY_DIR}/resources/${name}.cpp")
