@@ -2,6 +2,7 @@
 // and which of three roads leads from one to the other (resume an
 // interrupted patch, patch, or reinstall the complete build), with the
 // complete build offered when the patch does not fit the installation.
+#include <cstdint>
 #include <sstream>
 
 #include "app/temporary_files.h"
@@ -181,14 +182,17 @@ void Updater::OfferCompleteBuild(const Exception& failure) {
         if (error.Code() == ErrorCode::BuildNotFound) throw failure;
         throw;
     }
+    // An unsigned description may declare any sizes: the sum saturates.
     int64_t size = 0;
-    for (const auto& archive : patchInfo.GetDeclaredArchives()) size += archive.second.size;
+    for (const auto& archive : patchInfo.GetDeclaredArchives()) {
+        size = archive.second.size > INT64_MAX - size ? INT64_MAX : size + archive.second.size;
+    }
     std::wstring text =
         Localize("INSTALLER_REPAIR_FILES_CHANGED") + L"\n\n" + Localize("INSTALLER_REPAIR_DOWNLOAD_BUILD");
     if (size > 0) {
         std::wstring line = Localize("INSTALLER_REPAIR_DOWNLOAD_SIZE");
         const size_t at = line.find(L"%d");
-        if (at != std::wstring::npos) line.replace(at, 2, std::to_wstring((size + 999999) / 1000000));
+        if (at != std::wstring::npos) line.replace(at, 2, std::to_wstring(size / 1000000 + (size % 1000000 != 0)));
         text += L"\n" + line;
     }
     if (!gui.AskYesNo(text)) {
