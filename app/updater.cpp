@@ -1,6 +1,7 @@
 #include "app/updater.h"
 
 #include "app/overall_progress.h"
+#include "app/publisher_key.h"
 #include "app/temporary_files.h"
 #include "base/encoding.h"
 #include "base/exception.h"
@@ -18,7 +19,7 @@ const char* const kLogSource = "Updater";
 
 }  // namespace
 
-Updater::Updater(const std::string& updateLocation) {
+Updater::Updater(const std::string& updateLocation) : publisherKey(BuiltInPublisherKey()) {
     applier.SetRetryQuestion(&retryBox);
     configuration.SetDefaults(updateLocation);
 }

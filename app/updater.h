@@ -62,6 +62,16 @@ private:
     bool InstallationNeedsUninstall();
     void CheckLatestVersion(bool installed);
     void DownloadPatchInfo(const std::string& location, const std::string& folder);
+    // Through the run's downloader; false when the file did not arrive.
+    bool FetchOne(const DownloadEntry& entry);
+    void CheckDescriptionSignature(const std::string& location);
+    void CheckDescriptionContent();
+    void FetchBuildDescription();
+    void PrepareReinstall();
+    // Asks whether to take the complete build instead of a patch that does
+    // not fit the installation; throws unless the player says Yes.
+    void OfferCompleteBuild(const Exception& failure);
+    void RunStageOne(bool installed);
     void StageOne(bool installed);
     void StageTwo(bool installed);
     bool CheckDiskSpace(const std::string& folder, const std::wstring& message, bool quiet);
@@ -95,6 +105,8 @@ private:
     std::string displayName;
     std::string webSiteHostName;
     UpdaterArguments arguments;
+    // PEM; empty when descriptions need no signature.
+    const std::string publisherKey;
 
     // The two stages of the batch of the current pass (a new one each pass,
     // so a resumed batch does not count as prepared).

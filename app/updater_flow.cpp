@@ -1,6 +1,8 @@
 // The update flow: which version is installed and which is the latest,
 // and which of three roads leads from one to the other (resume an
-// interrupted patch, patch, or reinstall the complete build).
+// interrupted patch, patch, or reinstall the complete build), with the
+// complete build offered when the patch does not fit the installation.
+#include <cstdint>
 #include <sstream>
 
 #include "app/temporary_files.h"
@@ -92,21 +94,8 @@ void Updater::RunUpdate() {
         }
         if (reinstall && !resuming) {
             gui.SetStatusText(Localize("INSTALLER_REINSTALLING_STATUS"));
-            patchUrl = JoinLocation(configuration.GetCompleteInstallUrl(), BuildName(latestVersion));
-            try {
-                DownloadPatchInfo(patchUrl, "");
-            } catch (const Exception& error) {
-                if (error.Code() == ErrorCode::PatchNotFound) {
-                    throw Exception("Could not find build.", ErrorCode::BuildNotFound);
-                }
-                throw;
-            }
-            patchDir = PathJoin(installDir, configuration.GetPatchInstallPath());
-            patchedDir = PathJoin(patchDir, configuration.GetPatchedFilesPath());
-            progressFile.SetDirectory(installDir);
-            RemoveFile(progressFile.GetRecordPath());
-            RemoveFile(progressFile.GetAlternativeRecordPath());
-            installationData.SetDirectory(installDir);
+            FetchBuildDescription();
+            PrepareReinstall();
         }
 
         LOG_AS("Updater", Info) << "Patch URL:" << patchUrl;
@@ -115,19 +104,17 @@ void Updater::RunUpdate() {
             patchInfo.Load(patchInfoPath);
             StageTwo(installed);
         } else {
-            CleanTemporaryFiles(patchDir, patchedDir);
-            MakeDirectories(patchDir);
-            MakeDirectories(patchedDir);
-            if (patchInfoPath.empty()) {
-                DownloadPatchInfo(patchUrl, patchDir);
-            } else {
-                // The reinstall road fetched the description into the
-                // temporary folder, before the work folders existed.
-                const std::string moved = PathJoin(patchDir, configuration.GetPatchInfoFilename());
-                MoveFileReplacing(patchInfoPath, moved);
-                patchInfoPath = moved;
+            try {
+                RunStageOne(installed);
+            } catch (const Exception& error) {
+                if (reinstall || error.Code() != ErrorCode::DeltaFailed) throw;
+                OfferCompleteBuild(error);
+                reinstall = true;
+                PrepareReinstall();
+                stages.emplace(patchInfo, progressFile, applier);
+                LOG_AS("Updater", Info) << "Patch URL:" << patchUrl;
+                RunStageOne(installed);
             }
-            StageOne(installed);
             // A cancel confirmed while stage one finished must not let
             // stage two begin.
             if (cancelled)
@@ -139,6 +126,79 @@ void Updater::RunUpdate() {
         // A resumed patch may not have reached the newest version.
         if (!resuming) return;
     }
+}
+
+void Updater::FetchBuildDescription() {
+    patchUrl = JoinLocation(configuration.GetCompleteInstallUrl(), BuildName(latestVersion));
+    try {
+        DownloadPatchInfo(patchUrl, "");
+    } catch (const Exception& error) {
+        if (error.Code() == ErrorCode::PatchNotFound)
+            throw Exception("Could not find build.", ErrorCode::BuildNotFound);
+        throw;
+    }
+}
+
+// The build replaces every file, so no record of an earlier batch may be
+// resumed over it.
+void Updater::PrepareReinstall() {
+    patchDir = PathJoin(installDir, configuration.GetPatchInstallPath());
+    patchedDir = PathJoin(patchDir, configuration.GetPatchedFilesPath());
+    progressFile.SetDirectory(installDir);
+    RemoveFile(progressFile.GetRecordPath());
+    RemoveFile(progressFile.GetAlternativeRecordPath());
+    installationData.SetDirectory(installDir);
+}
+
+void Updater::RunStageOne(bool installed) {
+    CleanTemporaryFiles(patchDir, patchedDir);
+    MakeDirectories(patchDir);
+    MakeDirectories(patchedDir);
+    if (patchInfoPath.empty()) {
+        DownloadPatchInfo(patchUrl, patchDir);
+    } else {
+        // The reinstall road fetched the description into the temporary
+        // folder, before the work folders existed.
+        const std::string moved = PathJoin(patchDir, configuration.GetPatchInfoFilename());
+        MoveFileReplacing(patchInfoPath, moved);
+        patchInfoPath = moved;
+    }
+    StageOne(installed);
+}
+
+// Stage one stopped at an installed file that no longer fits its delta (the
+// player or a tool changed it). Nothing is installed yet, and the complete
+// build still leads to the latest version without the player having to
+// reinstall by hand.
+void Updater::OfferCompleteBuild(const Exception& failure) {
+    LOG_AS("Updater", Error) << failure.message;
+    downloader.RequestStop();
+    downloader.WaitForWorker();
+    CleanTemporaryFiles(patchDir, patchedDir);
+    try {
+        FetchBuildDescription();
+    } catch (const Exception& error) {
+        // Without a complete build there is nothing to offer.
+        if (error.Code() == ErrorCode::BuildNotFound) throw failure;
+        throw;
+    }
+    // An unsigned description may declare any sizes: the sum saturates.
+    int64_t size = 0;
+    for (const auto& archive : patchInfo.GetDeclaredArchives()) {
+        size = archive.second.size > INT64_MAX - size ? INT64_MAX : size + archive.second.size;
+    }
+    std::wstring text =
+        Localize("INSTALLER_REPAIR_FILES_CHANGED") + L"\n\n" + Localize("INSTALLER_REPAIR_DOWNLOAD_BUILD");
+    if (size > 0) {
+        std::wstring line = Localize("INSTALLER_REPAIR_DOWNLOAD_SIZE");
+        const size_t at = line.find(L"%d");
+        if (at != std::wstring::npos) line.replace(at, 2, std::to_wstring(size / 1000000 + (size % 1000000 != 0)));
+        text += L"\n" + line;
+    }
+    if (!gui.AskYesNo(text)) {
+        throw Exception("The complete build was declined. " + failure.message, ErrorCode::CorruptData);
+    }
+    gui.SetStatusText(Localize("INSTALLER_REINSTALLING_STATUS"));
 }
 
 bool Updater::InstallationNeedsUninstall() {

@@ -61,8 +61,18 @@ bool Updater::CheckDiskSpace(const std::string& folder, const std::wstring& mess
     return false;
 }
 
+// Each archive the description declares must arrive as declared.
 std::list<DownloadEntry> Updater::BuildDownloadList() {
-    return MakeDownloadList(ArchivesInFetchOrder(patchInfo), patchUrl, patchDir);
+    const std::vector<std::string> names = ArchivesInFetchOrder(patchInfo);
+    std::list<DownloadEntry> list = MakeDownloadList(names, patchUrl, patchDir);
+    auto name = names.begin();
+    for (DownloadEntry& entry : list) {
+        const auto declared = patchInfo.GetDeclaredArchives().find(*name++);
+        if (declared == patchInfo.GetDeclaredArchives().end()) continue;
+        entry.declaredSize = declared->second.size;
+        entry.declaredSha256 = declared->second.sha256;
+    }
+    return list;
 }
 
 PatchBatch Updater::CurrentBatch() const {

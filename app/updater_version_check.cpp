@@ -1,5 +1,5 @@
 // Which version is the latest, and fetching the description of the patch
-// or build that leads to it.
+// or build that leads to it, checked before anything of it is used.
 #include <algorithm>
 #include <chrono>
 #include <thread>
@@ -11,6 +11,8 @@
 #include "base/file_stream.h"
 #include "base/paths.h"
 #include "net/location.h"
+#include "net/signature_check.h"
+#include "patch/patch_stages.h"
 #include "text/localization.h"
 
 namespace {
@@ -64,13 +66,55 @@ void Updater::CheckLatestVersion(bool installed) {
 }
 
 void Updater::DownloadPatchInfo(const std::string& location, const std::string& folder) {
-    patchInfoPath = PathJoin(folder.empty() ? GetTempDirectory() : folder, configuration.GetPatchInfoFilename());
-    downloader.SetStatusView(nullptr);
-    downloader.Download(JoinLocation(location, configuration.GetPatchInfoFilename()), patchInfoPath, true);
-    if (!downloader.WaitForWorker() || downloader.Entries().front().status != DownloadStatus::Done) {
-        if (cancelled)
-            throw Exception("User cancelled while fetching the patch description.", ErrorCode::UserCancelled);
+    const std::string name = configuration.GetPatchInfoFilename();
+    patchInfoPath = PathJoin(folder.empty() ? GetTempDirectory() : folder, name);
+    if (!FetchOne(DownloadEntry(JoinLocation(location, name), patchInfoPath))) {
         throw Exception("Failed to download patch info file.", ErrorCode::PatchNotFound);
     }
+    // Not one element of an unsigned description is read when a signature
+    // is required.
+    if (!publisherKey.empty()) CheckDescriptionSignature(location);
     patchInfo.Load(patchInfoPath);
+    CheckDescriptionContent();
+}
+
+bool Updater::FetchOne(const DownloadEntry& entry) {
+    downloader.SetStatusView(nullptr);
+    downloader.Start({entry}, true);
+    if (downloader.WaitForWorker() && downloader.Entries().front().status == DownloadStatus::Done) return true;
+    if (cancelled) throw Exception("User cancelled while fetching the patch description.", ErrorCode::UserCancelled);
+    return false;
+}
+
+void Updater::CheckDescriptionSignature(const std::string& location) {
+    const std::string name = configuration.GetPatchInfoFilename() + ".sig";
+    const std::string signaturePath = patchInfoPath + ".sig";
+    try {
+        if (!FetchOne(DownloadEntry(JoinLocation(location, name), signaturePath))) {
+            throw Exception("The patch description's signature could not be downloaded.", ErrorCode::CorruptData);
+        }
+        CheckFileSignature(patchInfoPath, signaturePath, publisherKey);
+    } catch (const Exception&) {
+        RemoveFile(signaturePath);
+        throw;
+    }
+    RemoveFile(signaturePath);
+}
+
+// What a signature cannot say by itself: that the description is the one
+// asked for, not an older one replayed, and that it vouches for every
+// archive it names.
+void Updater::CheckDescriptionContent() {
+    const std::string& leadsTo = patchInfo.GetVersion();
+    if (leadsTo.empty() ? !publisherKey.empty() : leadsTo != latestVersion) {
+        throw Exception("The patch description leads to version \"" + leadsTo + "\", not to " + latestVersion + ".",
+                        ErrorCode::CorruptData);
+    }
+    if (publisherKey.empty()) return;
+    for (const std::string& archive : ArchivesInFetchOrder(patchInfo)) {
+        if (patchInfo.GetDeclaredArchives().count(archive) == 0) {
+            throw Exception("The signed patch description declares no size and SHA-256 for " + archive + ".",
+                            ErrorCode::CorruptData);
+        }
+    }
 }

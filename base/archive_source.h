@@ -5,7 +5,12 @@
 // How the patch applier waits for an archive that another component
 // fetches (the downloader, on its own thread), so that unpacking can start
 // on the first archive while later ones are still arriving.
-enum class ArchiveState { Arrived, Cancelled, Failed };
+enum class ArchiveState {
+    Arrived,
+    Cancelled,
+    Failed,
+    Corrupt,  // arrived, but not as the patch description declared it
+};
 
 class IArchiveSource {
 public:

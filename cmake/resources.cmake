@@ -10,11 +10,8 @@ add_custom_command(
           "${PROJECT_SOURCE_DIR}/resources/strings.tsv" "${IRONVALE_STRING_TABLE}"
   DEPENDS "${PROJECT_SOURCE_DIR}/resources/strings.tsv" "${PROJECT_SOURCE_DIR}/cmake/make_string_table.py"
   COMMENT "Building the string table")
-
-# name type file, for every resource the program reads by name on both
-# platforms. The pictures, the font and the dialog serve only the window of
-# the Windows program and go into its .rc alone.
-set(IRONVALE_NAMED_RESOURCES IDS_STRINGS CSV "${IRONVALE_STRING_TABLE}")
+# Resource libraries of other folders wait for the table through this.
+add_custom_target(ironvale_string_table DEPENDS "${IRONVALE_STRING_TABLE}")
 
 if(WIN32)
   enable_language(RC)
@@ -33,23 +30,69 @@ if(WIN32)
     OBJECT_DEPENDS "${IRONVALE_STRING_TABLE};${PROJECT_SOURCE_DIR}/resources/ironvale.ico;${PROJECT_SOURCE_DIR}/resources/IronvaleUpdater.manifest;${PROJECT_SOURCE_DIR}/resources/resource_ids.h;${embedded_font};${pictures}")
   # windres finds the generated table through the include path.
   set(CMAKE_RC_FLAGS "${CMAKE_RC_FLAGS} -I${CMAKE_CURRENT_BINARY_DIR}/resources -I${PROJECT_SOURCE_DIR}/resources")
-  add_library(ironvale_resources OBJECT "${IRONVALE_RC_FILE}")
+endif()
+
+# ironvale_resource_library(NAME [PUBLIC_KEY_PEM]): the resources as an
+# object library. Every resource the program reads by name on both
+# platforms is listed here as name, type, file; the pictures, the font and
+# the dialog serve only the window of the Windows program and go into its
+# .rc alone. With a key file, the publisher's public key goes in as
+# IDR_PUBLIC_KEY, and the program then requires signed descriptions.
+function(ironvale_resource_library name)
+  set(key "${ARGV1}")
+  set(named IDS_STRINGS CSV "${IRONVALE_STRING_TABLE}")
+  if(key)
+    list(APPEND named IDR_PUBLIC_KEY PEM "${key}")
+  endif()
+  if(WIN32)
+    add_library(${name} OBJECT "${IRONVALE_RC_FILE}")
+    if(key)
+      # windres loses the quotes of a file name passed in a definition, so
+      # the key is copied to a fixed name in a folder of this library.
+      set(key_dir "${CMAKE_CURRENT_BINARY_DIR}/${name}")
+      add_custom_command(
+        OUTPUT "${key_dir}/public_key.pem"
+        COMMAND ${CMAKE_COMMAND} -E copy "${key}" "${key_dir}/public_key.pem"
+        DEPENDS "${key}")
+      set_property(SOURCE "${IRONVALE_RC_FILE}" APPEND PROPERTY OBJECT_DEPENDS "${key_dir}/public_key.pem")
+      target_compile_definitions(${name} PRIVATE IRONVALE_PUBLIC_KEY)
+      target_include_directories(${name} BEFORE PRIVATE "${key_dir}")
+    endif()
+  else()
+    set(embedded "${CMAKE_CURRENT_BINARY_DIR}/resources/${name}.cpp")
+    set(files)
+    list(LENGTH named count)
+    math(EXPR last "${count} - 1")
+    foreach(index RANGE 2 ${last} 3)
+      list(GET named ${index} file)
+      list(APPEND files "${file}")
+    endforeach()
+    add_custom_command(
+      OUTPUT "${embedded}"
+      COMMAND ${CMAKE_COMMAND} -E make_directory "${CMAKE_CURRENT_BINARY_DIR}/resources"
+      COMMAND Python3::Interpreter "${PROJECT_SOURCE_DIR}/cmake/embed_resources.py" "${embedded}" ${named}
+      DEPENDS ${files} "${PROJECT_SOURCE_DIR}/cmake/embed_resources.py"
+      COMMENT "Embedding resources")
+    add_library(${name} OBJECT "${embedded}")
+    target_include_directories(${name} PRIVATE "${PROJECT_SOURCE_DIR}")
+  endif()
+  add_dependencies(${name} ironvale_string_table)
+endfunction()
+
+# Every program but the product itself is built without a publisher key,
+# so the tests' own servers need not sign.
+ironvale_resource_library(ironvale_resources)
+if(IRONVALE_PUBLIC_KEY)
+  if(NOT EXISTS "${IRONVALE_PUBLIC_KEY}")
+    message(FATAL_ERROR "IRONVALE_PUBLIC_KEY: no file ${IRONVALE_PUBLIC_KEY} (make one with ironvale-patch keygen)")
+  endif()
+  file(READ "${IRONVALE_PUBLIC_KEY}" public_key_text)
+  if(NOT public_key_text MATCHES "-----BEGIN PUBLIC KEY-----")
+    message(FATAL_ERROR "IRONVALE_PUBLIC_KEY: ${IRONVALE_PUBLIC_KEY} holds no PEM public key")
+  endif()
+  ironvale_resource_library(ironvale_product_resources "${IRONVALE_PUBLIC_KEY}")
 else()
-  set(embedded "${CMAKE_CURRENT_BINARY_DIR}/resources/embedded_resources.cpp")
-  set(files)
-  list(LENGTH IRONVALE_NAMED_RESOURCES count)
-  math(EXPR last "${count} - 1")
-  foreach(index RANGE 2 ${last} 3)
-    list(GET IRONVALE_NAMED_RESOURCES ${index} file)
-    list(APPEND files "${file}")
-  endforeach()
-  add_custom_command(
-    OUTPUT "${embedded}"
-    COMMAND Python3::Interpreter "${PROJECT_SOURCE_DIR}/cmake/embed_resources.py" "${embedded}" ${IRONVALE_NAMED_RESOURCES}
-    DEPENDS ${files} "${PROJECT_SOURCE_DIR}/cmake/embed_resources.py"
-    COMMENT "Embedding resources")
-  add_library(ironvale_resources OBJECT "${embedded}")
-  target_include_directories(ironvale_resources PRIVATE "${PROJECT_SOURCE_DIR}")
+  add_library(ironvale_product_resources ALIAS ironvale_resources)
 endif()
 
 # Resources are found by name at run time, never referenced by a symbol, so

@@ -14,6 +14,7 @@ enum class DownloadStatus : int32_t {
     Cancelled = 3,    // a stop request ended the transfer
     NotFound = 4,     // the server answered 404
     Unsupported = 5,  // an absolute local path, which is not accepted as a location
+    Corrupt = 6,      // arrived twice, and twice not as the publisher declared it (size or SHA-256)
 };
 
 // One file of a download list. The worker writes the status while the
@@ -23,16 +24,27 @@ struct DownloadEntry {
     DownloadEntry(std::string sourceUrl, std::string destination)
         : url(std::move(sourceUrl)), localPath(std::move(destination)) {}
     DownloadEntry(const DownloadEntry& other)
-        : url(other.url), localPath(other.localPath), status(other.status.load()) {}
+        : url(other.url),
+          localPath(other.localPath),
+          declaredSize(other.declaredSize),
+          declaredSha256(other.declaredSha256),
+          status(other.status.load()) {}
     DownloadEntry& operator=(const DownloadEntry& other) {
         url = other.url;
         localPath = other.localPath;
+        declaredSize = other.declaredSize;
+        declaredSha256 = other.declaredSha256;
         status = other.status.load();
         return *this;
     }
 
     std::string url;
     std::string localPath;
+    // What the publisher declared for the file, when it did: a transfer
+    // that runs past the size stops (Failed); a file that arrives with
+    // another size or SHA-256 is fetched once more, then given up (Corrupt).
+    int64_t declaredSize = -1;   // -1: not declared
+    std::string declaredSha256;  // 64 lower-case hexadecimal digits; empty: not declared
     std::atomic<DownloadStatus> status{DownloadStatus::Pending};
 };
 

@@ -3,11 +3,13 @@
 #include <chrono>
 
 #include "base/exception.h"
+#include "base/file_operations.h"
 #include "base/log.h"
 #include "base/paths.h"
 #include "net/file_copy.h"
 #include "net/http_transfer.h"
 #include "net/location.h"
+#include "net/sha256.h"
 #include "net/sign_url.h"
 
 HttpDownloader::~HttpDownloader() {
@@ -89,6 +91,8 @@ ArchiveState HttpDownloader::WaitForArchive(const std::string& fileName) {
             return ArchiveState::Arrived;
         case DownloadStatus::Cancelled:
             return ArchiveState::Cancelled;
+        case DownloadStatus::Corrupt:
+            return ArchiveState::Corrupt;
         default:
             return ArchiveState::Failed;
     }
@@ -97,7 +101,7 @@ ArchiveState HttpDownloader::WaitForArchive(const std::string& fileName) {
 void HttpDownloader::Run() {
     for (DownloadEntry& entry : entries) {
         if (stopRequested) break;
-        Fetch(entry);
+        entry.status = FetchChecked(entry);
         wakeEvent.Signal();
         if (entry.status != DownloadStatus::Done) break;
     }
@@ -109,23 +113,60 @@ void HttpDownloader::Run() {
     wakeEvent.Signal();
 }
 
-void HttpDownloader::Fetch(DownloadEntry& entry) {
+DownloadStatus HttpDownloader::FetchChecked(DownloadEntry& entry) {
+    const std::string source = entry.url;  // a relative one is resolved by the first fetch
+    DownloadStatus status = Fetch(entry);
+    if (status != DownloadStatus::Done) return status;
+    status = Check(entry);
+    if (status != DownloadStatus::Corrupt) return status;
+    // Damaged on the way (a flaky proxy, a cache holding a cut-off copy):
+    // one more try from the source, then the file is given up.
+    LOG(Error) << "Fetching " << source << " once more.";
+    entry.url = source;
+    status = Fetch(entry);
+    if (status == DownloadStatus::Done) status = Check(entry);
+    return status;
+}
+
+DownloadStatus HttpDownloader::Fetch(DownloadEntry& entry) {
     LOG(Trace) << "Downloading file: " << entry.url;
     switch (ClassifyLocation(entry.url)) {
         case LocationKind::Http:
-            entry.status =
-                HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry.localPath, stopRequested, statusView);
-            break;
+            return HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry.localPath, entry.declaredSize,
+                                stopRequested, statusView);
         case LocationKind::Relative:
             entry.url = PathJoin(GetProgramFolder(), entry.url);
-            entry.status = FileCopyTransfer(entry.url, entry.localPath, stopRequested, statusView);
-            break;
+            return FileCopyTransfer(entry.url, entry.localPath, stopRequested, statusView);
         case LocationKind::FileCopy:
-            entry.status = FileCopyTransfer(entry.url, entry.localPath, stopRequested, statusView);
-            break;
+            return FileCopyTransfer(entry.url, entry.localPath, stopRequested, statusView);
         case LocationKind::Unsupported:
-            LOG(Error) << "Download error, protocol not supported. URL: " << entry.url;
-            entry.status = DownloadStatus::Unsupported;
             break;
     }
+    LOG(Error) << "Download error, protocol not supported. URL: " << entry.url;
+    return DownloadStatus::Unsupported;
+}
+
+DownloadStatus HttpDownloader::Check(const DownloadEntry& entry) {
+    if (entry.declaredSize < 0 && entry.declaredSha256.empty()) return DownloadStatus::Done;
+    Sha256Digest digest{};
+    int64_t length = 0;
+    const bool hashed = Sha256OfFile(entry.localPath, stopRequested, digest, length);
+    DownloadStatus status = DownloadStatus::Corrupt;
+    if (stopRequested) {
+        status = DownloadStatus::Cancelled;
+    } else if (!hashed) {
+        LOG(Error) << "Cannot read " << entry.localPath << " to check it.";
+    } else if (entry.declaredSize >= 0 && length != entry.declaredSize) {
+        LOG(Error) << entry.url << " arrived with " << length << " bytes, not the declared " << entry.declaredSize
+                   << ".";
+    } else if (!entry.declaredSha256.empty() && HexDigits(digest.data(), digest.size()) != entry.declaredSha256) {
+        LOG(Error) << entry.url << " arrived with the SHA-256 " << HexDigits(digest.data(), digest.size())
+                   << ", not the declared " << entry.declaredSha256 << ".";
+    } else {
+        status = DownloadStatus::Done;
+    }
+    // Only a file that matches stays: nothing may take a damaged one for
+    // the real thing.
+    if (status != DownloadStatus::Done) RemoveFile(entry.localPath);
+    return status;
 }

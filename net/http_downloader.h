@@ -16,6 +16,8 @@
 // caller can work on each file as soon as it has arrived. A location is an
 // "http://" address, a "file://" address, a UNC path or a path relative to
 // the program's folder. The first file that does not arrive ends the list.
+// A file is reported only once it is checked against what its entry
+// declares (size, SHA-256).
 class HttpDownloader : public IArchiveSource {
 public:
     HttpDownloader() = default;
@@ -58,7 +60,13 @@ public:
 
 private:
     void Run();
-    void Fetch(DownloadEntry& entry);
+    // The entry's final outcome: fetched, checked, and fetched once more
+    // when it does not match its declaration.
+    DownloadStatus FetchChecked(DownloadEntry& entry);
+    DownloadStatus Fetch(DownloadEntry& entry);
+    // Done when the file at the entry's path matches what the entry
+    // declares, Corrupt when it does not, Cancelled on a stop.
+    DownloadStatus Check(const DownloadEntry& entry);
     bool WorkerEnded();
 
     bool signUrls = false;

@@ -4,6 +4,7 @@
 
 #include "base/exception.h"
 #include "base/file_stream.h"
+#include "base/log.h"
 #include "net/http_transport.h"
 
 namespace {
@@ -13,8 +14,8 @@ const uint32_t kAssumedLength = 1048576;
 
 class FileSink final : public HttpResponseSink {
 public:
-    FileSink(const std::string& path, const std::atomic<bool>& stop, IStatusView* view)
-        : localPath(path), stopRequested(stop), statusView(view) {}
+    FileSink(const std::string& path, int64_t limit, const std::atomic<bool>& stop, IStatusView* view)
+        : localPath(path), sizeLimit(limit), stopRequested(stop), statusView(view) {}
 
     bool OnResponse(const std::string& statusText, bool lengthKnown, uint32_t contentLength) override {
         // A status that cannot be read is taken as success.
@@ -23,6 +24,7 @@ public:
             return false;
         }
         if (!statusText.empty() && statusText != "200") return false;
+        if (lengthKnown && RunsPastLimit(contentLength)) return false;
         hasLength = lengthKnown;
         expected = lengthKnown ? contentLength : kAssumedLength;
         try {
@@ -37,6 +39,8 @@ public:
     bool KeepReading() override { return !stopRequested; }
 
     bool OnData(const char* data, uint32_t size) override {
+        // Not one byte past what the publisher declared reaches the disk.
+        if (RunsPastLimit(received + size)) return false;
         received += size;
         Report();
         try {
@@ -54,6 +58,12 @@ public:
     void CloseFile() { file.Close(); }
 
 private:
+    bool RunsPastLimit(uint64_t length) const {
+        if (sizeLimit < 0 || length <= static_cast<uint64_t>(sizeLimit)) return false;
+        LOG(Error) << "The transfer to " << localPath << " runs past the declared " << sizeLimit << " bytes.";
+        return true;
+    }
+
     void Report() {
         if (statusView != nullptr) {
             statusView->OnFileProgress(localPath, static_cast<uint32_t>(received), expected);
@@ -61,6 +71,7 @@ private:
     }
 
     const std::string& localPath;
+    const int64_t sizeLimit;
     const std::atomic<bool>& stopRequested;
     IStatusView* statusView;
     FileStream file;
@@ -72,9 +83,9 @@ private:
 
 }  // namespace
 
-DownloadStatus HttpTransfer(const std::string& address, const std::string& localPath,
+DownloadStatus HttpTransfer(const std::string& address, const std::string& localPath, int64_t sizeLimit,
                             const std::atomic<bool>& stopRequested, IStatusView* statusView) {
-    FileSink sink(localPath, stopRequested, statusView);
+    FileSink sink(localPath, sizeLimit, stopRequested, statusView);
     DownloadStatus status = DownloadStatus::Failed;
     switch (HttpGet(address, sink)) {
         case HttpOutcome::NoSession:

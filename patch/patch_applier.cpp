@@ -77,6 +77,9 @@ void PatchApplier::WaitForArchive(const std::string& archiveName) const {
             return;
         case ArchiveState::Cancelled:
             throw Exception("", ErrorCode::UserCancelled);
+        case ArchiveState::Corrupt:
+            throw Exception("The patch archive " + archiveName + " does not match its size or SHA-256.",
+                            ErrorCode::CorruptData);
         case ArchiveState::Failed:
             break;
     }

@@ -35,6 +35,25 @@ std::string AttributeOrEmpty(const TiXmlElement* element, const char* name) {
     return value == nullptr ? std::string() : std::string(value);
 }
 
+[[noreturn]] void RefuseArchiveList(const std::string& detail) {
+    throw Exception("Invalid archive list in patch info file: " + detail, ErrorCode::CorruptData);
+}
+
+// A byte count in plain decimal digits: no sign, no blanks, and short
+// enough for a signed 64-bit number.
+bool ParseByteCount(const std::string& text, int64_t& value) {
+    if (text.empty() || text.size() > 18 || text.find_first_not_of("0123456789") != std::string::npos) return false;
+    value = std::stoll(text);
+    return true;
+}
+
+bool ParseSha256(std::string text, std::string& hex) {
+    if (text.size() != 64 || text.find_first_not_of("0123456789abcdefABCDEF") != std::string::npos) return false;
+    for (char& c : text) c = static_cast<char>(c >= 'A' && c <= 'F' ? c - 'A' + 'a' : c);
+    hex = text;
+    return true;
+}
+
 void AppendList(TiXmlElement& root, const char* name, const std::vector<std::string>& paths) {
     TiXmlNode* list = root.InsertEndChild(TiXmlElement(name));
     TiXmlElement item("new");
@@ -52,6 +71,8 @@ void PatchInfoFile::Load(const std::string& path) {
     hive = RegistryHive::LocalMachine;
     registryPath.clear();
     spaceRequirement = -1;
+    version.clear();
+    declaredArchives.clear();
 
     if (!LoadXmlFile(path, document)) throw Exception("Failed to load patch info file.");
     root = document.RootElement();
@@ -63,6 +84,25 @@ void PatchInfoFile::Load(const std::string& path) {
         std::istringstream number(text);
         int64_t value = 0;
         if (number >> value) spaceRequirement = value;
+    }
+    if (ReadElementText(root, "Version", text)) version = text;
+    ReadDeclaredArchives();
+}
+
+// Declared archives are what a damaged or substituted download is judged
+// by, so a list that cannot be read whole is refused, not partly used.
+void PatchInfoFile::ReadDeclaredArchives() {
+    const TiXmlElement* list = root->FirstChildElement("Archives");
+    for (const TiXmlElement* item = list == nullptr ? nullptr : list->FirstChildElement("archive"); item != nullptr;
+         item = item->NextSiblingElement("archive")) {
+        const std::string name = AttributeOrEmpty(item, "File");
+        DeclaredArchive archive;
+        if (name.empty()) RefuseArchiveList("an archive without a name");
+        if (!ParseByteCount(AttributeOrEmpty(item, "Size"), archive.size)) RefuseArchiveList("the size of " + name);
+        if (!ParseSha256(AttributeOrEmpty(item, "Sha256"), archive.sha256)) {
+            RefuseArchiveList("the SHA-256 of " + name);
+        }
+        if (!declaredArchives.emplace(name, archive).second) RefuseArchiveList(name + " is listed twice");
     }
 }
 

@@ -3,10 +3,17 @@
 #include <tinyxml.h>
 
 #include <cstdint>
+#include <map>
 #include <string>
 #include <vector>
 
 #include "base/registry_hive.h"
+
+// An archive as the description's "Archives" list declares it.
+struct DeclaredArchive {
+    int64_t size = 0;
+    std::string sha256;  // 64 lower-case hexadecimal digits
+};
 
 // The patch description ("patchinfo.xml"): which files a patch rebuilds
 // from deltas, adds or deletes, which directories, registry keys and
@@ -22,9 +29,12 @@ public:
     virtual ~PatchInfoFile() = default;
 
     // Parses the file and reads the hive, registry path and space
-    // requirement. Throws "Failed to load patch info file." when it cannot
-    // be read, and "Hive not recognized" for an unknown hive name. The
-    // cursors are left at their ends until ResetIterators.
+    // requirement, and the elements older readers skip: the version the
+    // patch leads to and the archives' sizes and SHA-256. Throws "Failed to
+    // load patch info file." when it cannot be read, "Hive not recognized"
+    // for an unknown hive name, and CorruptData for an archive list that
+    // is not well formed. The cursors are left at their ends until
+    // ResetIterators.
     void Load(const std::string& path);
     // Puts every cursor on the first item of its list.
     void ResetIterators();
@@ -47,6 +57,10 @@ public:
     std::string GetRegistryPath() const { return registryPath; }
     // Bytes the patch needs; -1 when the description does not say.
     int64_t GetSpaceRequirement() const { return spaceRequirement; }
+    // The version the patch leads to; empty when the description does not say.
+    const std::string& GetVersion() const { return version; }
+    // The declared archives by file name; empty without an "Archives" list.
+    const std::map<std::string, DeclaredArchive>& GetDeclaredArchives() const { return declaredArchives; }
 
     // Writes a description holding one "new" item per entry of each list,
     // then the hive and registry path. Throws "Hive not supported" for a
@@ -76,6 +90,7 @@ private:
     };
 
     bool Next(Cursor cursor, std::string& path, std::string* archive);
+    void ReadDeclaredArchives();
 
     TiXmlDocument document;
     const TiXmlElement* root = nullptr;
@@ -83,4 +98,6 @@ private:
     RegistryHive hive = RegistryHive::LocalMachine;
     std::string registryPath;
     int64_t spaceRequirement = -1;
+    std::string version;
+    std::map<std::string, DeclaredArchive> declaredArchives;
 };

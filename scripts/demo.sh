@@ -37,14 +37,27 @@ seq 1 3000 | sed 's/^/north row /' >"$demo/v2/data/levels/north/level4.map"
 echo "Ironvale version 2" >"$demo/v2/docs/readme.txt"
 rm -r "$demo/v2/data/old_voices" "$demo/v2/docs/changes_1.txt"
 
-echo "== ironvale-patch version, build (patch), build --complete"
+# A throw-away signing key, made on the first demo and kept beside the
+# builds (never in the repository). The program run below is built with its
+# public half and takes only descriptions signed with it.
+keys=$root/build/demo-keys
+[ -f "$keys/private.pem" ] || "$tool" keygen --out "$keys" >/dev/null
+cmake --preset native -DIRONVALE_PUBLIC_KEY="$keys/public.pem" >/dev/null
+if [ -x /usr/lib/wine/wine64 ] && command -v x86_64-w64-mingw32-g++-posix >/dev/null; then
+  cmake --preset windows -DIRONVALE_PUBLIC_KEY="$keys/public.pem" >/dev/null
+fi
+
+echo "== ironvale-patch version, build (patch), build --complete, both signed with $keys/private.pem"
 "$tool" version --out "$demo/server" 2
-"$tool" build --from "$demo/v1" --to "$demo/v2" --version 2 --out "$demo/server" --max-archive-size 100000
-"$tool" build --complete --to "$demo/v2" --version 2 --out "$demo/server"
+"$tool" build --from "$demo/v1" --to "$demo/v2" --version 2 --out "$demo/server" --max-archive-size 100000 \
+  --sign-key "$keys/private.pem"
+"$tool" build --complete --to "$demo/v2" --version 2 --out "$demo/server" --sign-key "$keys/private.pem"
 echo "== $demo/server"
 (cd "$demo/server" && find . -type f | sort | xargs ls -l | awk '{print $5, $9}')
 echo "== patch_515195_2/patchinfo.xml"
 cat "$demo/server/patch_515195_2/patchinfo.xml"
+echo "== ironvale-patch check (signature and archives, as the updater checks them)"
+"$tool" check "$demo/server/patch_515195_2" --public-key "$keys/public.pem"
 echo "== ironvale-patch verify (the patch on version 1, the complete build on an empty folder)"
 mkdir -p "$demo/empty"
 "$tool" verify "$demo/server/patch_515195_2" "$demo/v1" "$demo/v2"

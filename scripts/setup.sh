@@ -29,7 +29,7 @@ packages=(
   libtinyxml-dev lzma-dev zlib1g-dev libcurl4-openssl-dev libssl-dev
   googletest libgtest-dev libgmock-dev libbenchmark-dev
   clang libclang-rt-14-dev clang-format
-  xdelta3 xz-utils python3 nginx curl hyperfine time
+  xdelta3 xz-utils python3 nginx curl hyperfine time openssl
   dpkg-dev
 )
 

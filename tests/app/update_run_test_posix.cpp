@@ -7,7 +7,9 @@
 
 #include <chrono>
 #include <cstdlib>
+#include <functional>
 #include <random>
+#include <regex>
 #include <thread>
 
 #include "base/file_operations.h"
@@ -19,6 +21,7 @@
 #include "tests/support/console_run.h"
 #include "tests/support/http_test_server.h"
 #include "tools/publisher/patch_builder.h"
+#include "tools/publisher/signing_key.h"
 
 namespace {
 
@@ -81,18 +84,23 @@ protected:
     }
 
     // The patch from version from to version to and the complete build of
-    // to, with version.txt naming to.
-    std::string Publish(int from, int to) {
+    // to, with version.txt naming to; both signed with key when given.
+    std::string Publish(int from, int to, const P256PrivateKey* key = nullptr) {
+        return Publish(Version(from), Version(to), std::to_string(to), key);
+    }
+
+    std::string Publish(const Tree& from, const Tree& to, const std::string& version, const P256PrivateKey* key) {
         DeleteDirectory(temp / "old", true);
         DeleteDirectory(temp / "new", true);
-        WriteTree(temp / "old", Version(from));
-        WriteTree(temp / "new", Version(to));
+        WriteTree(temp / "old", from);
+        WriteTree(temp / "new", to);
         BuildOptions options;
         options.fromDir = temp / "old";
         options.toDir = temp / "new";
-        options.version = std::to_string(to);
+        options.version = version;
         options.outDir = temp / "server";
         options.maxArchiveSize = 4000;
+        options.signingKey = key;
         const std::string patch = BuildPatch(options);
         options.fromDir.clear();
         BuildPatch(options);
@@ -180,22 +188,134 @@ TEST_F(UpdateRun, EndsWithoutChangesWhenUpToDateDeclinedMissingOrBroken) {
         {"9 to 10", {"-latestVersion", "10"}, "n\n", "9", "Latest version: 10", false},
         {"missing, play", {"-latestVersion", "5"}, "y\ny\n", "1", "play the installed version instead", true},
         {"missing, quit", {"-latestVersion", "5"}, "y\nn\n", "1", "play the installed version instead", false},
-        {"installed file changed", {"-latestVersion", "2"}, "y\n", "1", "Failed to apply delta file", false},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         Install(old, c.installedVersion);
-        if (std::string(c.what) == "installed file changed") WriteTextFile(PathJoin(install, changed), "modded");
         RemoveFile(temp / "tmp/started.txt");
         const ConsoleRun run = Run(c.answers, c.arguments);
         EXPECT_EQ(run.exitCode, 1) << run.output;
         EXPECT_NE(run.output.find(c.shown), std::string::npos) << run.output;
         EXPECT_EQ(InstalledVersion(), c.installedVersion);
         EXPECT_EQ(GameStarted(), c.started);
-        if (std::string(c.what) != "installed file changed") {
-            EXPECT_EQ(Game(), old);
-        }
+        EXPECT_EQ(Game(), old);
         DeleteDirectory(PathJoin(install, "tempPatch"), true);
+    }
+}
+
+// An installed file changed since its version was made: the patch cannot
+// rebuild it, and the complete build is offered in the same run. Without a
+// build on the server, the run ends as it always did.
+TEST_F(UpdateRun, AChangedInstalledFileIsOfferedTheCompleteBuild) {
+    // Every file rebuilt from a delta, one added: a complete build laid
+    // over the old version gives the new one.
+    Tree next = Version(1);
+    for (auto& file : next.files) {
+        if (file.first != "IronvaleGame.exe") file.second += " in version 2";
+    }
+    Publish(Version(1), next.File("added/new.txt", "new"), "2", nullptr);
+    Tree modded = Version(1);
+    modded.files.rbegin()->second = "modded";
+    const struct {
+        const char* what;
+        std::string answers;  // update, complete build, start the game
+        std::string shown;
+        std::string installedVersion;
+    } cases[] = {
+        {"yes", "y\ny\nn\n", "Download size: ", "2"},
+        {"no", "y\nn\n", "The game data is corrupt.", "1"},
+        {"no build on the server", "y\n", "Failed to apply delta file", "1"},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        Install(modded, "1");
+        if (std::string(c.what) == "no build on the server") DeleteDirectory(temp / "server/build_2", true);
+        const ConsoleRun run = Run(c.answers, {"-latestVersion", "2"});
+        EXPECT_EQ(run.exitCode, 1) << run.output;
+        EXPECT_NE(run.output.find(c.shown), std::string::npos) << run.output;
+        EXPECT_EQ(run.output.find("complete game instead") != std::string::npos,
+                  std::string(c.what) != "no build on the server");
+        EXPECT_EQ(InstalledVersion(), c.installedVersion) << run.output;
+        EXPECT_EQ(Game(), c.installedVersion == "2" ? next : modded);
+        ExpectNoLeftovers();
+        EXPECT_FALSE(PathExists(temp / "tmp/patchinfo.xml"));
+    }
+}
+
+// Descriptions and archives as a network attacker or a broken cache may
+// serve them. The plain program judges archives by what a description
+// declares; the one with the publisher's key built in also refuses every
+// description that is not signed by that key for the version it asked for,
+// before it fetches a single archive.
+TEST_F(UpdateRun, ArchivesAndSignedDescriptionsAreUsedOnlyAsThePublisherMadeThem) {
+    const P256PrivateKey signer = LoadSigningKey(IRONVALE_BINARY_DIR "/test-key/private.pem");
+    const P256PrivateKey other = GenerateSigningKey();
+    const auto edit = [](const std::string& path, const std::function<void(std::string&)>& change) {
+        std::string text = ReadTextFile(path);
+        change(text);
+        WriteTextFile(path, text);
+    };
+    const struct {
+        const char* what;
+        bool keyed;
+        std::function<void(const std::string& patch)> serve;
+        bool accepted;
+        size_t archiveRequests;  // when refused
+    } cases[] = {
+        {"plain, a description without the new elements", false,
+         [&](const std::string& patch) {
+             edit(PathJoin(patch, "patchinfo.xml"), [](std::string& text) {
+                 text = std::regex_replace(text, std::regex("<Version>[^<]*</Version>|<Archives>[\\s\\S]*</Archives>"),
+                                           "");
+             });
+         },
+         true, 0},
+        {"plain, an archive with one byte flipped", false,
+         [&](const std::string& patch) {
+             edit(PathJoin(patch, "patch0.lzma"), [](std::string& data) { data[9] ^= 1; });
+         },
+         false, 2},
+        {"keyed, signed", true, [](const std::string&) {}, true, 0},
+        {"keyed, one byte changed", true,
+         [&](const std::string& patch) {
+             edit(PathJoin(patch, "patchinfo.xml"), [](std::string& text) { text[text.find("diff") + 1] = 'o'; });
+         },
+         false, 0},
+        {"keyed, signed by another key", true, [&](const std::string& patch) { SignPatchDescription(patch, other); },
+         false, 0},
+        {"keyed, unsigned", true,
+         [&](const std::string& patch) { RemoveFile(PathJoin(patch, kDescriptionSignatureName)); }, false, 0},
+        {"keyed, the signed description of version 2 replayed for 3", true,
+         [&](const std::string& patch) {
+             for (const char* name : {"patchinfo.xml", kDescriptionSignatureName}) {
+                 WriteTextFile(PathJoin(patch, name), ReadTextFile(PathJoin(temp / "older", name)));
+             }
+         },
+         false, 0},
+    };
+    WriteTree(temp / "older", ReadTree(Publish(1, 2, &signer)));
+    DeleteDirectory(temp / "server", true);
+    const std::string patch = Publish(1, 3, &signer);
+    const Tree published = ReadTree(temp / "server");
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        DeleteDirectory(temp / "server", true);
+        WriteTree(temp / "server", published);
+        c.serve(patch);
+        Install(Version(1), "1");
+        const size_t before = server.Requests().size();
+        const ConsoleRun run = RunConsoleProgram(TestProgramPath(c.keyed ? "keyed_updater" : "served_updater"),
+                                                 {"-latestVersion", "3"}, c.accepted ? "y\nn\n" : "y\n");
+        EXPECT_EQ(run.exitCode, 1) << run.output;
+        EXPECT_EQ(InstalledVersion(), c.accepted ? "3" : "1") << run.output;
+        EXPECT_EQ(Game(), c.accepted ? Version(3) : Version(1));
+        ExpectNoLeftovers();
+        if (c.accepted) continue;
+        EXPECT_NE(run.output.find("The game data is corrupt."), std::string::npos) << run.output;
+        const std::vector<std::string> requests = server.Requests();
+        EXPECT_EQ(std::count_if(requests.begin() + static_cast<std::ptrdiff_t>(before), requests.end(),
+                                [](const std::string& head) { return head.find(".lzma") != std::string::npos; }),
+                  static_cast<std::ptrdiff_t>(c.archiveRequests));
     }
 }
 

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <ctime>
+#include <functional>
 #include <random>
 #include <thread>
 #include <tuple>
@@ -13,6 +14,7 @@
 #include "net/http_downloader.h"
 #include "net/location.h"
 #include "net/md5.h"
+#include "net/sha256.h"
 #include "net/sign_url.h"
 #include "tests/support/http_test_server.h"
 #include "tests/support/test_files.h"
@@ -32,9 +34,13 @@ struct RecordingView final : IStatusView {
         reports.emplace_back(done, total);
         if (stopper != nullptr) stopper->RequestStop();
     }
-    void OnFileDone(const std::string& path) override { finished.push_back(path); }
+    void OnFileDone(const std::string& path) override {
+        finished.push_back(path);
+        if (onDone) onDone();
+    }
 
     HttpDownloader* stopper = nullptr;                   // asked to stop at the first report
+    std::function<void()> onDone;                        // after each transfer, before the file is checked
     std::vector<std::pair<uint32_t, uint32_t>> reports;  // bytes done, of total
     std::vector<std::string> finished;
 };
@@ -134,6 +140,61 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
     // A copy onto its own source fails before it could truncate it.
     EXPECT_EQ(Fetch("file://" + source, source), failed);
     EXPECT_TRUE(ReadTextFile(source) == body);
+}
+
+// A file whose size and SHA-256 are declared is handed over only as
+// declared: damaged, it is fetched once more, then given up; a transfer
+// running past the size stops at once.
+TEST_F(DownloadTest, ADeclaredFileArrivesAsDeclaredOrNotAtAll) {
+    std::string damaged = body;
+    damaged[damaged.size() / 2] ^= 0x01;
+    WriteTextFile(folder / "damaged.bin", damaged);
+    server.Serve("/good", {200, body});
+    server.Serve("/damaged", {200, damaged});
+    server.Serve("/heals", {200, damaged});
+    server.Serve("/appended", {200, body + "tail"});
+    server.Serve("/appended-unsized", {200, body + "tail", false});
+    server.Serve("/short-unsized", {200, body.substr(1), false});
+    Sha256 hash;
+    hash.Update(body.data(), body.size());
+    const Sha256Digest digest = hash.Finish();
+    const struct {
+        std::string location;
+        DownloadStatus status;
+        size_t requests;  // of the location's path
+    } cases[] = {
+        {server.Url("/good"), DownloadStatus::Done, 1},
+        {server.Url("/damaged"), DownloadStatus::Corrupt, 2},
+        {server.Url("/heals"), DownloadStatus::Done, 2},  // the second copy is sound
+        {server.Url("/appended"), DownloadStatus::Failed, 1},
+        {server.Url("/appended-unsized"), DownloadStatus::Failed, 1},
+        {server.Url("/short-unsized"), DownloadStatus::Corrupt, 2},
+        {"file://" + (folder / "damaged.bin"), DownloadStatus::Corrupt, 0},
+    };
+    for (const auto& item : cases) {
+        SCOPED_TRACE(item.location);
+        RemoveFile(target);
+        const size_t before = server.Requests().size();
+        view = RecordingView();
+        view.onDone = [this] { server.Serve("/heals", {200, body}); };
+        DownloadEntry entry(item.location, target);
+        entry.declaredSize = static_cast<int64_t>(body.size());
+        entry.declaredSha256 = HexDigits(digest.data(), digest.size());
+        HttpDownloader downloader;
+        downloader.SetStatusView(&view);
+        downloader.Start({entry}, false);
+        EXPECT_EQ(downloader.WaitForFile("target.bin"), item.status);
+        EXPECT_EQ(downloader.WaitForArchive("target.bin"), item.status == DownloadStatus::Done ? ArchiveState::Arrived
+                                                           : item.status == DownloadStatus::Corrupt
+                                                               ? ArchiveState::Corrupt
+                                                               : ArchiveState::Failed);
+        EXPECT_EQ(server.Requests().size() - before, item.requests);
+        EXPECT_EQ(PathExists(target), item.status == DownloadStatus::Done);
+        if (PathExists(target)) {
+            EXPECT_TRUE(ReadTextFile(target) == body);
+        }
+        server.Serve("/heals", {200, damaged});
+    }
 }
 
 TEST_F(DownloadTest, AStopEndsATransferAndRemovesThePartialFile) {

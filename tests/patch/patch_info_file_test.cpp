@@ -88,6 +88,57 @@ TEST(PatchInfoFile, ReadsDescriptionsThroughTheNineCursors) {
     EXPECT_EQ(load("<P><RegistryHive>hkey_local_machine</RegistryHive></P>"), "Hive not recognized");
 }
 
+// The version a patch leads to and its archives' sizes and digests, which
+// the updater judges downloads by: a list it cannot read whole is refused.
+TEST(PatchInfoFile, ReadsTheDeclaredArchivesAndVersionOrRefusesTheList) {
+    const std::string digest(64, 'a');
+    const auto item = [](const std::string& attributes) { return "<archive " + attributes + " />"; };
+    const struct {
+        std::string archives;  // the content of <Archives>
+        std::string read;      // "name=size:sha256 ..." or the refusal's end
+    } cases[] = {
+        {item("File=\"p0.lzma\" Size=\"12\" Sha256=\"" + std::string(64, 'A') + "\"") + "<other />" +
+             item("File=\"p1.lzma\" Size=\"0\" Sha256=\"" + digest + "\""),
+         "p0.lzma=12:" + digest + " p1.lzma=0:" + digest + " "},
+        {item("Size=\"12\" Sha256=\"" + digest + "\""), "an archive without a name"},
+        {item("File=\"p0\" Sha256=\"" + digest + "\""), "the size of p0"},
+        {item("File=\"p0\" Size=\"-1\" Sha256=\"" + digest + "\""), "the size of p0"},
+        {item("File=\"p0\" Size=\" 12\" Sha256=\"" + digest + "\""), "the size of p0"},
+        {item("File=\"p0\" Size=\"9999999999999999999\" Sha256=\"" + digest + "\""), "the size of p0"},
+        {item("File=\"p0\" Size=\"1\" Sha256=\"" + digest.substr(1) + "\""), "the SHA-256 of p0"},
+        {item("File=\"p0\" Size=\"1\" Sha256=\"" + digest.substr(1) + "g\""), "the SHA-256 of p0"},
+        {item("File=\"p0\" Size=\"1\" Sha256=\"" + digest + "\"") +
+             item("File=\"p0\" Size=\"1\" Sha256=\"" + digest + "\""),
+         "p0 is listed twice"},
+    };
+    TempFolder folder;
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.archives);
+        WriteTextFile(folder / "p.xml", "<P><Version>7</Version><Archives>" + c.archives + "</Archives></P>");
+        PatchInfoFile info;
+        try {
+            info.Load(folder / "p.xml");
+            std::string read;
+            for (const auto& [name, archive] : info.GetDeclaredArchives()) {
+                read += name + "=" + std::to_string(archive.size) + ":" + archive.sha256 + " ";
+            }
+            EXPECT_EQ(read, c.read);
+            EXPECT_EQ(info.GetVersion(), "7");
+        } catch (const Exception& error) {
+            EXPECT_EQ(error.Code(), ErrorCode::CorruptData);
+            EXPECT_EQ(error.message, "Invalid archive list in patch info file: " + c.read);
+        }
+    }
+    // Older descriptions say neither, also when loaded after one that did.
+    PatchInfoFile info;
+    WriteTextFile(folder / "p.xml", "<P><Version>7</Version><Archives>" + cases[0].archives + "</Archives></P>");
+    info.Load(folder / "p.xml");
+    WriteTextFile(folder / "p.xml", "<P><FileChanges /></P>");
+    info.Load(folder / "p.xml");
+    EXPECT_EQ(info.GetVersion(), "");
+    EXPECT_TRUE(info.GetDeclaredArchives().empty());
+}
+
 TEST(PatchInfoFile, SavesTheUninstallSchemaAsTinyXmlPrintsIt) {
     TempFolder folder;
     ASSERT_TRUE(PatchInfoFile::Save(folder / "u.xml", {"C:\\G\\a.txt", "C:\\G\\b&c.txt"}, {}, {}, {"Grp"},

@@ -47,6 +47,7 @@ TEST(StageOne, EndsEarlyWithAClearErrorAndTheInstallationUntouched) {
         {[](BatchRun& run) { run.state = ArchiveState::Cancelled; }, ErrorCode::UserCancelled, ""},
         {[](BatchRun& run) { run.state = ArchiveState::Failed; }, ErrorCode::FileNotFound,
          "Failed to download patch file."},
+        {[](BatchRun& run) { run.state = ArchiveState::Corrupt; }, ErrorCode::CorruptData, "The patch archive "},
         {[](BatchRun& run) { RemoveFile(PathJoin(run.work.installationFolder, "game.exe")); }, ErrorCode::DeltaFailed,
          "Failed to apply delta file "},
     };

@@ -5,12 +5,17 @@
 #include <filesystem>
 #include <tuple>
 
+#include "base/exception.h"
+#include "base/file_operations.h"
 #include "base/paths.h"
+#include "net/sha256.h"
+#include "net/signature_check.h"
 #include "patch/patch_info_file.h"
 #include "tests/support/batch_fixture.h"
 #include "tools/publisher/delta_maker.h"
 #include "tools/publisher/patch_builder.h"
 #include "tools/publisher/patch_verifier.h"
+#include "tools/publisher/signing_key.h"
 
 namespace {
 
@@ -46,6 +51,22 @@ TEST_P(RoundTrip, TheAppliedPatchTurnsTheOldTreeIntoTheNewOne) {
         if (old.files.count(path) == 0 || old.files.at(path) != content) written += content.size();
     }
     EXPECT_GE(info.GetSpaceRequirement(), written);
+
+    // It also learns where the patch leads and what each archive must be.
+    EXPECT_EQ(info.GetVersion(), "2");
+    std::string declared;
+    std::string actual;
+    for (const auto& [name, archive] : info.GetDeclaredArchives()) {
+        declared += name + " " + std::to_string(archive.size) + " " + archive.sha256 + "\n";
+    }
+    for (const auto& [name, content] : ReadTree(patch).files) {
+        if (name == "patchinfo.xml") continue;
+        Sha256 hash;
+        hash.Update(content.data(), content.size());
+        const Sha256Digest digest = hash.Finish();
+        actual += name + " " + std::to_string(content.size()) + " " + HexDigits(digest.data(), digest.size()) + "\n";
+    }
+    EXPECT_EQ(declared, actual);
 }
 
 INSTANTIATE_TEST_SUITE_P(Seeds, RoundTrip,
@@ -53,6 +74,26 @@ INSTANTIATE_TEST_SUITE_P(Seeds, RoundTrip,
                                          std::make_tuple(3u, int64_t{4096}, false),
                                          std::make_tuple(4u, int64_t{1}, false),
                                          std::make_tuple(11u, int64_t{10000}, true)));
+
+// Key files written and read back, never one replaced, and a build signed
+// on the way as the updater checks it.
+TEST(Signing, KeyFilesRoundTripAndASignedBuildPassesTheUpdatersCheck) {
+    TempFolder temp;
+    const P256PrivateKey key = GenerateSigningKey();
+    ASSERT_TRUE(MakeDirectories(temp / "keys"));
+    WriteKeyPair(temp / "keys", key);
+    EXPECT_THROW(WriteKeyPair(temp / "keys", GenerateSigningKey()), Exception);
+    const P256PrivateKey loaded = LoadSigningKey(temp / "keys/private.pem");
+    EXPECT_EQ(loaded.scalar, key.scalar);
+    EXPECT_EQ(loaded.publicKey, key.publicKey);
+
+    WriteTree(temp / "new", TreeOf("data/a.txt=a|b.txt=b"));
+    BuildOptions options{"", temp / "new", "2", temp / "out"};
+    options.signingKey = &loaded;
+    const std::string build = BuildPatch(options);
+    EXPECT_NO_THROW(CheckFileSignature(PathJoin(build, "patchinfo.xml"), PathJoin(build, kDescriptionSignatureName),
+                                       ReadPemFile(temp / "keys/public.pem")));
+}
 
 // The round trips mean something only if verify sees every difference.
 TEST(Verify, NamesEveryKindOfDifference) {

@@ -43,6 +43,35 @@ TEST(ArchiveCommand, PacksListsAndExtractsWhatXzAlsoReads) {
     EXPECT_EQ(ReadTextFile(folder / "xz.bin"), data);
 }
 
+// Our keys and signatures are OpenSSL's, both ways; check sees a damaged
+// archive.
+TEST(SigningCommands, KeysAndSignaturesInteroperateWithOpenssl) {
+    if (!Shell("command -v openssl >/dev/null")) GTEST_SKIP() << "openssl missing";
+    TempFolder temp;
+    WriteTree(temp / "new", TreeOf("data/a.txt=alpha|b.txt=beta"));
+    const std::string tool =
+        "cd '" + temp.Path() + "' && '" + std::string(IRONVALE_BINARY_DIR) + "/tools/ironvale-patch' ";
+    ASSERT_TRUE(Shell(tool + "keygen --out keys > /dev/null"));
+    ASSERT_TRUE(
+        Shell(tool + "build --complete --to new --version 2 --out out --sign-key keys/private.pem 2> /dev/null"));
+    EXPECT_TRUE(Shell("cd '" + temp.Path() +
+                      "' && openssl dgst -sha256 -verify keys/public.pem -signature out/build_2/patchinfo.xml.sig "
+                      "out/build_2/patchinfo.xml > /dev/null"));
+    EXPECT_TRUE(Shell(tool + "check out/build_2 --public-key keys/public.pem > /dev/null"));
+    for (const char* make : {"openssl genpkey -algorithm EC -pkeyopt ec_paramgen_curve:P-256 -out k.pem",
+                             "openssl ecparam -name prime256v1 -genkey -noout -out k.pem"}) {
+        SCOPED_TRACE(make);
+        ASSERT_TRUE(Shell("cd '" + temp.Path() + "' && " + make + " && openssl pkey -in k.pem -pubout -out k.pub"));
+        EXPECT_TRUE(Shell(tool + "sign --key k.pem out/build_2 > /dev/null"));
+        EXPECT_TRUE(Shell(tool + "check out/build_2 --public-key k.pub > /dev/null"));
+        EXPECT_FALSE(Shell(tool + "check out/build_2 --public-key keys/public.pem > /dev/null 2>&1"));
+    }
+    std::string archive = ReadTextFile(temp / "out/build_2/patch0.lzma");
+    archive[archive.size() / 2] ^= 0x01;
+    WriteTextFile(temp / "out/build_2/patch0.lzma", archive);
+    EXPECT_FALSE(Shell(tool + "check out/build_2 > /dev/null"));
+}
+
 TEST(BuildErrors, UnusableInputsFailClearlyAndLeaveNothing) {
     TempFolder temp;
     const std::string tree = temp / "tree";

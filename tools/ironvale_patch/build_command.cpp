@@ -9,12 +9,13 @@
 #include "patch/patch_info_file.h"
 #include "tools/ironvale_patch/command.h"
 #include "tools/publisher/patch_builder.h"
+#include "tools/publisher/signing_key.h"
 
 namespace {
 
 const char kUsage[] =
     "build (--from OLD_DIR | --complete) --to NEW_DIR --version V --out DIR [--max-archive-size BYTES] "
-    "[--registry-path KEY] [--registry-hive HIVE] [--xdelta3 PROGRAM]";
+    "[--registry-path KEY] [--registry-hive HIVE] [--xdelta3 PROGRAM] [--sign-key PRIVATE.pem]";
 
 bool ParseSize(const std::string& text, int64_t& value) {
     if (text.empty() || text.size() > 18 || text.find_first_not_of("0123456789") != std::string::npos) return false;
@@ -26,6 +27,7 @@ int Run(const std::vector<std::string>& args) {
     BuildOptions options;
     options.progress = &std::cerr;
     bool complete = false;
+    P256PrivateKey signingKey;
     for (size_t i = 0; i < args.size(); ++i) {
         const std::string& option = args[i];
         if (option == "--complete") {
@@ -50,6 +52,10 @@ int Run(const std::vector<std::string>& args) {
             options.hive = PatchInfoFile::ParseHive(value);
         } else if (option == "--xdelta3") {
             options.xdelta3 = value;
+        } else if (option == "--sign-key") {
+            // Read before the build, which may take long, can fail on it.
+            signingKey = LoadSigningKey(value);
+            options.signingKey = &signingKey;
         } else {
             return UsageError(kUsage);
         }

@@ -23,6 +23,8 @@ const char* StatusName(DownloadStatus status) {
             return "not found";
         case DownloadStatus::Unsupported:
             return "unsupported location";
+        case DownloadStatus::Corrupt:
+            return "not as declared";
     }
     return "unknown";
 }

@@ -10,10 +10,12 @@
 #include "base/file_operations.h"
 #include "base/file_stream.h"
 #include "base/paths.h"
+#include "net/sha256.h"
 #include "tools/publisher/archive_writer.h"
 #include "tools/publisher/delta_maker.h"
 #include "tools/publisher/lzma_encoder.h"
 #include "tools/publisher/patch_description.h"
+#include "tools/publisher/signing_key.h"
 #include "tools/publisher/tree_listing.h"
 
 namespace {
@@ -54,7 +56,8 @@ public:
         const int64_t memberSize = 6 + static_cast<int64_t>(name.size()) + compressed.GetLength();
         if (writer && writer->Size() > 0 && writer->Size() + memberSize > maximumSize) Finish();
         if (!writer) {
-            archiveName = "patch" + std::to_string(archiveCount++) + ".lzma";
+            archiveName = "patch" + std::to_string(archives.size()) + ".lzma";
+            archives.push_back(archiveName);
             writer.reset(new ArchiveWriter(PathJoin(folder, archiveName)));
         }
         writer->AddStoredMember(name, compressed);
@@ -73,15 +76,30 @@ public:
         return totalSize;
     }
 
+    // The archives' names, in the order they were started.
+    const std::vector<std::string>& Archives() const { return archives; }
+
 private:
     std::string folder;
     std::string scratchFile;
     int64_t maximumSize;
     std::unique_ptr<ArchiveWriter> writer;
     std::string archiveName;
-    int archiveCount = 0;
+    std::vector<std::string> archives;
     int64_t totalSize = 0;
 };
+
+ArchiveRecord DescribeArchive(const std::string& folder, const std::string& name) {
+    ArchiveRecord record;
+    record.file = name;
+    Sha256Digest digest{};
+    const std::atomic<bool> never{false};
+    if (!Sha256OfFile(PathJoin(folder, name), never, digest, record.size)) {
+        throw Exception("Cannot read back " + PathJoin(folder, name));
+    }
+    record.sha256 = HexDigits(digest.data(), digest.size());
+    return record;
+}
 
 void RemoveTree(const std::string& path) {
     std::error_code ignored;
@@ -142,6 +160,9 @@ void BuildInto(const BuildOptions& options, const std::string& folder, const std
         filesSize += static_cast<int64_t>(newTree.files.at(path));
     }
     const int64_t archivesSize = packer.Finish();
+    for (const std::string& archive : packer.Archives())
+        description.archives.push_back(DescribeArchive(folder, archive));
+    description.version = options.version;
 
     for (const auto& file : oldTree.files) {
         if (newTree.files.count(file.first) == 0) description.deletedFiles.push_back(file.first);
@@ -209,6 +230,9 @@ std::string BuildPatch(const BuildOptions& options) {
         PatchDescription description;
         BuildInto(options, folder, scratch, description);
         WritePatchDescription(description, PathJoin(folder, "patchinfo.xml"));
+        // Signed before it is published: a server never holds the new
+        // description without its signature.
+        if (options.signingKey != nullptr) SignPatchDescription(folder, *options.signingKey);
         RemoveTree(scratch);
         RemoveTree(finalFolder);
         std::error_code error;

@@ -6,6 +6,8 @@
 
 #include "base/registry_hive.h"
 
+struct P256PrivateKey;
+
 // What the publisher asks for: a patch from one game tree to the next, or
 // (with no old tree) the complete build of a tree.
 struct BuildOptions {
@@ -20,6 +22,8 @@ struct BuildOptions {
     std::string registryPath = "SOFTWARE\\Halvard\\Ironvale";
     std::string xdelta3 = "xdelta3";
     std::ostream* progress = nullptr;  // one line per file when set
+    // Signs the description ("patchinfo.xml.sig") when set; not owned.
+    const P256PrivateKey* signingKey = nullptr;
 };
 
 // The folder names the updater asks for.

@@ -36,5 +36,15 @@ void WritePatchDescription(const PatchDescription& description, const std::strin
     if (description.spaceRequirement >= 0) {
         AppendTextElement(root, "SpaceRequirement", std::to_string(description.spaceRequirement));
     }
+    if (!description.version.empty()) AppendTextElement(root, "Version", description.version);
+    if (!description.archives.empty()) {
+        TiXmlElement* archives = AppendElement(root, "Archives");
+        for (const ArchiveRecord& archive : description.archives) {
+            TiXmlElement* item = AppendElement(archives, "archive");
+            item->SetAttribute("File", archive.file);
+            item->SetAttribute("Size", std::to_string(archive.size));
+            item->SetAttribute("Sha256", archive.sha256);
+        }
+    }
     if (!SaveXmlFile(document, path)) throw Exception("Failed to write " + path);
 }

@@ -7,6 +7,14 @@
 
 #include "base/registry_hive.h"
 
+// One archive of a patch as the description declares it, so the updater
+// can tell a damaged or substituted download from the real one.
+struct ArchiveRecord {
+    std::string file;
+    int64_t size = 0;
+    std::string sha256;  // lower-case hexadecimal
+};
+
 // Everything a patch description ("patchinfo.xml") of a patch or complete
 // build says, in the order the file lists it. Paths are relative, with
 // backslashes.
@@ -19,6 +27,11 @@ struct PatchDescription {
     RegistryHive hive = RegistryHive::LocalMachine;
     std::string registryPath;
     int64_t spaceRequirement = -1;  // -1: not written
+    // Elements the updater's older readers skip: the version the patch
+    // leads to (a signed description cannot be replayed for another) and
+    // the archives.
+    std::string version;  // empty: not written
+    std::vector<ArchiveRecord> archives;
 };
 
 // Writes the description as the updater's own XML files are printed.

@@ -1,0 +1,45 @@
+#include "base/exception.h"
+#include "net/cng_handles_win.h"
+#include "net/sha256.h"
+
+struct Sha256::State {
+    State() : algorithm(BCRYPT_SHA256_ALGORITHM) {}
+    State(const State&) = delete;
+    State& operator=(const State&) = delete;
+    ~State() {
+        if (hash != nullptr) BCryptDestroyHash(hash);
+    }
+    CngAlgorithm algorithm;
+    BCRYPT_HASH_HANDLE hash = nullptr;
+};
+
+Sha256::Sha256() : state(new State) {
+    // CNG keeps the hash object itself when given no buffer (Windows 7 on).
+    if (!state->algorithm.IsOpen() ||
+        !BCRYPT_SUCCESS(BCryptCreateHash(state->algorithm.handle, &state->hash, nullptr, 0, nullptr, 0, 0))) {
+        throw Exception("SHA-256 is not available.");
+    }
+}
+
+Sha256::~Sha256() = default;
+
+void Sha256::Update(const void* data, size_t size) {
+    // CNG takes 32-bit counts; larger inputs go in pieces.
+    const UCHAR* bytes = static_cast<const UCHAR*>(data);
+    while (size > 0) {
+        const ULONG piece = size > 0x40000000 ? 0x40000000 : static_cast<ULONG>(size);
+        if (!BCRYPT_SUCCESS(BCryptHashData(state->hash, const_cast<UCHAR*>(bytes), piece, 0))) {
+            throw Exception("SHA-256 failed.");
+        }
+        bytes += piece;
+        size -= piece;
+    }
+}
+
+Sha256Digest Sha256::Finish() {
+    Sha256Digest digest{};
+    if (!BCRYPT_SUCCESS(BCryptFinishHash(state->hash, digest.data(), static_cast<ULONG>(digest.size()), 0))) {
+        throw Exception("SHA-256 failed.");
+    }
+    return digest;
+}
