@@ -39,13 +39,18 @@ rm -r "$demo/v2/data/old_voices" "$demo/v2/docs/changes_1.txt"
 
 # A throw-away signing key, made on the first demo and kept beside the
 # builds (never in the repository). The program run below is built with its
-# public half and takes only descriptions signed with it.
+# public half, in a build folder of its own, and takes only descriptions
+# signed with it.
 keys=$root/build/demo-keys
 [ -f "$keys/private.pem" ] || "$tool" keygen --out "$keys" >/dev/null
-cmake --preset native -DIRONVALE_PUBLIC_KEY="$keys/public.pem" >/dev/null
-if [ -x /usr/lib/wine/wine64 ] && command -v x86_64-w64-mingw32-g++-posix >/dev/null; then
-  cmake --preset windows -DIRONVALE_PUBLIC_KEY="$keys/public.pem" >/dev/null
-fi
+under_wine=
+if [ -x /usr/lib/wine/wine64 ] && command -v x86_64-w64-mingw32-g++-posix >/dev/null; then under_wine=1; fi
+keyed=$root/build/demo-native
+[ -z "$under_wine" ] || keyed=$root/build/demo-windows
+echo "== building the updater with the demo's public key in $keyed"
+cmake -S "$root" -B "$keyed" -G Ninja -DCMAKE_BUILD_TYPE=Release -DIRONVALE_TESTS=OFF \
+  ${under_wine:+-DCMAKE_TOOLCHAIN_FILE="$root/cmake/mingw-w64.cmake"} -DIRONVALE_PUBLIC_KEY="$keys/public.pem" >/dev/null
+cmake --build "$keyed" --target IronvaleUpdater -j2 >/dev/null
 
 echo "== ironvale-patch version, build (patch), build --complete, both signed with $keys/private.pem"
 "$tool" version --out "$demo/server" 2
@@ -71,13 +76,13 @@ cp -r "$demo/v1" "$install"
 printf '<?xml version="1.0" ?>\n<InstallationData>\n    <CurrentVersion>1</CurrentVersion>\n    <PatcherVersion>3</PatcherVersion>\n</InstallationData>\n' \
   >"$install/InstallationData.xml"
 
-if [ -x /usr/lib/wine/wine64 ] && command -v x86_64-w64-mingw32-g++-posix >/dev/null; then
-  echo "== building the Windows program"
+if [ -n "$under_wine" ]; then
+  echo "== building the player's helper (dialog_answer)"
   cmake --preset windows >/dev/null
-  cmake --build --preset windows --target IronvaleUpdater dialog_answer >/dev/null
+  cmake --build --preset windows --target dialog_answer >/dev/null
   export WINEPREFIX=$root/build/windows/wineprefix WINEDEBUG=-all
   run=scripts/wine-run.sh
-  cp build/windows/IronvaleUpdater.exe "$demo/server/"
+  cp "$keyed/IronvaleUpdater.exe" "$demo/server/"
   key='HKLM\Software\Halvard\Ironvale'
   "$run" reg add "$key" /v "Install Dir" /t REG_SZ /d "Z:${install//\//\\}\\" /reg:32 /f >/dev/null
   "$run" reg add "$key" /v Language /t REG_SZ /d English /reg:32 /f >/dev/null
@@ -88,7 +93,7 @@ if [ -x /usr/lib/wine/wine64 ] && command -v x86_64-w64-mingw32-g++-posix >/dev/
   trap '"$run" reg delete "$key" /reg:32 /f >/dev/null 2>&1; { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null; kill $xvfb' EXIT
   for _ in $(seq 200); do [ -s "$demo/display" ] && break; sleep 0.05; done
   export DISPLAY=:$(head -1 "$demo/display")
-  echo "== running IronvaleUpdater.exe under Wine (beside its patches, in $demo/server)"
+  echo "== running IronvaleUpdater.exe (demo key built in) under Wine, beside its signed patches in $demo/server"
   "$run" "$demo/server/IronvaleUpdater.exe" -hostname demo.ironvale.test 2>/dev/null &
   updater=$!
   # The window is on screen while the version check runs (three seconds).
@@ -102,17 +107,14 @@ if [ -x /usr/lib/wine/wine64 ] && command -v x86_64-w64-mingw32-g++-posix >/dev/
   wait "$updater" || code=$?
   log=$(find "$WINEPREFIX/drive_c/users" -name IronvaleUpdater.log | head -1)
 else
-  echo "== building the native program"
-  cmake --preset native >/dev/null
-  cmake --build --preset native --target IronvaleUpdater >/dev/null
-  cp build/native/IronvaleUpdater "$demo/server/"
+  cp "$keyed/IronvaleUpdater" "$demo/server/"
   export TMPDIR=$demo/tmp IRONVALE_REGISTRY_ROOT=$demo/registry
   mkdir -p "$TMPDIR" "$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Halvard/Ironvale" \
     "$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Microsoft/DirectX"
   printf 'Install Dir\t%s\nLanguage\tEnglish\n' "$install" \
     >"$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Halvard/Ironvale/.values"
   printf 'Version\t4.09.00.0904\n' >"$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Microsoft/DirectX/.values"
-  echo "== running IronvaleUpdater (beside its patches, in $demo/server), answering y, then n"
+  echo "== running IronvaleUpdater (demo key built in) beside its signed patches in $demo/server, answering y, n"
   code=0
   printf 'y\nn\n' | "$demo/server/IronvaleUpdater" -hostname demo.ironvale.test || code=$?
   log=$TMPDIR/IronvaleUpdater.log
