@@ -3,13 +3,11 @@
 
 usage: window_picture.py LEFT TOP LENGTH BACKGROUND FAILED_PNG
 
-LEFT TOP: where the window is on the screen; BACKGROUND: its background
-picture, which the screen is compared with. Waits up to ten seconds for a
-screen where the bar is drawn LENGTH px long, the title, status line and
+Compares the screen with the window's background picture, the window at
+LEFT TOP, until the bar is drawn LENGTH px long, the title, status line and
 "Cancel" label are drawn, every colour-key pixel shows the screen behind
-the window and no pixel is near the colour key (a pink fringe). Prints the
-measures; on failure saves the screenshot as FAILED_PNG and exits 1.
-Needs Debian's python3-pil.
+and no pixel is near the colour key (a pink fringe). Prints the measures;
+after ten seconds without, saves the screen as FAILED_PNG and exits 1.
 """
 import os
 import sys

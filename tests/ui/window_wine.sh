@@ -13,25 +13,23 @@ scratch=$(mktemp -d)
 "$run" reg add 'HKCU\Software\Wine\AppDefaults\window_driver.exe\X11 Driver' /v Managed /t REG_SZ /d N /f >/dev/null
 set_value() { "$run" reg add "$key" /v "$1" /t REG_SZ /d "$2" /f >/dev/null; }
 german() { awk -F'\t' -v key="$1" '$1 == key { print $4 }' "$root/resources/strings.tsv"; }
-# Wine finds fonts through fontconfig and remembers them in its registry.
 forget_fonts() {
   for k in Cache 'External Fonts'; do "$run" reg delete "HKCU\\Software\\Wine\\Fonts\\$k" /f >/dev/null 2>&1 || true; done
   for face in IPAGothic IPAPGothic @IPAGothic @IPAPGothic; do
     "$run" reg delete 'HKLM\Software\Microsoft\Windows NT\CurrentVersion\Fonts' /v "$face (TrueType)" /f >/dev/null 2>&1 || true
   done
 }
-# The prefix is shared with the other Wine tests, which expect neither the
-# game's key nor the Japanese font.
+# The prefix is shared with the other Wine tests: the game's key and Wine's
+# memory of this test's fonts go.
 cleanup() {
-  [ -z "${DRIVER_PID:-}" ] || kill "$DRIVER_PID" 2>/dev/null || true
   forget_fonts
   "$run" reg delete "$key" /f >/dev/null 2>&1 || true
   rm -rf "$scratch"
 }
 
-start_driver() {  # [NAME=VALUE...]: the driver with extra environment
+start_driver() {
   : >"$driver_log"
-  coproc DRIVER { env "$@" "$run" "$driver_exe" 2>>"$scratch/driver.err"; }
+  coproc DRIVER { "$run" "$driver_exe" 2>>"$scratch/driver.err"; }
 }
 stop_driver() { exec {DRIVER[1]}>&-; wait "$DRIVER_PID" 2>/dev/null || true; }
 send() {
@@ -52,8 +50,23 @@ expect "retry 2" "cancel | $(german INSTALLER_FAILED_TO_MOVE_THE_FILE) [4 Wieder
 expect start started
 expect rect "246 143"  # centred on the 1024 x 768 screen
 left=246 top=143
+bar() {  # VALUE LENGTH: at that progress the screen shows the window, its bar LENGTH px long
+  expect "progress $1" ok
+  /usr/bin/python3 "$root/tests/ui/window_picture.py" $left $top "$2" "$root/resources/pictures/background.png" \
+    "$(dirname "$program")/test-results/window_wine-failed.png" || fail "progress $1: the window as drawn is wrong"
+}
+bar 0 0
+bar 500 165
+# A drag from the title line moves the window by the pointer's way. The
+# next picture waits for the screen to show it there, where clicks go.
+xdotool mousemove 346 158 mousedown 1 mousemove 396 188 mouseup 1
+for _ in $(seq 20); do send rect; [ "$reply" = "296 173" ] && break; sleep 0.1; done
+expect rect "296 173"
+left=296 top=173
+bar 1000 330
 # A question of the main thread owned by the window, then the confirmations
-# of the window's thread (with its own hook) answered No: the run goes on.
+# of the window's thread (with its own hook) answered No: the run goes on,
+# and the bar still follows it.
 yes_no="[6 Ja] [7 Nein]"
 expect "ask 7 Weiter?" "no | Weiter? $yes_no"
 going="cancelled=0 cancels=0 quit=0 window=1"
@@ -61,17 +74,7 @@ click 435 443  # "Cancel"
 expect "confirm 7" "$going | $(german INSTALLER_CONFIRM_CANCEL) $yes_no"
 click 515 15  # the close spot
 expect "confirm 7" "$going | $(german INSTALLER_CONFIRM_QUIT) $yes_no"
-for step in "0 0" "500 165" "1000 330"; do
-  read -r value length <<<"$step"
-  expect "progress $value" ok
-  /usr/bin/python3 "$root/tests/ui/window_picture.py" $left $top "$length" "$root/resources/pictures/background.png" \
-    "$(dirname "$program")/test-results/window_wine-failed.png" || fail "progress $value: the window as drawn is wrong"
-done
-# A drag from the title line moves the window by the pointer's way.
-xdotool mousemove $((left + 100)) $((top + 15)) mousedown 1 mousemove $((left + 150)) $((top + 45)) mouseup 1
-for _ in $(seq 20); do send rect; [ "$reply" = "296 173" ] && break; sleep 0.1; done
-expect rect "296 173"
-left=296 top=173
+bar 0 0
 # Yes: cancelled once, the LZMA loop's flag set, the window gone.
 click 515 15
 expect "confirm 6" "cancelled=1 cancels=1 quit=1 window=0 | $(german INSTALLER_CONFIRM_QUIT) $yes_no"
@@ -83,15 +86,19 @@ set_value Language Spanish
 second_start "Ironvale - Actualizador"
 grep -qx '\[button\] Aceptar' <<<"$text" || fail "the instance-running box's button"
 
-# Japanese, each case with a fontconfig of its own and Wine's memory of the
-# Japanese fonts cleared.
+# Japanese. Wine finds fonts through fontconfig and remembers them in its
+# registry and in every running Wine process: each case gets a fontconfig
+# of its own, the memory is cleared and the Wine processes end before the
+# driver starts.
 set_value Language Japanese
 with_fonts() {  # NAME FOLDER...: the driver, knowing only these fonts
-  forget_fonts
   { echo '<?xml version="1.0"?><fontconfig>'
     printf '<dir>%s</dir>' "${@:2}"
     echo "<cachedir>$scratch/fontcache</cachedir></fontconfig>"; } >"$scratch/$1.conf"
-  start_driver FONTCONFIG_FILE="$scratch/$1.conf"
+  export FONTCONFIG_FILE="$scratch/$1.conf"
+  forget_fonts
+  { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true
+  start_driver
 }
 searched() {
   [ "$(grep -c 'Trace: Finding dialog font\.\.\.' "$driver_log")" -eq "$1" ] || fail "dialog font not searched $1 times"

@@ -1,21 +1,18 @@
 // window_driver: the updater's main window and boxes, driven by commands on
-// stdin the way the update run drives them, each answered by one line on
-// stdout. The player's answer to a box (button ID) comes from a thread of
-// its own; BOX describes that box: its text's first line, "[ID LABEL]" for
-// each button, "{ENTRIES} SELECTED" for a list. Start-up follows the
-// updater's: the language stored in the game's registry key, the button
-// hook on the main thread, GDI+; the log is window_driver.log in the
-// temporary folder.
+// stdin as the update run drives them, each answered by one line on stdout.
+// A thread of its own answers a box (button ID) and describes it as BOX:
+// its text's first line, "[ID LABEL]" per button, "{ENTRIES} SELECTED" for
+// a list. Start-up is the updater's: the language from the game's registry
+// key, the button hook on the main thread, GDI+; the log goes to
+// window_driver.log in the temporary folder.
 //   start              shows the window with a status line: "started"
 //   rect               "LEFT TOP" of the window
 //   progress N         overall and file progress: "ok"
-//   confirm ID         the confirmation a click put up, answered; then the
-//                      state once the window's thread has taken it in:
-//                      "cancelled=0|1 cancels=N quit=0|1 window=0|1 | BOX"
+//   confirm ID         answers the confirmation a click put up: "cancelled=0|1
+//                      cancels=N quit=0|1 window=0|1 | BOX" once taken in
 //   ask ID TEXT        a question owned by the window: "yes|no | BOX"
 //   retry ID           the question after a failed move: "retry|cancel | BOX"
-//   language ID NAME   the language dialog, NAME chosen and stored as the
-//                      updater stores it: "NAME|cancelled | BOX"
+//   language ID NAME   the language dialog, NAME chosen and stored: "NAME|cancelled | BOX"
 //   dialogfont         the Japanese dialog font: "none" or "'FACE' HEIGHT WEIGHT"
 #include <windows.h>
 
