@@ -74,9 +74,9 @@ Tree& Tree::Folder(const std::string& path) {
     return Parent(path).empty() ? *this : Folder(Parent(path));
 }
 
-Tree TreeOf(const std::string& spec) {
+Tree TreeOf(const std::string& layout) {
     Tree tree;
-    std::istringstream entries(spec);
+    std::istringstream entries(layout);
     for (std::string entry; std::getline(entries, entry, '|');) {
         const size_t equals = entry.find('=');
         if (equals != std::string::npos) tree.File(entry.substr(0, equals), entry.substr(equals + 1));

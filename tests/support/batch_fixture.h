@@ -25,7 +25,7 @@ struct Tree {
     Tree& Folder(const std::string& path);                            // with its parents
     bool operator==(const Tree& other) const { return files == other.files && folders == other.folders; }
 };
-Tree TreeOf(const std::string& spec);  // "a/b.txt=text|empty/folder/|c.txt="
+Tree TreeOf(const std::string& layout);  // "a/b.txt=text|empty/folder/|c.txt="
 void PrintTo(const Tree& tree, std::ostream* out);
 void WriteTree(const std::string& root, const Tree& tree);
 Tree ReadTree(const std::string& root);
