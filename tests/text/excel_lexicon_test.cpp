@@ -20,7 +20,6 @@ const std::u16string kTable =
     u"KEY_SHORT\tshort row\r\n"
     u"KEY_WIDE\t\u00C9t\u00E9 \U0001F600\t\u65E5\u672C\r\n"
     u"KEY_NUL\tbefore\0after\tvorher\r\n"
-    u"KEY_LF_ONLY\tno CR\tkein CR\n"
     u"KEY_LAST\tno line end\tohne Zeilenende"s;
 
 TEST(ExcelLexiconTest, ReadsTheColumnOfTheRequestedLanguage) {
@@ -33,7 +32,6 @@ TEST(ExcelLexiconTest, ReadsTheColumnOfTheRequestedLanguage) {
         {"KEY_SHORT", L"short row", L""},
         {"KEY_WIDE", L"\u00C9t\u00E9 \U0001F600", L"\u65E5\u672C"},
         {"KEY_NUL", L"before", L""},  // a zero unit ends the line
-        {"KEY_LF_ONLY", L"no CR", L"kein CR"},
         {"KEY_LAST", L"no line end", L"ohne Zeilenende"},
         {"KEY_MISSING", missing, missing},
         {"Key_Plain", missing, missing},
