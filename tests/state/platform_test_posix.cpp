@@ -1,6 +1,7 @@
-// Natively: the registry store on disk, a fresh one per sandbox.
+// Natively: the registry store on disk (a fresh one per sandbox) and the stand-ins for the Windows system facts.
 #include <gtest/gtest.h>
 #include <stdlib.h>
+#include <unistd.h>
 
 #include <random>
 
@@ -9,6 +10,7 @@
 #include "base/paths.h"
 #include "registry_sandbox.h"
 #include "state/registry_manager.h"
+#include "state/system_facts.h"
 #include "tests/support/test_files.h"
 
 RegistrySandbox::RegistrySandbox()
@@ -49,6 +51,16 @@ TEST(RegistryStore, KeysAreFoldersTheirValuesOneEscapedTextFileAndNamesStayInsid
     registry.SetLanguage("Dutch");
     ::unsetenv("XDG_CONFIG_HOME");
     EXPECT_TRUE(PathExists(sandbox.root + "/ironvale/registry/HKEY_CURRENT_USER/SOFTWARE/Halvard/Ironvale/.values"));
+}
+
+TEST(SystemFactsPosix, StandInsMatchTheirWindowsCounterparts) {
+    EXPECT_EQ(GetProcessOwnerSid(), "S-1-22-1-" + std::to_string(::geteuid()));
+    EXPECT_EQ(GetElevationType(), 0);
+    EXPECT_FALSE(IsUacEnabled());
+    EXPECT_TRUE(::geteuid() != 0 || IsAdministrator());
+    OsInfo record;
+    DetectOsName(record);
+    EXPECT_EQ(record.osName, "UnknownVersion");
 }
 
 }  // namespace
