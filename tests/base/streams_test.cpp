@@ -98,19 +98,4 @@ TEST(StreamReadersTest, SevenBitIntegersFitIn32Bits) {
     }
 }
 
-TEST(PathsTest, OneJoinRuleForFilesAndAddresses) {
-    const std::tuple<const char*, const char*, char, const char*> joins[] = {
-        {"C:/Games/", "/data\\x.bin", '\\', "C:\\Games\\data\\x.bin"},
-        {"", "a", '\\', "\\a"},
-        {"dir", "", '\\', "dir\\"},
-        {"a\\\\", "\\\\b", '\\', "a\\b"},
-        {"http://host/base\\", "sub/file", '/', "http://host/base/sub/file"},
-        {"\\\\server\\share", "x/y", '\\', "\\\\server\\share\\x\\y"},
-    };
-    for (const auto& [base, tail, separator, joined] : joins)
-        EXPECT_EQ(PathJoin(base, tail, separator), joined) << base;
-    EXPECT_EQ(GetParentDirectory("a/b\\c.txt"), PathJoin("a", "b"));
-    EXPECT_EQ(GetFileName("a/b\\c.txt"), "c.txt");
-}
-
 }  // namespace

@@ -1,6 +1,5 @@
-// The shared XML rules: TinyXML's own output byte for byte, code-page bytes
-// kept, hostile files refused before TinyXML's recursive parser could
-// overflow the stack, and a failed save that leaves the old file.
+// The shared XML rules: TinyXML's own output byte for byte, code-page bytes kept, hostile files refused before
+// TinyXML's recursive parser could overflow the stack, and a failed save that leaves the old file.
 #include <gtest/gtest.h>
 
 #include <filesystem>
@@ -53,8 +52,8 @@ TEST(ParseXml, RefusesHostileTextsAndKeepsCodePageBytes) {
                                     std::string("<!-- only a comment -->"), std::string("<r><a></b></r>")}) {
         EXPECT_FALSE(ParseXml(text, document)) << text.substr(0, 40);
     }
-    // 0xE9 (e acute in Windows-1252) right before the closing quote: read
-    // as UTF-8 it would swallow the quote and the rest of the tag.
+    // 0xE9 (e acute in Windows-1252) right before the closing quote: read as UTF-8 it would swallow the quote and the
+    // rest of the tag.
     ASSERT_TRUE(ParseXml("\xEF\xBB\xBF<r>\r\n<new Path=\"Caf\xE9\" File=\"x\" />\r<v>a</v></r>", document));
     const TiXmlElement* item = document.RootElement()->FirstChildElement("new");
     EXPECT_STREQ(item->Attribute("Path"), "Caf\xE9");
@@ -64,20 +63,17 @@ TEST(ParseXml, RefusesHostileTextsAndKeepsCodePageBytes) {
     EXPECT_EQ(text, "a");
 }
 
-TEST(LoadXmlFile, RefusesFilesLargerThanAnyRecord) {
+// Loading refuses files larger than any record; saving writes exactly what TinyXML's SaveFile writes, and a failed save
+// keeps the old file and no temporary.
+TEST(XmlFiles, LoadRefusesHugeFilesAndSaveReplacesWholeOrNotAtAll) {
     TempFolder folder;
-    const std::string path = folder / "big.xml";
-    WriteTextFile(path, "<r/>");
-    TiXmlDocument document;
-    EXPECT_TRUE(LoadXmlFile(path, document));
-    std::filesystem::resize_file(path, kMaximumXmlFileSize + 1);
-    EXPECT_FALSE(LoadXmlFile(path, document));
-    EXPECT_FALSE(LoadXmlFile(folder / "missing.xml", document));
-}
+    TiXmlDocument loaded, document;
+    WriteTextFile(folder / "big.xml", "<r/>");
+    EXPECT_TRUE(LoadXmlFile(folder / "big.xml", loaded));
+    std::filesystem::resize_file(folder / "big.xml", kMaximumXmlFileSize + 1);
+    EXPECT_FALSE(LoadXmlFile(folder / "big.xml", loaded));
+    EXPECT_FALSE(LoadXmlFile(folder / "missing.xml", loaded));
 
-TEST(SaveXmlFile, WritesExactlyWhatTinyXmlsSaveFileWrites) {
-    TempFolder folder;
-    TiXmlDocument document;
     StartXmlDocument(document);
     TiXmlNode* root = document.InsertEndChild(TiXmlElement("Root"));
     root->ToElement()->SetAttribute("Path", "a&b <c> \"d\" 'e'");
@@ -89,18 +85,12 @@ TEST(SaveXmlFile, WritesExactlyWhatTinyXmlsSaveFileWrites) {
     ASSERT_TRUE(document.SaveFile((folder / "tinyxml.xml").c_str()));
     EXPECT_EQ(ReadTextFile(folder / "ours.xml"), ReadTextFile(folder / "tinyxml.xml"));
     EXPECT_FALSE(PathExists(folder / "~ours.xml.tmp"));
-}
 
-TEST(SaveXmlFile, AFailedWriteKeepsTheOldFileAndNoTemporary) {
-    TempFolder folder;
-    TiXmlDocument document;
-    StartXmlDocument(document);
-    WriteTextFile(folder / "x.xml", "old");
     // The temporary cannot be made: its folder is missing, or a folder has its name.
     std::filesystem::create_directory(folder / "busy.tmp");
-    EXPECT_FALSE(SaveXmlFile(document, folder / "x.xml", PathJoin(folder / "missing", "x.tmp")));
-    EXPECT_FALSE(SaveXmlFile(document, folder / "x.xml", folder / "busy.tmp"));
-    EXPECT_EQ(ReadTextFile(folder / "x.xml"), "old");
+    EXPECT_FALSE(SaveXmlFile(document, folder / "ours.xml", PathJoin(folder / "missing", "x.tmp")));
+    EXPECT_FALSE(SaveXmlFile(document, folder / "ours.xml", folder / "busy.tmp"));
+    EXPECT_EQ(ReadTextFile(folder / "ours.xml"), ReadTextFile(folder / "tinyxml.xml"));
     // The temporary is written but cannot take the place of a folder.
     std::filesystem::create_directories(PathJoin(folder / "record", "inside"));
     EXPECT_FALSE(ReplaceFileAtomically(folder / "record", "new"));

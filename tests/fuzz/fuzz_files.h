@@ -11,8 +11,8 @@
 #include "base/file_stream.h"
 #include "base/paths.h"
 
-// Runs a parser on untrusted input: an Exception is a fine outcome, any
-// other ending (a crash, a sanitizer report, a time-out) is a finding.
+// Runs a parser on untrusted input: an Exception is a fine outcome, any other ending (a crash, a sanitizer report, a
+// time-out) is a finding.
 template <typename Action>
 void ExpectNoCrash(Action action) {
     try {

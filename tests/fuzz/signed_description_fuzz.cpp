@@ -1,7 +1,6 @@
-// The untrusted parts of a signed description: the signature file (its
-// DER parsed, re-encoded byte for byte, and checked against a key), PEM
-// text, and the description's version and archive list. The input is a
-// two-byte length, that many bytes of signature file, then the description.
+// The untrusted parts of a signed description: the signature file (its DER parsed, re-encoded byte for byte, and
+// checked against a key), PEM text, and the description's version and archive list. The input is a two-byte length,
+// that many bytes of signature file, then the description.
 #include <cstdlib>
 
 #include "net/signature_check.h"

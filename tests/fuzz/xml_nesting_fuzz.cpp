@@ -1,8 +1,6 @@
-// The nesting scanner against TinyXML itself: whenever the scanner
-// accepts a text, the elements TinyXML builds from it must nest no deeper
-// than the scanner said (plus the innermost empty element), and there must
-// be no more nodes and attributes than it counted. Inputs are small, so
-// TinyXML's recursion is safe here.
+// The nesting scanner against TinyXML itself: whenever the scanner accepts a text, the elements TinyXML builds from it
+// must nest no deeper than the scanner said (plus the innermost empty element), and there must be no more nodes and
+// attributes than it counted. Inputs are small, so TinyXML's recursion is safe here.
 #include <tinyxml.h>
 
 #include <algorithm>

@@ -1,5 +1,5 @@
-// The decisions before an update, fed with any facts: may the updater run
-// on this system, and does it hold the rights it needs.
+// The decisions before an update, fed with any facts: may the updater run on this system, and does it hold the rights
+// it needs.
 #include "state/environment_checks.h"
 
 #include <gtest/gtest.h>
@@ -30,10 +30,9 @@ struct Facts final : IMachineFacts {
     int32_t ElevationType() override { return elevation; }
     bool IsAdministrator() override { return administrator; }
     bool IsUacEnabled() override { return uac; }
-    std::string os;
-    int32_t elevation;
-    bool administrator;
-    bool uac;
+    const std::string os;
+    const int32_t elevation;
+    const bool administrator, uac;
 };
 
 TEST(EnvironmentChecks, RightsFromTheFactsAndWhatTheUpdateNeeds) {

@@ -26,29 +26,26 @@ std::string CommandOutput(const std::string& command) {
     return output;
 }
 
-TEST(RegistryRegExe, ReadsWhatTheManagerWroteAndTheOtherWayRound) {
+// The game's 32-bit installer wrote its machine-wide key into the 32-bit view; the updater must find it there and only
+// there.
+TEST(RegistryRegExe, ReadsWhatTheManagerWroteTheOtherWayRoundAndMachineKeysInThe32BitView) {
     RegistrySandbox sandbox;
+    const std::string user = "\"HKCU\\" + sandbox.keyPath + "\"", machine = "\"HKLM\\" + sandbox.keyPath + "\"";
     const RegistryManager registry(RegistryHive::CurrentUser, sandbox.keyPath);
     registry.SetLanguage("German");
     registry.SetInstallDir("C:\\Games\\Iron vale");
-    const std::string output = CommandOutput("reg.exe query \"HKCU\\" + sandbox.keyPath + "\"");
+    const std::string output = CommandOutput("reg.exe query " + user);
     EXPECT_NE(output.find("Language    REG_SZ    German"), std::string::npos) << output;
     EXPECT_NE(output.find("Install Dir    REG_SZ    C:\\Games\\Iron vale"), std::string::npos) << output;
-    CommandOutput("reg.exe add \"HKCU\\" + sandbox.keyPath + "\" /v Language /t REG_SZ /d Polish /f");
+    CommandOutput("reg.exe add " + user + " /v Language /t REG_SZ /d Polish /f");
     EXPECT_EQ(registry.GetLanguage(), "Polish");
-}
 
-// The game's 32-bit installer wrote its machine-wide key into the 32-bit
-// view; the updater must find it there and only there.
-TEST(RegistryRegExe, MachineWideKeysAreReadInThe32BitView) {
-    RegistrySandbox sandbox;
-    const std::string key = "\"HKLM\\" + sandbox.keyPath + "\"";
-    CommandOutput("reg.exe add " + key + " /v \"Install Dir\" /t REG_SZ /d C:\\Thirty /reg:32 /f");
-    CommandOutput("reg.exe add " + key + " /v Language /t REG_SZ /d German /reg:64 /f");
-    const RegistryManager registry(RegistryHive::LocalMachine, sandbox.keyPath);
-    EXPECT_EQ(registry.GetInstallDir(), "C:\\Thirty");
-    EXPECT_EQ(registry.GetLanguage(), "");
-    CommandOutput("reg.exe delete " + key + " /reg:64 /f");
+    CommandOutput("reg.exe add " + machine + " /v \"Install Dir\" /t REG_SZ /d C:\\Thirty /reg:32 /f");
+    CommandOutput("reg.exe add " + machine + " /v Language /t REG_SZ /d German /reg:64 /f");
+    const RegistryManager machineWide(RegistryHive::LocalMachine, sandbox.keyPath);
+    EXPECT_EQ(machineWide.GetInstallDir(), "C:\\Thirty");
+    EXPECT_EQ(machineWide.GetLanguage(), "");
+    CommandOutput("reg.exe delete " + machine + " /reg:64 /f");
 }
 
 }  // namespace

@@ -4,9 +4,8 @@
 #include <string>
 #include <vector>
 
-// A program of the test build run as a child process, which the test may
-// kill at any moment: SIGKILL natively, TerminateProcess on Windows, so
-// nothing of the child's own runs after the kill.
+// A program of the test build run as a child process, which the test may kill at any moment: SIGKILL natively,
+// TerminateProcess on Windows, so nothing of the child's own runs after the kill.
 class ChildProcess {
 public:
     ChildProcess(const std::string& program, const std::vector<std::string>& arguments);

@@ -3,7 +3,6 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <climits>
 #include <stdexcept>
 
 #include "base/paths.h"
@@ -44,8 +43,5 @@ int ChildProcess::Wait() {
 }
 
 std::string TestProgramPath(const std::string& name) {
-    char self[PATH_MAX] = {};
-    const ssize_t length = readlink("/proc/self/exe", self, sizeof(self) - 1);
-    if (length <= 0) throw std::runtime_error("cannot find the test program");
-    return PathJoin(PathJoin(GetParentDirectory(self), "support/programs"), name);
+    return PathJoin(IRONVALE_BINARY_DIR "/tests/support/programs", name);
 }

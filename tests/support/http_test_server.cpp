@@ -9,10 +9,8 @@
 #include "base/paths.h"
 #include "net/md5.h"
 
-// The secret the update server shares with the updater.
-const char kSharedSecret[] = "Kq7Vx2Rm9TbL4";
-// How often the waiting thread looks at the stop flag.
-const int kTickMs = 20;
+const char kSharedSecret[] = "Kq7Vx2Rm9TbL4";  // of the update server and the updater
+const int kTickMs = 20;                        // how often a waiting thread looks at the stop flag
 
 HttpTestServer::HttpTestServer() : listener(TestSocket::ListenOnLoopback(port)) {
     worker = std::thread([this] {
@@ -79,10 +77,9 @@ void HttpTestServer::Answer(const TestSocket& connection) {
         head.append(buffer, static_cast<size_t>(count));
     }
     head.resize(head.find("\r\n\r\n") + 2);
-    {
-        std::lock_guard<std::mutex> lock(mutex);
-        requests.push_back(head);
-    }
+    std::unique_lock<std::mutex> lock(mutex);
+    requests.push_back(head);
+    lock.unlock();
     const size_t targetAt = head.find(' ') + 1;
     const std::string target = head.substr(targetAt, head.find(' ', targetAt) - targetAt);
     HttpTestResponse response = Lookup(target.substr(0, target.find('?')));

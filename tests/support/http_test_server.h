@@ -22,22 +22,17 @@ struct HttpTestResponse {
 };
 
 // An HTTP/1.1 server on 127.0.0.1 on a thread of the test program, so the same tests run natively and under Wine. One
-// connection at a time (the updater fetches one file after the other), each closed after its response; unknown paths
-// get 404.
+// connection at a time, each closed after its response; unknown paths get 404.
 class HttpTestServer {
 public:
     HttpTestServer();
     ~HttpTestServer();
 
-    // Answers requests for path (query aside) with response.
-    void Serve(const std::string& path, const HttpTestResponse& response);
-    // Answers requests below prefix with the file of that name in folder, read when asked for, with the status and
-    // pacing of behaviour.
+    void Serve(const std::string& path, const HttpTestResponse& response);  // the path without its query
+    // Below prefix: the file of that name in folder, read when asked for, sent as behaviour says.
     void ServeFolder(const std::string& prefix, const std::string& folder, const HttpTestResponse& behaviour);
-    // "http://127.0.0.1:PORT" followed by path.
-    std::string Url(const std::string& path) const;
-    // The heads (request line and header lines) of the requests so far.
-    std::vector<std::string> Requests() const;
+    std::string Url(const std::string& path) const;  // "http://127.0.0.1:PORT" followed by path
+    std::vector<std::string> Requests() const;       // the request line and headers of each request so far
     // The update server's check at time now: "e=" and an expiry not before now, then "&h=" and the digest of the shared
     // secret and everything before "&h=".
     static bool SignatureValid(const std::string& url, int64_t now);

@@ -6,9 +6,8 @@
 
 #include "resources/resource_ids.h"
 
-// Test programs link the same resource object as IronvaleUpdater.exe: its
-// icon, manifest (no elevation prompt, modern controls), version block and
-// string table.
+// Test programs link the same resource object as IronvaleUpdater.exe: its icon, manifest (no elevation prompt, modern
+// controls), version block and string table.
 TEST(ProgramResourcesTest, IconManifestVersionAndStringTable) {
     EXPECT_NE(FindResourceA(nullptr, MAKEINTRESOURCEA(IDI_IRONVALE), MAKEINTRESOURCEA(14) /* RT_GROUP_ICON */),
               nullptr);

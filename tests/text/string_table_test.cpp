@@ -7,10 +7,8 @@
 #include <sstream>
 
 #include "base/encoding.h"
-#include "base/exception.h"
 #include "tests/support/test_files.h"
 #include "text/excel_lexicon.h"
-#include "text/localization.h"
 #include "text/program_resource.h"
 
 namespace {
@@ -59,24 +57,6 @@ TEST(StringTableTest, EveryKeyHasATextInEveryLanguage) {
             EXPECT_EQ(Placeholders(text), Placeholders(english.Find(key))) << code << " " << key;
         }
     }
-}
-
-// One test: the module is process-wide and the window title is fixed at
-// its first use, so the order of the steps matters.
-TEST(LocalizationTest, SelectionFallbackAndTitle) {
-    Localization::SetLanguage("German");  // before the table exists: nothing
-    EXPECT_THROW(Localization::GetCurrentLanguage(), Exception);
-    Localization::Initialize();
-    EXPECT_EQ(GetWindowTitle(), L"Ironvale - Updater");
-    EXPECT_EQ(Localization::GetLanguageNames().size(), 8u);
-    // Only the exact name selects a language; other names change nothing.
-    for (const char* name : {"german", "Deutsch", "", "German", "GERMAN"}) Localization::SetLanguage(name);
-    EXPECT_EQ(Localization::GetCurrentLanguage().code, "GER_DE");
-    EXPECT_EQ(Localize("INSTALLER_DIALOG_CANCEL"), L"Abbrechen");
-    EXPECT_EQ(Localize("INSTALLER_NO_SUCH_KEY"), ExcelLexicon::NotFoundText());
-    EXPECT_EQ(GetWindowTitle(), L"Ironvale - Updater");
-    Localization::Initialize();  // a second time changes nothing
-    EXPECT_EQ(Localization::GetCurrentLanguage().code, "GER_DE");
 }
 
 }  // namespace

@@ -1,5 +1,5 @@
-// The publisher's tool where POSIX is needed: the archive commands with xz,
-// and names a POSIX file system allows but a patch cannot carry to Windows.
+// The publisher's tool where POSIX is needed: the archive commands with xz, keys and signatures with OpenSSL's command
+// line, and names a POSIX file system allows but a patch cannot carry to Windows.
 #include <gtest/gtest.h>
 
 #include <cstdlib>
@@ -43,8 +43,7 @@ TEST(ArchiveCommand, PacksListsAndExtractsWhatXzAlsoReads) {
     EXPECT_EQ(ReadTextFile(folder / "xz.bin"), data);
 }
 
-// Our keys and signatures are OpenSSL's, both ways; check sees a damaged
-// archive.
+// Our keys and signatures are OpenSSL's, both ways; check sees a damaged archive.
 TEST(SigningCommands, KeysAndSignaturesInteroperateWithOpenssl) {
     if (!Shell("command -v openssl >/dev/null")) GTEST_SKIP() << "openssl missing";
     TempFolder temp;
@@ -78,8 +77,7 @@ TEST(BuildErrors, UnusableInputsFailClearlyAndLeaveNothing) {
     WriteTree(tree, TreeOf("sub/ok-\xC3\xA9.txt=fine"));
     std::string deep = std::string(60, 'd');
     while (deep.size() < 256) deep += "/" + std::string(60, 'd');
-    // The option changed, and a folder (ending in "/") or file put into the
-    // tree for this case only.
+    // The option changed, and a folder (ending in "/") or file put into the tree for this case only.
     const std::tuple<std::string BuildOptions::*, std::string, std::string, const char*> cases[] = {
         {&BuildOptions::fromDir, temp / "nowhere", "", "Not a readable folder"},
         {&BuildOptions::toDir, temp / "nowhere", "", "Not a readable folder"},

@@ -12,18 +12,14 @@ namespace {
 
 using List = std::vector<std::string>;
 
-class UninstallerTest : public ::testing::Test {
-protected:
-    // Writes a description with these groups and merges it into record.
-    void Merge(Uninstaller& record, const std::string& groups) {
-        WriteTextFile(folder / "p.xml", "<P>" + groups + "</P>");
-        record.AddChanges(folder / "p.xml", true);
-    }
+// Writes a description with these groups into folder and merges it into record.
+void Merge(Uninstaller& record, const TempFolder& folder, const std::string& groups) {
+    WriteTextFile(folder / "p.xml", "<P>" + groups + "</P>");
+    record.AddChanges(folder / "p.xml", true);
+}
 
+TEST(Uninstaller, RecordsWhatWasAddedAndNoLaterDescriptionTookAway) {
     TempFolder folder;
-};
-
-TEST_F(UninstallerTest, RecordsWhatWasAddedAndNoLaterDescriptionTookAway) {
     const struct {
         List descriptions;
         List files;  // relative to the installation
@@ -42,14 +38,16 @@ TEST_F(UninstallerTest, RecordsWhatWasAddedAndNoLaterDescriptionTookAway) {
         Uninstaller record(folder.Path(), "Key", folder / "U.xml", "", true, "S-1-5-21-7", false);
         EXPECT_EQ(record.GetHive(), RegistryHive::LocalMachine);
         EXPECT_EQ(record.GetRegistryPath(), "Key");
-        for (const std::string& files : item.descriptions) Merge(record, "<FileChanges>" + files + "</FileChanges>");
+        for (const std::string& files : item.descriptions)
+            Merge(record, folder, "<FileChanges>" + files + "</FileChanges>");
         List expected;
         for (const std::string& name : item.files) expected.push_back(folder / name);
         EXPECT_EQ(record.GetFiles(), expected) << item.descriptions.front();
     }
 }
 
-TEST_F(UninstallerTest, SavesTheRecordThenAContinuedOneRemovesFilesAndDirectoriesDeepestFirst) {
+TEST(Uninstaller, SavesTheRecordThenAContinuedOneRemovesFilesAndDirectoriesDeepestFirst) {
+    TempFolder folder;
     MakeDirectories(folder / "data/x");
     MakeDirectories(folder / "saves");
     WriteTextFile(folder / "data/x/a.bin", "a");
@@ -61,17 +59,15 @@ TEST_F(UninstallerTest, SavesTheRecordThenAContinuedOneRemovesFilesAndDirectorie
     {
         // Per user, started by another user: that user's hive.
         Uninstaller record(folder.Path(), "Software\\Ironvale", recordPath, "", false, "S-1", false);
-        // Listed shallowest first: only the deepest-first order can remove them all with plain (non-recursive)
-        // removals.
-        Merge(record,
+        // Listed shallowest first: only the deepest-first order removes them all with plain (non-recursive) removals.
+        Merge(record, folder,
               "<FileChanges><new Path=\"data\\x\\a.bin\" /><new Path=\"gone.txt\" /></FileChanges>"
               "<DirectoryChanges><new Path=\"saves\" /><new Path=\"data\" /><new Path=\"data\\x\" />"
               "</DirectoryChanges><RegistryChanges><new Path=\"K\" /></RegistryChanges>"
               "<RegistryGroupChanges><new Path=\"G\" /></RegistryGroupChanges>");
         record.AddFile(recordPath);
         record.AddRecordFile();  // listed once
-        // An edited record may name anything: only the installation's own
-        // files may go.
+        // An edited record may name anything: only the installation's own files may go.
         record.AddFile(decoy);
         record.AddFile(folder / "data/../../" + GetFileName(decoy));
         ASSERT_TRUE(record.Save());
