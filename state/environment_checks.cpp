@@ -40,7 +40,7 @@ bool IsDirectXSufficient(const std::string& installedText, const std::string& re
     return parts.size() >= 3 && installed >= required;
 }
 
-bool IsVistaOrWindows7(const std::string& osName) { return osName == "Vista" || osName == "Windows7"; }
+bool IsVistaOrWindows7(const std::string& osName) { return osName == "Vista" || IsWindows7(osName); }
 
 AdminRights CheckAdminRights(IMachineFacts& facts) {
     AdminRights rights;
