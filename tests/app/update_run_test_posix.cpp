@@ -1,7 +1,9 @@
 // Whole runs of the updater, as a process of its own, against patches and
 // builds made by the publisher's tool and served over HTTP on 127.0.0.1,
 // with the player's answers on standard input.
+#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 
 #include <algorithm>
@@ -102,10 +104,10 @@ protected:
     ChildProcess Start(const std::string& answers, std::vector<std::string> arguments,
                        const std::string& program = "served_updater", const std::string& folder = "") {
         WriteTextFile(temp / "answers", answers);
+        const std::string path = program.find('/') == std::string::npos ? TestProgramPath(program) : program;
         const std::string script = "cd \"$0\" && TMPDIR='" + temp / "tmp" + "' exec \"$@\" <'" + temp / "answers" +
                                    "' >'" + temp / "output" + "' 2>&1";
-        arguments.insert(arguments.begin(),
-                         {"-c", script, folder.empty() ? temp.Path() : folder, TestProgramPath(program)});
+        arguments.insert(arguments.begin(), {"-c", script, folder.empty() ? temp.Path() : folder, path});
         return ChildProcess("/bin/sh", arguments);
     }
 
@@ -376,6 +378,30 @@ TEST_F(UpdateRun, UninstallerModesStayInsideTheInstallationAndTheDocuments) {
     EXPECT_FALSE(PathExists(PathJoin(install, "GL.ini")));
     EXPECT_EQ(ReadTextFile(temp / "beside.txt"), "beside the game");
     EXPECT_TRUE(PathExists(PathJoin(install, "IronvaleGame.exe")));
+}
+
+// The real program with no game installed: the language question (Enter
+// keeps the current one), then the message that says so. While another
+// copy holds the single-instance guard a second start is refused, but
+// never the elevated copy. (The log's exact format is checked under Wine.)
+TEST_F(UpdateRun, StartsAndKeepsASecondCopyOut) {
+    const std::string updater = IRONVALE_BINARY_DIR "/IronvaleUpdater";
+    DeleteDirectory(temp / "registry/HKEY_LOCAL_MACHINE/SOFTWARE/Halvard", true);
+    std::string output = Run("\n", {"-serverDeltaTime", "-3.7", "-hostname", "test host"}, updater);
+    EXPECT_NE(output.find("The game is not installed"), std::string::npos) << output;
+    // The program sees one command line rebuilt from its words.
+    const std::string log = ReadTextFile(temp / "tmp/IronvaleUpdater.log");
+    EXPECT_NE(log.find("Command line: -serverDeltaTime -3.7 -hostname \"test host\"\r\n"), std::string::npos) << log;
+    const int guard = open((temp / "tmp/IronvaleUpdater.lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0644);
+    ASSERT_EQ(flock(guard, LOCK_EX | LOCK_NB), 0);
+    EXPECT_EQ(Start("", {"-hostname", "test host"}, updater).Wait(), 255);
+    output = ReadTextFile(temp / "output");
+    EXPECT_NE(output.find("Another copy of the updater is already running."), std::string::npos) << output;
+    const std::string after = ReadTextFile(temp / "tmp/IronvaleUpdater.log");
+    const std::string last = after.substr(after.rfind('\n', after.size() - 2) + 1);
+    EXPECT_NE(last.find(": Error: There is already another updater instance running.\r\n"), std::string::npos) << last;
+    Run("\n", {"-internallyElevated", "1"}, updater);
+    close(guard);
 }
 
 }  // namespace
