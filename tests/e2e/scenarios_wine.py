@@ -463,9 +463,7 @@ def scenario_settings_removal(s, run):
 
 def scenario_uninstall_cleanup(s, run):
     """Mode 3 removes what the record lists inside the installation only."""
-    run.install_version(version_tree(1), "1")
-    write_tree(run.folder / "extra", {"corvid.dll": b"", "GL.ini": b"", "pb/pb.dll": b""})
-    shutil.copytree(run.folder / "extra", run.install, dirs_exist_ok=True)
+    run.install_version({**version_tree(1), "corvid.dll": b"", "GL.ini": b"", "pb/pb.dll": b""}, "1")
     listed = [p for p in version_tree(1) if "/" in p][:3]
     files = "".join(f'<new Path="{s.windows_path(run.install / p)}" />' for p in listed)
     files += f'<new Path="{s.windows_path(run.outside)}" /><new Path="{s.windows_path(run.install)}\\*" />'
