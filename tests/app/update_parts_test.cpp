@@ -1,9 +1,10 @@
-// The update's small rules: version texts, the history line and what the
-// clean-up leaves.
+// The update's small rules: version texts, the progress of the whole
+// download, the history line and what the clean-up leaves.
 #include <gtest/gtest.h>
 
 #include <tuple>
 
+#include "app/overall_progress.h"
 #include "app/temporary_files.h"
 #include "app/update_history.h"
 #include "app/version_text.h"
@@ -13,7 +14,7 @@
 
 namespace {
 
-TEST(VersionText, OlderFirstWordAndFolderNames) {
+TEST(VersionText, OlderAndFirstWord) {
     const std::tuple<const char*, const char*, bool> older[] = {
         {"9", "10", true},       {"10", "9", false}, {"999", "1000", true},  {"1000", "999", false},
         {"007", "7", false},     {"2", "2", false},  {"1.9", "1.10", false},  // not whole numbers: byte-wise
@@ -23,10 +24,25 @@ TEST(VersionText, OlderFirstWordAndFolderNames) {
         EXPECT_EQ(IsOlderVersion(installed, latest), expected) << installed << " < " << latest;
     }
     EXPECT_EQ(FirstWord("  \t\r\n12 and more"), "12");
-    EXPECT_EQ(FirstWord("7"), "7");
     EXPECT_EQ(FirstWord(" \n"), "");
-    EXPECT_EQ(PatchName(kPatchBaseVersion, "4"), "patch_515195_4");
-    EXPECT_EQ(BuildName("4"), "build_4");
+}
+
+TEST(OverallProgress, CompleteArchivesFillTheirSharesAndTheCurrentOneItsPart) {
+    // Archives done and in all, bytes of the current one fetched and in all; the progress in thousandths.
+    const std::tuple<int32_t, int32_t, uint32_t, uint32_t, int32_t> cases[] = {
+        {2, 4, 300, 600, 625},  // second of four complete, third half fetched
+        {4, 4, 0, 0, 1000},     // after the last archive
+        {0, 0, 5, 10, 1000},    // nothing to fetch counts as complete
+        {0, 3, 1, 2, 166},      // the share is truncated, not rounded
+        {1, 3, 0, 0, 333},      // no total known: no share
+        // A server without a length is measured against 1 MiB; a larger
+        // file must not run into the next archive's share or past 1000.
+        {1, 4, 3000000, 1048576, 500},
+        {3, 3, 5, 10, 1000},
+    };
+    for (const auto& [done, total, bytesDone, bytesTotal, expected] : cases) {
+        EXPECT_EQ(OverallProgress(done, total, bytesDone, bytesTotal), expected) << done << "/" << total;
+    }
 }
 
 TEST(UpdateHistory, OneLineWithoutLeadingZerosEndedByCrLf) {

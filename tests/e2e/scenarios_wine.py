@@ -1,15 +1,14 @@
 #!/usr/bin/env python3
 """IronvaleUpdater.exe under Wine as a player's machine runs it: the game in
-the registry, patches made by ironvale-patch and served by nginx on
-127.0.0.1 (or from the program's folder, or file://), the window on a
-private Xvfb display, dialog_answer playing the player. One table row per
-scenario; each checks exit code, boxes, the tree byte for byte, the version,
-the game's start, the log and what was left.
+the registry, patches made by ironvale-patch and served by nginx (or from
+the program's folder, or file://), the window on a private Xvfb display,
+dialog_answer playing the player. One table row per scenario.
 
   scenarios_wine.py BUILD_DIR [NAME...]   (the Windows build folder)
 """
 import os
 import random
+import re
 import shutil
 import signal
 import socket
@@ -24,10 +23,18 @@ YES, NO, OK, CANCEL, RETRY = 6, 7, 1, 2, 4
 ENGLISH, GERMAN, JAPANESE, POLISH = 0, 2, 4, 5
 LANGUAGES = ["English", "French", "German", "Italian", "Japanese", "Polish", "Russian", "Spanish"]
 OWN = ("InstallationData.xml", "Uninstall.xml", "UpdateHistory.log", "IronvaleGame.exe")
+QUIET = dict(stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
 
 
-def fail(message):
-    raise AssertionError(message)
+def check(ok, message):
+    if not ok:
+        raise AssertionError(message)
+
+
+def wait_until(condition, seconds, pause=0.05):
+    end = time.monotonic() + seconds
+    while not condition() and time.monotonic() < end:
+        time.sleep(pause)
 
 
 def version_tree(number, big=False):
@@ -60,21 +67,19 @@ class Session:
         self.programs = self.build / "tests/support/programs"
         self.work = Path(tempfile.mkdtemp(prefix="ivl-e2e-"))
         self.env = dict(os.environ, WINEPREFIX=str(self.build / "wineprefix"), WINEDEBUG="-all")
-        users = self.build / "wineprefix/drive_c/users" / os.environ.get("USER", "root")
-        self.log = next((d for d in (users / "Temp", users / "AppData/Local/Temp") if d.is_dir()), users / "Temp")
-        self.log /= "IronvaleUpdater.log"
+        self.users = self.build / "wineprefix/drive_c/users" / os.environ.get("USER", "root")
+        temp = next((d for d in (self.users / "Temp", self.users / "AppData/Local/Temp") if d.is_dir()), None)
+        self.log = (temp or self.users / "Temp") / "IronvaleUpdater.log"
         self.tool = next((t for p in ("native-asan", "native", "native-release")
                           if (t := self.build.parent / p / "tools/ironvale-patch").exists()), None)
-        if self.tool is None:
-            fail("build the native ironvale-patch first (cmake --preset native; cmake --build --preset native)")
+        check(self.tool, "build the native ironvale-patch first (cmake --preset native; cmake --build --preset native)")
         # No reset when the last client leaves. Wine's desktop process stays
         # tied to the display it was started on: the prefix's Wine processes
         # end before the session begins and again before its display goes.
         self.end_wine()
         read, write = os.pipe()
         self.xvfb = subprocess.Popen(["Xvfb", "-displayfd", str(write), "-screen", "0", "1024x768x24", "-nolisten",
-                                      "tcp", "-noreset"], pass_fds=[write], stdout=subprocess.DEVNULL,
-                                     stderr=subprocess.DEVNULL)
+                                      "tcp", "-noreset"], pass_fds=[write], **QUIET)
         os.close(write)
         self.env["DISPLAY"] = ":" + os.read(read, 32).decode().split()[0]
         os.close(read)
@@ -109,14 +114,18 @@ class Session:
                 if client.connect_ex(("127.0.0.1", port)) == 0:
                     return nginx, port
             time.sleep(0.05)
-        fail("nginx did not start")
+        check(False, "nginx did not start")
 
     def end_wine(self):
         for flag in ("-k", "-w"):  # -k signals the server; -w waits until it is gone
             subprocess.run(["/usr/lib/wine/wineserver", flag], env=self.env, stderr=subprocess.DEVNULL)
 
+    def forget_game(self):
+        for key in (["HKLM\\Software\\Halvard", "/reg:32"], ["HKCU\\Software\\Halvard"]):
+            self.wine("reg", "delete", *key, "/f", check=False)
+
     def close(self):
-        self.wine("reg", "delete", "HKLM\\Software\\Halvard", "/reg:32", "/f", check=False)
+        self.forget_game()
         self.end_wine()
         for process in (self.nginx, self.xvfb):
             process.terminate()
@@ -124,42 +133,44 @@ class Session:
         shutil.rmtree(self.work, ignore_errors=True)
 
     def wine(self, *args, check=True):
-        return subprocess.run([str(ROOT / "scripts/wine-run.sh"), *map(str, args)], env=self.env, check=check,
+        return subprocess.run([ROOT / "scripts/wine-run.sh", *map(str, args)], env=self.env, check=check,
                               stdout=subprocess.PIPE, stderr=subprocess.DEVNULL)
 
     def start(self, program, *args, env=None, cwd=None):
-        return subprocess.Popen([str(ROOT / "scripts/wine-run.sh"), str(program), *args], env=env or self.env,
-                                cwd=cwd, stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
+        return subprocess.Popen([ROOT / "scripts/wine-run.sh", program, *args], env=env or self.env, cwd=cwd, **QUIET)
 
-    def answer(self, button, timeout_ms=30000, caption=None, may_miss=False):
+    def answer(self, button, expected="", language=ENGLISH, caption=None, timeout_ms=30000, may_miss=False):
         """Waits for a box of the run, presses button (0: none, it stays) and
-        returns its text; "" when none came and may_miss."""
-        done = self.wine(self.programs / "dialog_answer.exe", caption or self.caption(), button, timeout_ms,
+        returns its text, which must hold expected (a string key or a text);
+        "" when none came and may_miss."""
+        done = self.wine(self.programs / "dialog_answer.exe", caption or self.caption(language), button, timeout_ms,
                          check=False)
-        if done.returncode != 0 and not may_miss:
-            fail(f"no box to answer with {button}")
-        return done.stdout.decode("utf-8", "replace").replace("\r", "") if done.returncode == 0 else ""
+        check(done.returncode == 0 or may_miss, f"no box to answer with {button}")
+        text = done.stdout.decode("utf-8", "replace").replace("\r", "") if done.returncode == 0 else ""
+        expected = self.text(expected, language) if expected in self.strings else expected
+        check(expected in text, f"expected '{expected}' in the box: {text}")
+        return text
 
     def windows_path(self, path):
         return "Z:" + str(path).replace("/", "\\")
 
     def publish(self, old, new, version, out):
         """The patch from tree old to new, the complete build of new, version.txt."""
-        write_tree(self.work / "trees/old", old)
-        write_tree(self.work / "trees/new", new)
-        trees, quiet = self.work / "trees", dict(check=True, stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
-        subprocess.run([self.tool, "build", "--from", trees / "old", "--to", trees / "new", "--version", version,
-                        "--out", out, "--max-archive-size", "3000"], **quiet)
-        subprocess.run([self.tool, "build", "--complete", "--to", trees / "new", "--version", version, "--out", out],
-                       **quiet)
-        subprocess.run([self.tool, "version", "--out", out, version], **quiet)
+        trees = self.work / "trees"
+        write_tree(trees / "old", old)
+        write_tree(trees / "new", new)
+        for how in (["--from", trees / "old", "--max-archive-size", "3000"], ["--complete"]):
+            subprocess.run([self.tool, "build", *how, "--to", trees / "new", "--version", version, "--out", out],
+                           check=True, **QUIET)
+        subprocess.run([self.tool, "version", "--out", out, version], check=True, **QUIET)
         return out / f"patch_515195_{version}"
 
     def run_log(self):
-        """The log of the last run, from its separator line on."""
-        lines = self.log.read_text(errors="replace").splitlines()
-        starts = [i for i, line in enumerate(lines) if line.endswith("-" * 103)]
-        return "\n".join(lines[starts[-1] if starts else 0:])
+        """The log of the last run, from the empty line before its separator
+        on, each line with its CR."""
+        lines = self.log.read_bytes().decode(errors="replace").split("\n")
+        starts = [i for i, line in enumerate(lines) if line.rstrip("\r").endswith("-" * 103)]
+        return "\n".join(lines[max(starts[-1] - 1, 0) if starts else 0:])
 
 
 class Run:
@@ -177,47 +188,55 @@ class Run:
     def install_version(self, tree, version, language=ENGLISH):
         write_tree(self.install, tree)
         shutil.copy(self.s.programs / "fake_game.exe", self.install / "IronvaleGame.exe")
-        self.set_version(version)
+        (self.install / "InstallationData.xml").write_text(
+            f"<InstallationData><CurrentVersion>{version}</CurrentVersion><PatcherVersion>3</PatcherVersion>"
+            "</InstallationData>")
         self.outside.write_text("beside the game")
         for name, value in (("Install Dir", self.s.windows_path(self.install) + "\\"), ("Language", LANGUAGES[language])):
             self.s.wine("reg", "add", "HKLM\\Software\\Halvard\\Ironvale", "/v", name, "/d", value, "/reg:32", "/f")
 
-    def set_version(self, version):
-        (self.install / "InstallationData.xml").write_text(
-            f"<InstallationData><CurrentVersion>{version}</CurrentVersion><PatcherVersion>3</PatcherVersion>"
-            "</InstallationData>")
+    def ready(self, out=None, language=ENGLISH):
+        """Version 1 installed, the patch to 2 published (on the server unless out); its folder."""
+        self.install_version(version_tree(1), "1", language)
+        return self.s.publish(version_tree(1), version_tree(2), "2", out or self.s.work / "server")
 
     def version(self):
-        return (self.install / "InstallationData.xml").read_text().split("<CurrentVersion>")[1].split("<")[0]
+        return re.search("<CurrentVersion>(.*?)<", (self.install / "InstallationData.xml").read_text())[1]
 
     def start(self, *args, program=None, cwd=None):
         return self.s.start(program or self.s.programs / "served_updater.exe", *args, env=self.env, cwd=cwd)
 
     def finish(self, process, code=1):
         try:
-            if process.wait(120) != code:
-                fail(f"exit code {process.returncode}, expected {code}")
+            check(process.wait(120) == code, f"exit code {process.returncode}, expected {code}")
         except subprocess.TimeoutExpired:
             process.kill()
-            fail("the run did not end (a box nobody expected?)")
+            check(False, "the run did not end (a box nobody expected?)")
+
+    def play(self, args, answers, tree, version, game=None, language=ENGLISH, **start):
+        """A run whose boxes get answers (expected text, button) in turn, then
+        the checks of expect; the boxes' texts."""
+        process = self.start(*args, **start)
+        texts = [self.s.answer(button, expected, language) for expected, button in answers]
+        self.finish(process)
+        self.expect(tree, version, game)
+        return texts
 
     def expect(self, tree, version, game=None):
         """The tree and version, nothing left over, nothing beside touched;
         game: a text its command line holds, None (not started) or "" (either)."""
-        if read_tree(self.install, OWN) != {k: v for k, v in tree.items() if k not in OWN}:
-            fail("the installed tree is not the expected version")
-        if self.version() != version or self.outside.read_text() != "beside the game":
-            fail(f"installed version {self.version()} (expected {version}), or the file beside it changed")
-        if any((self.install / own).exists() for own in ("tempPatch", "PPF.xml", "_PPF.xml")):
-            fail("work folder or record left over")
-        for _ in range(100 if game else 0):  # the game runs on after the updater has ended
-            if self.game_log.exists():
-                break
-            time.sleep(0.05)
+        check(read_tree(self.install, OWN) == {k: v for k, v in tree.items() if k not in OWN},
+              "the installed tree is not the expected version")
+        check(self.version() == version and self.outside.read_text() == "beside the game",
+              f"installed version {self.version()} (expected {version}), or the file beside it changed")
+        check(not any((self.install / own).exists() for own in ("tempPatch", "PPF.xml", "_PPF.xml")),
+              "work folder or record left over")
+        if game:  # the game runs on after the updater has ended
+            wait_until(self.game_log.exists, 5)
         started = self.game_log.read_text(errors="replace") if self.game_log.exists() else None
         self.game_log.unlink(missing_ok=True)
-        if game != "" and (started is None) != (game is None) or (game and game not in started):
-            fail(f"the game's start: {started}, expected {game}")
+        check(game == "" or (started is None) == (game is None) and (not game or game in started),
+              f"the game's start: {started}, expected {game}")
 
 
 def terminate(process):
@@ -227,36 +246,47 @@ def terminate(process):
     process.wait()
 
 
-def wait_for(s, process, line, pause=0.005):
-    while line not in s.run_log() and process.poll() is None:
-        time.sleep(pause)
-
-
-def ask(s, expected, button, language=ENGLISH):
-    text = s.answer(button, caption=s.caption(language))
-    if expected not in text:
-        fail(f"expected '{expected}' in the box: {text}")
-    return text
+def wait_for_line(s, process, line, pause=0.005):
+    wait_until(lambda: line in s.run_log() or process.poll() is not None, 120, pause)
 
 
 # ------------------------------------------------------------- scenarios
-def patch_with_questions(s, run, language=ENGLISH):
-    """1 to 2 over HTTP: both questions in the registry's language, the game
-    started, the patch's own addresses signed."""
-    s.publish(version_tree(1), version_tree(2), "2", s.work / "server")
-    run.install_version(version_tree(1), "1", language)
-    process = run.start()
-    ask(s, s.text("INSTALLER_PATCH_CONFIRM_UPADATE", language), YES, language)
-    labelled = ask(s, s.text("INSTALLER_SUCCESS_PATCH", language), YES, language)
-    if "[button] " + s.text("INSTALLER_DIALOG_YES", language) not in labelled:
-        fail(f"button label: {labelled}")
+def start_up(s, run):
+    """No game installed and no language chosen: the language dialog (OK
+    keeps the current one), then the not-installed box; the run's opening
+    log lines in their exact format."""
+    s.forget_game()
+    process = s.start(s.build / "IronvaleUpdater.exe", "-serverDeltaTime", "-3.7", "-hostname", "test host")
+    s.answer(OK)
+    s.answer(OK, "INSTALLER_GAME_IS_NOT_INSTALLED")
     run.finish(process)
-    run.expect(version_tree(2), "2", game="+webSiteHostName")
+    s.forget_game()
+    opening = ["", "-" * 103, "WinMain Enter", "Command line: -serverDeltaTime -3.7 -hostname \"test host\"",
+               "Arguments: ServerDeltaTime=-3 InternallyElevated=0 loggedIn=1 SessionId= HostName=test host"]
+    lines = s.run_log().split("\n")
+    for i, message in enumerate(opening):
+        check(i < len(lines) and re.fullmatch(r"\d{4}-[1-9]\d?-[1-9]\d? [1-9]?\d:[1-9]?\d:[1-9]?\d\.[1-9]?\d{0,2} "
+                                              r"Main\(\d+\): Info: " + re.escape(message) + "\r", lines[i]),
+              f"line {i} of the run: {lines[i:i + 1]}")
+
+
+def patch_1_to_2(s, run, language=ENGLISH, location=None, beside=None):
+    """1 to 2, both questions in the registry's language, the game started:
+    over HTTP with the patch's own addresses signed, or from the program's
+    own folder (beside) or a file:// location."""
+    run.ready(beside or location and run.folder / "served", language)
+    if beside:
+        shutil.copy(s.build / "IronvaleUpdater.exe", beside)
+    if location is not None:
+        run.env["IRONVALE_TEST_UPDATE_LOCATION"] = location
+    texts = run.play([], [("INSTALLER_PATCH_CONFIRM_UPADATE", YES), ("INSTALLER_SUCCESS_PATCH", YES)],
+                     version_tree(2), "2", "+webSiteHostName", language, program=beside and beside / "IronvaleUpdater.exe")
+    check("[button] " + s.text("INSTALLER_DIALOG_YES", language) in texts[1], f"button label: {texts[1]}")
+    if location is not None:
+        return
     requests = [line for line in (s.work / "access.log").read_text().splitlines() if "patch_515195_2" in line]
-    if not requests or any("e=" not in line or "h=" not in line for line in requests):
-        fail(f"unsigned patch requests: {requests}")
-    if "Patch URL:http://127.0.0.1" not in s.run_log():
-        fail("no Patch URL line in the log")
+    check(requests and all("e=" in line and "h=" in line for line in requests), f"unsigned requests: {requests}")
+    check("Patch URL:http://127.0.0.1" in s.run_log(), "no Patch URL line in the log")
 
 
 def interrupt_stage_two(s, run, rng):
@@ -264,7 +294,7 @@ def interrupt_stage_two(s, run, rng):
     run.install_version(version_tree(1, big=True), "1")
     process = run.start("-latestVersion", "2")
     s.answer(YES)
-    wait_for(s, process, "ApplyPatch Start")
+    wait_for_line(s, process, "ApplyPatch Start")
     time.sleep(rng.random() * 0.5)
     terminate(process)
 
@@ -277,14 +307,10 @@ def scenario_chain_resume(s, run):
         if run.version() == "-1":
             break
     s.publish(version_tree(2, big=True), version_tree(3, big=True), "3", s.work / "server")
-    process = run.start()  # the record is finished without a question, then 3 is offered
-    ask(s, "3", YES)
-    s.answer(NO)
-    run.finish(process)
-    run.expect(version_tree(3, big=True), "3")
+    # The record is finished without a question, then 3 is offered.
+    run.play([], [("3", YES), ("", NO)], version_tree(3, big=True), "3")
     history = (run.install / "UpdateHistory.log").read_text().splitlines()
-    if [line.split()[-1][-14:] for line in history] != ["patch_515195_2", "patch_515195_3"]:
-        fail(f"history: {history}")
+    check([line.split()[-1][-14:] for line in history] == ["patch_515195_2", "patch_515195_3"], f"history: {history}")
 
 
 def scenario_terminate(s, run):
@@ -306,21 +332,17 @@ def scenario_reinstall(s, run):
     damaged = dict(version_tree(2))
     damaged.pop(sorted(damaged)[0])
     run.install_version(damaged, "-1")
-    process = run.start("-latestVersion", "2")
-    s.answer(NO)
-    run.finish(process)
-    run.expect(version_tree(2), "2")
-    if "build_2" not in s.run_log():
-        fail("the complete build was not fetched")
+    run.play(["-latestVersion", "2"], [("", NO)], version_tree(2), "2")
+    check("build_2" in s.run_log(), "the complete build was not fetched")
 
 
-def cancel_in_window(s, run, wait_for_line):
+def cancel_in_window(s, run, line):
     process = run.start("-latestVersion", "2")
     s.answer(YES)
-    wait_for(s, process, wait_for_line, 0.05)
+    wait_for_line(s, process, line, 0.05)
     # The window is centred on the 1024 x 768 screen; "Cancel" is at (435, 443) in it.
     subprocess.run(["xdotool", "mousemove", str(246 + 435), str(143 + 443), "click", "1"], env=s.env, check=True)
-    ask(s, s.text("INSTALLER_CONFIRM_CANCEL"), YES)
+    s.answer(YES, "INSTALLER_CONFIRM_CANCEL")
     run.finish(process)
     run.expect(version_tree(1), "1")
 
@@ -349,40 +371,33 @@ def scenario_cancel_preparation(s, run):
 
 
 def scenario_missing_patch(s, run):
-    s.publish(version_tree(1), version_tree(2), "2", s.work / "server")
-    run.install_version(version_tree(1), "1")
-    process = run.start("-latestVersion", "7")
-    s.answer(YES)
-    ask(s, s.text("INSTALLER_ERROR_PLAY_OLD_VERSION"), YES)
-    run.finish(process)
-    run.expect(version_tree(1), "1", game="+webSiteHostName")
+    run.ready()
+    run.play(["-latestVersion", "7"], [("", YES), ("INSTALLER_ERROR_PLAY_OLD_VERSION", YES)], version_tree(1), "1",
+             "+webSiteHostName")
 
 
 def scenario_locked_file(s, run):
     """A file held as a running game holds it: the retry question, answered
     Retry once it is let go; then again with Cancel, which leaves stage two
     to the next start."""
-    s.publish(version_tree(1), version_tree(2), "2", s.work / "server")
     changed = next(p for p, c in version_tree(2).items() if version_tree(1).get(p, c) != c)
     for button in (RETRY, CANCEL):
-        run.install_version(version_tree(1), "1")
-        holder = subprocess.Popen([str(ROOT / "scripts/wine-run.sh"), str(s.programs / "hold_file.exe"),
+        run.ready()
+        holder = subprocess.Popen([ROOT / "scripts/wine-run.sh", s.programs / "hold_file.exe",
                                    s.windows_path(run.install / changed)], env=s.env, stdin=subprocess.PIPE,
                                   stdout=subprocess.PIPE, stderr=subprocess.DEVNULL)
-        if holder.stdout.readline().strip() != b"held":
-            fail("the file could not be held")
+        check(holder.stdout.readline().strip() == b"held", "the file could not be held")
         process = run.start("-latestVersion", "2")
         s.answer(YES)
-        ask(s, s.text("INSTALLER_FAILED_TO_MOVE_THE_FILE"), 0)
+        s.answer(0, "INSTALLER_FAILED_TO_MOVE_THE_FILE")
         if button == RETRY:
             holder.stdin.close()
         s.answer(button)
         if button == CANCEL:
-            ask(s, s.text("INSTALLER_ERROR_OCCURRED"), OK)
+            s.answer(OK, "INSTALLER_ERROR_OCCURRED")
             run.finish(process)
             holder.stdin.close()
-            if run.version() != "-1" or not (run.install / "PPF.xml").exists():
-                fail("a failed stage two must stay resumable")
+            check(run.version() == "-1" and (run.install / "PPF.xml").exists(), "a failed stage two must stay resumable")
             process = run.start("-latestVersion", "2")
         holder.wait()
         s.answer(NO)
@@ -406,73 +421,49 @@ HOSTILE = [  # what the patch does to the published patch, what the error box sa
     (lambda p: describe(p, '<DirectoryChanges><delete Path=".\\" /></DirectoryChanges>'), "Unsafe path"),
     (lambda p: describe(p, '<FileChanges><delete Path="*.*" /></FileChanges>'), "Unsafe path"),
     (lambda p: (p / "patchinfo.xml").write_text("not XML at all"), "Failed to load patch info file"),
-    (lambda p: damaged_archive(p, cut=40), "An error occurred"),
-    (lambda p: damaged_archive(p, flip=60), "An error occurred"),
+    (lambda p: damaged_archive(p, cut=40), "INSTALLER_ERROR_CORRUPT_DATA"),
+    (lambda p: damaged_archive(p, flip=60), "INSTALLER_ERROR_CORRUPT_DATA"),
 ]
 
 
 def scenario_hostile(s, run):
     for damage, expected in HOSTILE:
-        damage(s.publish(version_tree(1), version_tree(2), "2", s.work / "server"))
-        run.install_version(version_tree(1), "1")
-        process = run.start("-latestVersion", "2")
-        s.answer(YES)
-        ask(s, expected, OK)
-        run.finish(process)
-        run.expect(version_tree(1), "1")
+        damage(run.ready())
+        run.play(["-latestVersion", "2"], [("", YES), (expected, OK)], version_tree(1), "1")
 
 
 def scenario_up_to_date(s, run):
     run.install_version(version_tree(2), "2")
-    run.finish(run.start("-latestVersion", "2", "-hostname", "play.example.com"))
-    run.expect(version_tree(2), "2", game="+webSiteHostName play.example.com")
-
-
-def patch_without_server(s, run, location, beside=None):
-    """1 to 2 from the program's own folder (beside) or a file:// location."""
-    s.publish(version_tree(1), version_tree(2), "2", beside or run.folder / "served")
-    run.install_version(version_tree(1), "1")
-    run.env["IRONVALE_TEST_UPDATE_LOCATION"] = location
-    if beside:
-        shutil.copy(s.build / "IronvaleUpdater.exe", beside)
-    process = run.start(program=beside / "IronvaleUpdater.exe" if beside else None)
-    s.answer(YES)
-    s.answer(NO)
-    run.finish(process)
-    run.expect(version_tree(2), "2")
+    run.play(["-latestVersion", "2", "-hostname", "play.example.com"], [], version_tree(2), "2",
+             "+webSiteHostName play.example.com")
 
 
 def scenario_component_removal(s, run):
     """Mode 1 looks for corvid.dll in the installation, never where it was started."""
+    decoy = run.folder / "cwd/corvid.dll"
     for present in (True, False):
         run.install_version(version_tree(1), "1")
         if present:
             (run.install / "corvid.dll").write_text("component")
-        decoy = run.folder / "cwd/corvid.dll"
         write_tree(decoy.parent, {"corvid.dll": b"not the installation's"})
-        run.finish(run.start("-kdl_gl_remove", "-silent", "-delete_corvid", cwd=decoy.parent))
-        run.expect(version_tree(1), "1", game="-kdl_gl_remove -silent" if present else None)
-        if (run.install / "corvid.dll").exists() or not decoy.exists():
-            fail("corvid.dll: the installation's must go, the decoy must stay")
+        run.play(["-kdl_gl_remove", "-silent", "-delete_corvid"], [], version_tree(1), "1",
+                 "-kdl_gl_remove -silent" if present else None, cwd=decoy.parent)
+        check(decoy.exists(), "the decoy corvid.dll where the program was started must stay")
 
 
 def scenario_settings_removal(s, run):
-    users = s.build / "wineprefix/drive_c/users" / os.environ.get("USER", "root")
-    saves = (users / "Documents" if (users / "Documents").exists() else users / "My Documents") / "Ironvale"
+    saves = (s.users / "Documents" if (s.users / "Documents").exists() else s.users / "My Documents") / "Ironvale"
     for button in (NO, YES):
         write_tree(saves, {"saves/slot1.sav": b"progress"})
         process = run.start("-doRemoveSettings", "true")
         s.answer(button, caption=s.caption(header="INSTALLER_DIALOG_UNINSTALL"))
         run.finish(process)
-        if saves.exists() != (button == NO):
-            fail(f"saved games after {button}")
+        check(saves.exists() == (button == NO), f"saved games after {button}")
 
 
 def scenario_uninstall_cleanup(s, run):
     """Mode 3 removes what the record lists inside the installation only."""
-    run.install_version(version_tree(1), "1")
-    write_tree(run.folder / "extra", {"corvid.dll": b"", "GL.ini": b"", "pb/pb.dll": b""})
-    shutil.copytree(run.folder / "extra", run.install, dirs_exist_ok=True)
+    run.install_version({**version_tree(1), "corvid.dll": b"", "GL.ini": b"", "pb/pb.dll": b""}, "1")
     listed = [p for p in version_tree(1) if "/" in p][:3]
     files = "".join(f'<new Path="{s.windows_path(run.install / p)}" />' for p in listed)
     files += f'<new Path="{s.windows_path(run.outside)}" /><new Path="{s.windows_path(run.install)}\\*" />'
@@ -481,9 +472,8 @@ def scenario_uninstall_cleanup(s, run):
         "</IronvaleWestPatch>")
     run.finish(run.start("-doUninstallCleanup", "true"))
     left = read_tree(run.install)
-    if any(p in left for p in listed + ["corvid.dll", "GL.ini", "pb/pb.dll"]) or len(left) < 3 or \
-            run.outside.read_text() != "beside the game":
-        fail("only what the record lists inside the installation may go, and all of it")
+    check(not any(p in left for p in listed + ["corvid.dll", "GL.ini", "pb/pb.dll"]) and len(left) >= 3 and
+          run.outside.read_text() == "beside the game", "only what the record lists inside the installation may go")
 
 
 def scenario_elevated_copy(s, run):
@@ -492,23 +482,21 @@ def scenario_elevated_copy(s, run):
     user's key under HKEY_USERS (its language: Polish), and its exit code
     comes back."""
     sid = "S-1-5-21-4242-4242-4242-1002"
-    key = f"HKU\\{sid}\\Software\\Halvard\\Ironvale"
-    s.wine("reg", "delete", "HKLM\\Software\\Halvard", "/reg:32", "/f", check=False)
+    s.forget_game()
     for name, value in (("Install Dir", "C:\\Games\\Ironvale\\"), ("Language", "Polish")):
-        s.wine("reg", "add", key, "/v", name, "/d", value, "/f")
+        s.wine("reg", "add", f"HKU\\{sid}\\Software\\Halvard\\Ironvale", "/v", name, "/d", value, "/f")
     try:
         process = s.start(s.programs / "run_elevated.exe", s.windows_path(s.build / "IronvaleUpdater.exe"),
                           "-doRemoveSettings", "true", "-internallyElevated", "1", "-SID", sid)
-        text = s.answer(NO, caption=s.caption(POLISH, "INSTALLER_DIALOG_UNINSTALL"))
-        if s.text("INSTALLER_REMOVE_SAVES_AND_SETTINGS", POLISH) not in text:
-            fail(f"the copy asked: {text}")
+        s.answer(NO, "INSTALLER_REMOVE_SAVES_AND_SETTINGS", POLISH, s.caption(POLISH, "INSTALLER_DIALOG_UNINSTALL"))
         run.finish(process)
     finally:
         s.wine("reg", "delete", f"HKU\\{sid}", "/f", check=False)
 
 
 SCENARIOS = [
-    ("patch over HTTP", patch_with_questions),  # signed addresses, both questions, the game started
+    ("start-up", start_up),  # no game: the language dialog, the not-installed box, the log's format
+    ("patch over HTTP", patch_1_to_2),  # signed addresses, both questions, the game started
     ("chain 1 to 3", scenario_chain_resume),  # a record of an interrupted run resumed, then the newest
     ("reinstall", scenario_reinstall),  # -1 without a record: the complete build
     ("terminate", scenario_terminate),  # TerminateProcess in stage two, then a clean start
@@ -517,11 +505,11 @@ SCENARIOS = [
     ("missing patch", scenario_missing_patch),  # the play-old question; Yes starts the game
     ("locked file", scenario_locked_file),  # the retry question: Retry, then Cancel
     ("hostile", scenario_hostile),  # refused patches leave everything as it was
-    ("German", lambda s, run: patch_with_questions(s, run, GERMAN)),
-    ("Japanese", lambda s, run: patch_with_questions(s, run, JAPANESE)),
+    ("German", lambda s, run: patch_1_to_2(s, run, GERMAN)),
+    ("Japanese", lambda s, run: patch_1_to_2(s, run, JAPANESE)),
     ("up to date", scenario_up_to_date),  # no question, the game started
-    ("program folder", lambda s, run: patch_without_server(s, run, "", run.folder / "updater")),
-    ("file location", lambda s, run: patch_without_server(s, run, "file://" + s.windows_path(run.folder / "served"))),
+    ("program folder", lambda s, run: patch_1_to_2(s, run, location="", beside=run.folder / "updater")),
+    ("file location", lambda s, run: patch_1_to_2(s, run, location="file://" + s.windows_path(run.folder / "served"))),
     ("component removal", scenario_component_removal),  # mode 1
     ("settings removal", scenario_settings_removal),  # mode 2 answered No and Yes
     ("uninstall clean-up", scenario_uninstall_cleanup),  # mode 3

@@ -1,17 +1,15 @@
 # Shared set-up of the tests that run IronvaleUpdater.exe under Wine,
 # sourced with the script's arguments (the updater, hold_instance,
-# dialog_answer) unless the caller already set program, holder_exe and
-# answer_exe. Sets `root`, `run`, `WINEPREFIX` and `log`, and starts a
-# private display for the boxes, stopped on exit after the caller's
-# `cleanup` (if it defines one).
+# dialog_answer). Sets `root`, `run`, `WINEPREFIX` and `log`, defines
+# `fail` and `second_start`, and starts a private display for the boxes,
+# stopped on exit after the caller's `cleanup` (if it defines one).
 set -euo pipefail
-program=${program:-$(realpath "$1")}
-holder_exe=${holder_exe:-$(realpath "$2")}
-answer_exe=${answer_exe:-$(realpath "$3")}
-here=$(cd "$(dirname "${BASH_SOURCE[0]}")" && pwd)
-root=$(cd "$here/../.." && pwd)
+program=$(realpath "$1")
+holder_exe=$(realpath "$2")
+answer_exe=$(realpath "$3")
+root=$(cd "$(dirname "${BASH_SOURCE[0]}")/../.." && pwd)
 run="$root/scripts/wine-run.sh"
-source "$here/log_format.sh"
+fail() { echo "FAIL: $*" >&2; exit 1; }
 
 # One prefix per build folder, created by the wrapper on first use.
 export WINEPREFIX="$(dirname "$program")/wineprefix"
@@ -24,12 +22,12 @@ log="$WINEPREFIX/drive_c/users/$(id -un)/Temp/IronvaleUpdater.log"
 # reset when its last client leaves. Wine's desktop process stays tied to
 # the display it was started on, so the prefix's Wine processes end before
 # the session begins and again before its display goes.
-{ /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true
+end_wine() { { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true; }
+end_wine
 display_file=$(mktemp)
 Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp -noreset 3>"$display_file" >/dev/null 2>&1 &
 xvfb=$!
-trap '! declare -F cleanup >/dev/null || cleanup; { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true
-      kill $xvfb 2>/dev/null || true; rm -f "$display_file"' EXIT
+trap '! declare -F cleanup >/dev/null || cleanup; end_wine; kill $xvfb 2>/dev/null || true; rm -f "$display_file"' EXIT
 for _ in $(seq 200); do [ -s "$display_file" ] && break; sleep 0.05; done
 [ -s "$display_file" ] || fail "Xvfb did not start"
 export DISPLAY=:$(head -1 "$display_file")
