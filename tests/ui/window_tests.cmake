@@ -8,6 +8,6 @@ if(WIN32)
   ironvale_warnings(window_driver)
   add_test(NAME ui_window_wine COMMAND bash "${CMAKE_CURRENT_SOURCE_DIR}/ui/window_wine.sh" $<TARGET_FILE:IronvaleUpdater>
                                        $<TARGET_FILE:hold_instance> $<TARGET_FILE:dialog_answer> $<TARGET_FILE:window_driver>)
-  # It shares the Wine prefix (and its registry) with the start-up tests.
+  # It shares the Wine prefix (and its registry) with the scenarios.
   set_tests_properties(ui_window_wine PROPERTIES LABELS script TIMEOUT 300 RUN_SERIAL TRUE)
 endif()

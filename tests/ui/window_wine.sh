@@ -4,8 +4,34 @@
 # system's: window_driver shows them as the update run does and answers
 # its boxes, xdotool clicks and drags, window_picture.py reads the screen.
 #   window_wine.sh UPDATER HOLD_INSTANCE DIALOG_ANSWER WINDOW_DRIVER
-source "$(dirname "$0")/../e2e/wine_session.sh"
+set -euo pipefail
+program=$(realpath "$1")
+holder_exe=$(realpath "$2")
+answer_exe=$(realpath "$3")
 driver_exe=$(realpath "$4")
+root=$(cd "$(dirname "$0")/../.." && pwd)
+run="$root/scripts/wine-run.sh"
+fail() { echo "FAIL: $*" >&2; exit 1; }
+
+# One prefix per build folder, created by the wrapper on first use.
+export WINEPREFIX="$(dirname "$program")/wineprefix"
+"$run" "$holder_exe" 0 >/dev/null 2>&1 || true
+log="$WINEPREFIX/drive_c/users/$(id -un)/Temp/IronvaleUpdater.log"
+[ -d "$(dirname "$log")" ] || log="$WINEPREFIX/drive_c/users/$(id -un)/AppData/Local/Temp/IronvaleUpdater.log"
+
+# The X server picks a free display number itself and says it once it is
+# ready. It must not reset when its last client leaves. Wine's desktop
+# process stays tied to the display it was started on, so the prefix's Wine
+# processes end before the session begins and again before its display goes.
+end_wine() { { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true; }
+end_wine
+display_file=$(mktemp)
+Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp -noreset 3>"$display_file" >/dev/null 2>&1 &
+xvfb=$!
+trap 'cleanup; end_wine; kill $xvfb 2>/dev/null || true; rm -f "$display_file"' EXIT
+for _ in $(seq 200); do [ -s "$display_file" ] && break; sleep 0.05; done
+[ -s "$display_file" ] || fail "Xvfb did not start"
+export DISPLAY=:$(head -1 "$display_file")
 key='HKCU\Software\Halvard\Ironvale'
 driver_log="$(dirname "$log")/window_driver.log"
 scratch=$(mktemp -d)
@@ -82,9 +108,21 @@ stop_driver
 
 # The updater's own first box, before any window: the instance-running
 # warning, whose OK differs from the system's in Spanish.
+# It says so in a box, in its log, and by ending with -1.
 set_value Language Spanish
-second_start "Ironvale - Actualizador"
-grep -qx '\[button\] Aceptar' <<<"$text" || fail "the instance-running box's button"
+"$run" "$holder_exe" 60000 >"$scratch/holder.out" 2>&1 &
+holder=$!
+for _ in $(seq 100); do grep -q held "$scratch/holder.out" && break; sleep 0.1; done
+grep -q held "$scratch/holder.out" || fail "the holder did not take the mutex"
+code=0
+"$run" "$program" &
+second=$!
+text=$("$run" "$answer_exe" "Ironvale - Actualizador" 1 30000 | tr -d '\r') || true
+wait "$second" || code=$?
+kill "$holder"; wait "$holder" 2>/dev/null || true
+grep -qx '\[button\] Aceptar' <<<"$text" || fail "the instance-running box's button: $text"
+[ "$code" -eq 255 ] || fail "second instance exit code $code, expected 255 (-1)"
+tail -1 "$log" | grep -q ': Error: There is already another updater instance running\.' || fail "no log line"
 
 # Japanese. Wine finds fonts through fontconfig and remembers them in its
 # registry and in every running Wine process: each case gets a fontconfig
@@ -97,7 +135,7 @@ with_fonts() {  # NAME FOLDER...: the driver, knowing only these fonts
     echo "<cachedir>$scratch/fontcache</cachedir></fontconfig>"; } >"$scratch/$1.conf"
   export FONTCONFIG_FILE="$scratch/$1.conf"
   forget_fonts
-  { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true
+  end_wine
   start_driver
 }
 searched() {
