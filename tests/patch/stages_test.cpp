@@ -83,18 +83,6 @@ void InterruptAfter(TestBatch& batch, int actions) {
     EXPECT_THROW(run.Apply(), std::runtime_error);
 }
 
-TEST(Resume, InterruptedAfterEveryActionTheNextRunFinishesTheBatch) {
-    for (int k = 1; k <= kActions; ++k) {
-        SCOPED_TRACE("after action " + std::to_string(k));
-        TestBatch batch(kInstalled, kTarget);
-        InterruptAfter(batch, k);
-        ASSERT_TRUE(PathExists(PathJoin(batch.Root(), "PPF.xml")));
-        BatchRun(batch).Resume();
-        EXPECT_EQ(ReadTree(batch.Installation()), kTarget);
-        EXPECT_FALSE(PathExists(PathJoin(batch.Root(), "PPF.xml")));
-    }
-}
-
 // The record names the creation of "cfg", and the moves had begun: taking
 // the earlier deletion of "cfg" for it would throw away what was moved in.
 TEST(Resume, TheRecordedActionIsKnownByOrdinalAndPath) {

@@ -7,11 +7,12 @@
 #include <random>
 #include <sstream>
 
-#include "base/exception.h"
+#include "base/atomic_file.h"
 #include "base/file_operations.h"
 #include "base/file_stream.h"
 #include "base/paths.h"
 #include "tools/publisher/archive_writer.h"
+#include "tools/publisher/patch_builder.h"
 
 namespace fs = std::filesystem;
 
@@ -148,10 +149,24 @@ Tree NextVersion(const Tree& old, unsigned seed) {
     return next.File("top_new", RandomContent(random));
 }
 
-TestBatch::TestBatch(const Tree& installed, const Tree& target) {
+TestBatch::TestBatch(const Tree& installed, const Tree& target, bool published) {
     WriteTree(Installation(), installed);
-    for (const std::string& folder : {PatchedFiles(), PatchFolder()}) WriteTree(folder, Tree());
+    WriteTree(PatchedFiles(), Tree());
     WriteTextFile(VersionFile(), "1");
+    if (published) {
+        WriteTree(root / "new", target);
+        BuildOptions options;
+        options.fromDir = Installation();
+        options.toDir = root / "new";
+        options.version = "2";
+        options.outDir = root / "out";
+        options.maxArchiveSize = 3000;
+        fs::rename(fs::u8path(BuildPatch(options)), fs::u8path(PatchFolder()));
+        fs::rename(fs::u8path(PathJoin(PatchFolder(), "patchinfo.xml")), fs::u8path(root / "patchinfo.xml"));
+        for (const char* scratch : {"new", "out"}) fs::remove_all(fs::u8path(root / scratch));
+        return;
+    }
+    WriteTree(PatchFolder(), Tree());
     std::map<std::string, std::unique_ptr<ArchiveWriter>> archives;
     for (const auto& file : target.files) {
         const auto old = installed.files.find(file.first);
@@ -194,10 +209,8 @@ BatchRun::BatchRun(const std::string& root)
 }
 
 void BatchRun::Apply() {
-    stages.Apply(work, this, [this](const std::string& version) {
-        WriteTextFile(versionFile, version);
-        return true;
-    });
+    stages.Apply(work, this,
+                 [this](const std::string& version) { return ReplaceFileAtomically(versionFile, version); });
 }
 
 void BatchRun::Resume() {

@@ -38,10 +38,12 @@ Tree NextVersion(const Tree& old, unsigned seed);
 
 // A patch made from two trees, laid out as stage one finds it: the old tree
 // installed, the archives (one per top folder or top-level file) in the
-// patch folder, the description, and the installed version "1".
+// patch folder, the description, and the installed version "1". Published:
+// the archives and description are the publisher's tool's (which needs
+// xdelta3) instead.
 class TestBatch {
 public:
-    TestBatch(const Tree& installed, const Tree& target);
+    TestBatch(const Tree& installed, const Tree& target, bool published = false);
     std::string Root() const { return root.Path(); }  // also holds the progress record
     std::string Installation() const { return root / "install"; }
     std::string PatchedFiles() const { return root / "patched"; }
