@@ -16,6 +16,7 @@
 #include "patch/patch_progress_file.h"
 #include "patch/patch_stages.h"
 #include "tests/fuzz/fuzz_files.h"
+#include "tools/publisher/patch_description.h"
 
 namespace {
 
@@ -25,26 +26,6 @@ class ArchivesInPlace final : public IArchiveSource {
 public:
     ArchiveState WaitForArchive(const std::string&) override { return ArchiveState::Arrived; }
 };
-
-std::string XmlEscaped(const std::string& text) {
-    std::string escaped;
-    for (const char c : text) {
-        switch (c) {
-            case '&':
-                escaped += "&amp;";
-                break;
-            case '<':
-                escaped += "&lt;";
-                break;
-            case '"':
-                escaped += "&quot;";
-                break;
-            default:
-                escaped += c;
-        }
-    }
-    return escaped;
-}
 
 void Check(bool condition) {
     if (!condition) std::abort();
@@ -76,30 +57,26 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     fs::create_directories(install / "tempPatch" / "patched");
     WriteFuzzFile("outside.txt", data, 0);
     WriteFuzzFile("install/game.txt", data, 0);
-    std::string description = "<IronvaleWestPatch><FileChanges>";
-    const char* const kinds[] = {"<delete Path=\"", "<new File=\"patch0.lzma\" Path=\"",
-                                 "<diff File=\"patch0.lzma\" Path=\""};
-    for (size_t i = 0; i < names.size(); ++i) description += kinds[i % 3] + XmlEscaped(names[i]) + "\" />";
-    description += "</FileChanges><DirectoryChanges>";
+    PatchDescription description;
     for (size_t i = 0; i < names.size(); ++i) {
-        description += std::string(i % 2 ? "<new" : "<delete") + " Path=\"" + XmlEscaped(names[i]) + "\" />";
+        if (i % 3 == 0) {
+            description.deletedFiles.push_back(names[i]);
+        } else {
+            (i % 3 == 1 ? description.newFiles : description.diffFiles).emplace_back(names[i], "patch0.lzma");
+        }
+        (i % 2 ? description.newDirectories : description.deletedDirectories).push_back(names[i]);
     }
-    description += "</DirectoryChanges></IronvaleWestPatch>";
-    const std::string path = WriteFuzzFile("install/tempPatch/patchinfo.xml",
-                                           reinterpret_cast<const uint8_t*>(description.data()), description.size());
+    const std::string path = (install / "tempPatch" / "patchinfo.xml").string();
     try {
+        WritePatchDescription(description, path);
         PatchInfoFile info;
         info.Load(path);
         PatchProgressFile progress;
         progress.SetDirectory(install.string());
         PatchApplier applier;
         PatchStages stages(info, progress, applier);
-        const PatchBatch batch{install.string(),
-                               (install / "tempPatch").string(),
-                               (install / "tempPatch" / "patched").string(),
-                               "",
-                               "2",
-                               {}};
+        const std::string work = (install / "tempPatch").string();
+        const PatchBatch batch{install.string(), work, PathJoin(work, "patched"), "", "2", {}};
         ArchivesInPlace archives;
         try {
             stages.Prepare(batch, &archives, nullptr);

@@ -8,24 +8,14 @@
 #include <string>
 #include <vector>
 
-#include "base/archive_source.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/paths.h"
-#include "patch/patch_applier.h"
-#include "patch/patch_info_file.h"
-#include "patch/patch_progress_file.h"
-#include "patch/patch_stages.h"
-#include "tests/support/test_files.h"
+#include "tests/support/batch_fixture.h"
 #include "tools/publisher/archive_writer.h"
 #include "tools/publisher/lzma_encoder.h"
 
 namespace {
-
-class ArchivesInPlace final : public IArchiveSource {
-public:
-    ArchiveState WaitForArchive(const std::string&) override { return ArchiveState::Arrived; }
-};
 
 // One name of every kind the check refuses.
 // clang-format off
@@ -57,36 +47,25 @@ std::string Replace(std::string text, const std::string& what, const std::string
 class HostileItems : public ::testing::Test {
 protected:
     void SetUp() override {
-        MakeDirectories(PathJoin(install, "tempPatch/patched"));
-        MakeDirectories(temp / "outside");
-        WriteTextFile(PathJoin(install, "victim.txt"), "must survive");
-        WriteTextFile(PathJoin(install, "InstallationData.xml"), "<InstallationData />");
-        WriteTextFile(temp / "outside/keep.txt", "beside the game");
+        WriteTree(install,
+                  TreeOf("victim.txt=must survive|InstallationData.xml=<InstallationData />|tempPatch/patched/"));
+        WriteTree(temp / "outside", TreeOf("keep.txt=beside the game"));
         ArchiveWriter archive(PathJoin(install, "tempPatch/patch0.lzma"));
         archive.AddStoredMember("fine.txt", EncodeLzma("fine"));
         archive.Close();
     }
 
-    // Runs one stage on a description whose first item deletes victim.txt.
+    // Runs one stage on a description whose first item deletes victim.txt,
+    // with the work folders and the record inside the installation.
     void Run(const std::string& items, bool stageOne) {
-        const std::string description = PathJoin(install, "tempPatch/patchinfo.xml");
-        WriteTextFile(description, "<IronvaleWestPatch>" + Replace(items, "VICTIM", R"(<delete Path="victim.txt" />)") +
-                                       "</IronvaleWestPatch>");
-        PatchInfoFile info;
-        info.Load(description);
-        PatchProgressFile progress;
-        progress.SetDirectory(install);
-        PatchApplier applier;
-        PatchStages stages(info, progress, applier);
-        const PatchBatch batch{
-            install, PathJoin(install, "tempPatch"), PathJoin(install, "tempPatch/patched"), "served",
-            "2",     {"InstallationData.xml"}};
-        ArchivesInPlace archives;
-        if (stageOne) {
-            stages.Prepare(batch, &archives, nullptr);
-        } else {
-            stages.Apply(batch, nullptr, nullptr);
-        }
+        WriteTextFile(temp / "patchinfo.xml", "<IronvaleWestPatch>" +
+                                                  Replace(items, "VICTIM", R"(<delete Path="victim.txt" />)") +
+                                                  "</IronvaleWestPatch>");
+        BatchRun run(temp.Path());
+        run.work = {install, PathJoin(install, "tempPatch"), PathJoin(install, "tempPatch/patched"), "served",
+                    "2",     {"InstallationData.xml"}};
+        run.progress.SetDirectory(install);
+        stageOne ? run.Prepare() : run.Apply();
     }
 
     TempFolder temp;

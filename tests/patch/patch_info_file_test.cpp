@@ -12,131 +12,94 @@
 
 namespace {
 
-// Everything the cursors hand out, one "|"-ended list per cursor: file
-// items as "path@archive".
-std::string Lists(PatchInfoFile& info) {
+// Everything a description says, or the refusal and its code: one
+// "|"-ended list per cursor (file items as "path@archive"), then the hive,
+// registry path, space requirement, count of changes, version and archives.
+std::string Read(PatchInfoFile& info, const std::string& path) {
+    try {
+        info.Load(path);
+    } catch (const Exception& error) {
+        return error.message + " (" + std::to_string(error.code) + ")";
+    }
+    info.ResetIterators();
     std::string out;
-    std::string path;
+    std::string item;
     std::string archive;
     for (auto next : {&PatchInfoFile::NextDiffFile, &PatchInfoFile::NextNewFile}) {
-        while ((info.*next)(path, archive)) out += path + "@" + archive + " ";
+        while ((info.*next)(item, archive)) out += item + "@" + archive + " ";
         out += "| ";
     }
     for (auto next :
          {&PatchInfoFile::NextDeletedFile, &PatchInfoFile::NextNewDirectory, &PatchInfoFile::NextDeletedDirectory,
           &PatchInfoFile::NextNewRegistryKey, &PatchInfoFile::NextDeletedRegistryKey,
           &PatchInfoFile::NextNewRegistryGroup, &PatchInfoFile::NextDeletedRegistryGroup}) {
-        while ((info.*next)(path)) out += path + " ";
+        while ((info.*next)(item)) out += item + " ";
         out += "| ";
     }
-    EXPECT_EQ(path + archive, "") << "the end of a list empties the outputs";
+    EXPECT_EQ(item + archive, "") << "the end of a list empties the outputs";
+    out += std::to_string(static_cast<int>(info.GetHive())) + " " + info.GetRegistryPath() + " " +
+           std::to_string(info.GetSpaceRequirement()) + " " + std::to_string(info.CountFileAndDirectoryChanges()) +
+           " v" + info.GetVersion();
+    for (const auto& [name, declared] : info.GetDeclaredArchives()) {
+        out += " " + name + "=" + std::to_string(declared.size) + ":" + declared.sha256;
+    }
     return out;
 }
 
-TEST(PatchInfoFile, ReadsDescriptionsThroughTheNineCursors) {
-    TempFolder folder;
-    WriteTextFile(folder / "full.xml",
-                  "<?xml version=\"1.0\" ?>\n<AnyRootName>\n  <FileChanges>\n"
-                  "    <diff Path=\"bin\\game.exe\" File=\"patch1.pak\" /> <!-- a comment between items -->\n"
-                  "    <new Path=\"data\\new.dat\" File=\"patch2.pak\" /> <diff Path=\"bin\\engine.dll\" />\n"
-                  "    <delete Path=\"old.txt\" /> <unknown Path=\"skipped\" />\n  </FileChanges>\n"
-                  "  <FileChanges><diff Path=\"second list is ignored\" File=\"x\" /></FileChanges>\n"
-                  "  <DirectoryChanges><new Path=\"data\" /><delete Path=\"olddir\" /></DirectoryChanges>\n"
-                  "  <RegistryChanges><new Path=\"Key\\New\" /><delete Path=\"Key\\Old\" /></RegistryChanges>\n"
-                  "  <RegistryGroupChanges><new Path=\"Group\\New\" /><delete Path=\"Group\\Old\" />"
-                  "</RegistryGroupChanges>\n  <RegistryHive>HKEY_CURRENT_USER</RegistryHive>\n"
-                  "  <RegistryPath>Software\\Ironvale</RegistryPath>\n"
-                  "  <SpaceRequirement>123456789012</SpaceRequirement>\n</AnyRootName>\n");
-    PatchInfoFile info;
-    info.Load(folder / "full.xml");
-    EXPECT_EQ(info.GetHive(), RegistryHive::CurrentUser);
-    EXPECT_EQ(info.GetRegistryPath(), "Software\\Ironvale");
-    EXPECT_EQ(info.GetSpaceRequirement(), 123456789012);
-    EXPECT_EQ(info.CountFileAndDirectoryChanges(), 7);
-    info.ResetIterators();
-    EXPECT_EQ(Lists(info),
-              "bin\\game.exe@patch1.pak bin\\engine.dll@ | data\\new.dat@patch2.pak | old.txt | data | olddir | "
-              "Key\\New | Key\\Old | Group\\New | Group\\Old | ");
-
-    // Loading again forgets the first description; what is missing takes
-    // its default.
-    WriteTextFile(folder / "small.xml", "<P><DirectoryChanges><new Path=\"d\" /></DirectoryChanges></P>");
-    info.Load(folder / "small.xml");
-    info.ResetIterators();
-    EXPECT_EQ(Lists(info), "| | | d | | | | | | ");
-    EXPECT_EQ(info.CountFileAndDirectoryChanges(), 1);
-    EXPECT_EQ(info.GetHive(), RegistryHive::LocalMachine);
-    EXPECT_EQ(info.GetRegistryPath(), "");
-    EXPECT_EQ(info.GetSpaceRequirement(), -1);
-
-    // The space requirement reads as a stream reads a number; broken files
-    // and unknown hives are refused.
-    const auto load = [&](const std::string& content) {
-        WriteTextFile(folder / "p.xml", content);
-        PatchInfoFile other;
-        try {
-            other.Load(folder / "p.xml");
-            return std::to_string(other.GetSpaceRequirement());
-        } catch (const Exception& error) {
-            return error.message;
-        }
-    };
-    EXPECT_EQ(load("<P><SpaceRequirement>12abc</SpaceRequirement></P>"), "12");
-    EXPECT_EQ(load("<P><SpaceRequirement>abc</SpaceRequirement></P>"), "-1");
-    EXPECT_EQ(load("<P><SpaceRequirement>99999999999999999999</SpaceRequirement></P>"), "-1");
-    EXPECT_EQ(load("<P><FileChanges></P>"), "Failed to load patch info file.");
-    EXPECT_EQ(load("<P><RegistryHive>hkey_local_machine</RegistryHive></P>"), "Hive not recognized");
-}
-
-// The version a patch leads to and its archives' sizes and digests, which
-// the updater judges downloads by: a list it cannot read whole is refused.
-TEST(PatchInfoFile, ReadsTheDeclaredArchivesAndVersionOrRefusesTheList) {
+// One object loads every row in turn: what a row leaves out takes its
+// default, whatever the row before said.
+TEST(PatchInfoFile, ReadsDescriptionsOrRefusesThem) {
     const std::string digest(64, 'a');
-    const auto item = [](const std::string& attributes) { return "<archive " + attributes + " />"; };
-    const struct {
-        std::string archives;  // the content of <Archives>
-        std::string read;      // "name=size:sha256 ..." or the refusal's end
-    } cases[] = {
-        {item("File=\"p0.lzma\" Size=\"12\" Sha256=\"" + std::string(64, 'A') + "\"") + "<other />" +
-             item("File=\"p1.lzma\" Size=\"0\" Sha256=\"" + digest + "\""),
-         "p0.lzma=12:" + digest + " p1.lzma=0:" + digest + " "},
-        {item("Size=\"12\" Sha256=\"" + digest + "\""), "an archive without a name"},
-        {item("File=\"p0\" Sha256=\"" + digest + "\""), "the size of p0"},
-        {item("File=\"p0\" Size=\"-1\" Sha256=\"" + digest + "\""), "the size of p0"},
-        {item("File=\"p0\" Size=\" 12\" Sha256=\"" + digest + "\""), "the size of p0"},
-        {item("File=\"p0\" Size=\"9999999999999999999\" Sha256=\"" + digest + "\""), "the size of p0"},
-        {item("File=\"p0\" Size=\"1\" Sha256=\"" + digest.substr(1) + "\""), "the SHA-256 of p0"},
-        {item("File=\"p0\" Size=\"1\" Sha256=\"" + digest.substr(1) + "g\""), "the SHA-256 of p0"},
-        {item("File=\"p0\" Size=\"1\" Sha256=\"" + digest + "\"") +
-             item("File=\"p0\" Size=\"1\" Sha256=\"" + digest + "\""),
-         "p0 is listed twice"},
+    const auto archive = [](const std::string& name, const std::string& size, const std::string& sha256) {
+        return "<archive File=\"" + name + "\" Size=\"" + size + "\" Sha256=\"" + sha256 + "\" />";
+    };
+    const std::string badList = "Invalid archive list in patch info file: ";
+    const std::pair<std::string, std::string> rows[] = {
+        {"<AnyRootName>\n  <FileChanges>\n"
+         "    <diff Path=\"bin\\game.exe\" File=\"patch1.pak\" /> <!-- a comment between items -->\n"
+         "    <new Path=\"data\\new.dat\" File=\"patch2.pak\" /> <diff Path=\"bin\\engine.dll\" />\n"
+         "    <delete Path=\"old.txt\" /> <unknown Path=\"skipped\" />\n  </FileChanges>\n"
+         "  <FileChanges><diff Path=\"second list is ignored\" File=\"x\" /></FileChanges>\n"
+         "  <DirectoryChanges><new Path=\"data\" /><delete Path=\"olddir\" /></DirectoryChanges>\n"
+         "  <RegistryChanges><new Path=\"Key\\New\" /><delete Path=\"Key\\Old\" /></RegistryChanges>\n"
+         "  <RegistryGroupChanges><new Path=\"Group\\New\" /><delete Path=\"Group\\Old\" />"
+         "</RegistryGroupChanges>\n  <RegistryHive>HKEY_CURRENT_USER</RegistryHive>\n"
+         "  <RegistryPath>Software\\Ironvale</RegistryPath>\n  <SpaceRequirement>123456789012</SpaceRequirement>\n"
+         "  <Version>7</Version><Archives>" +
+             archive("p0.lzma", "12", std::string(64, 'A')) + "<other />" + archive("p1.lzma", "0", digest) +
+             "</Archives>\n</AnyRootName>\n",
+         "bin\\game.exe@patch1.pak bin\\engine.dll@ | data\\new.dat@patch2.pak | old.txt | data | olddir | "
+         "Key\\New | Key\\Old | Group\\New | Group\\Old | 2 Software\\Ironvale 123456789012 7 v7 p0.lzma=12:" +
+             digest + " p1.lzma=0:" + digest},
+        {"<P><DirectoryChanges><new Path=\"d\" /></DirectoryChanges></P>", "| | | d | | | | | | 1  -1 1 v"},
+        // The space requirement reads as a stream reads a number.
+        {"<P><SpaceRequirement>12abc</SpaceRequirement></P>", "| | | | | | | | | 1  12 0 v"},
+        {"<P><SpaceRequirement>abc</SpaceRequirement></P>", "| | | | | | | | | 1  -1 0 v"},
+        {"<P><SpaceRequirement>99999999999999999999</SpaceRequirement></P>", "| | | | | | | | | 1  -1 0 v"},
+        {"<P><FileChanges></P>", "Failed to load patch info file. (0)"},
+        {"<P><RegistryHive>hkey_local_machine</RegistryHive></P>", "Hive not recognized (0)"},
+        // The archives judge downloads: a list not read whole is refused.
+        {"<P><Archives><archive Size=\"12\" Sha256=\"" + digest + "\" /></Archives></P>",
+         badList + "an archive without a name (12)"},
+        {"<P><Archives><archive File=\"p0\" Sha256=\"" + digest + "\" /></Archives></P>",
+         badList + "the size of p0 (12)"},
+        {"<P><Archives>" + archive("p0", "-1", digest) + "</Archives></P>", badList + "the size of p0 (12)"},
+        {"<P><Archives>" + archive("p0", " 12", digest) + "</Archives></P>", badList + "the size of p0 (12)"},
+        {"<P><Archives>" + archive("p0", "9999999999999999999", digest) + "</Archives></P>",
+         badList + "the size of p0 (12)"},
+        {"<P><Archives>" + archive("p0", "1", digest.substr(1)) + "</Archives></P>",
+         badList + "the SHA-256 of p0 (12)"},
+        {"<P><Archives>" + archive("p0", "1", digest.substr(1) + "g") + "</Archives></P>",
+         badList + "the SHA-256 of p0 (12)"},
+        {"<P><Archives>" + archive("p0", "1", digest) + archive("p0", "1", digest) + "</Archives></P>",
+         badList + "p0 is listed twice (12)"},
     };
     TempFolder folder;
-    for (const auto& c : cases) {
-        SCOPED_TRACE(c.archives);
-        WriteTextFile(folder / "p.xml", "<P><Version>7</Version><Archives>" + c.archives + "</Archives></P>");
-        PatchInfoFile info;
-        try {
-            info.Load(folder / "p.xml");
-            std::string read;
-            for (const auto& [name, archive] : info.GetDeclaredArchives()) {
-                read += name + "=" + std::to_string(archive.size) + ":" + archive.sha256 + " ";
-            }
-            EXPECT_EQ(read, c.read);
-            EXPECT_EQ(info.GetVersion(), "7");
-        } catch (const Exception& error) {
-            EXPECT_EQ(error.Code(), ErrorCode::CorruptData);
-            EXPECT_EQ(error.message, "Invalid archive list in patch info file: " + c.read);
-        }
-    }
-    // Older descriptions say neither, also when loaded after one that did.
     PatchInfoFile info;
-    WriteTextFile(folder / "p.xml", "<P><Version>7</Version><Archives>" + cases[0].archives + "</Archives></P>");
-    info.Load(folder / "p.xml");
-    WriteTextFile(folder / "p.xml", "<P><FileChanges /></P>");
-    info.Load(folder / "p.xml");
-    EXPECT_EQ(info.GetVersion(), "");
-    EXPECT_TRUE(info.GetDeclaredArchives().empty());
+    for (const auto& [content, read] : rows) {
+        WriteTextFile(folder / "p.xml", content);
+        EXPECT_EQ(Read(info, folder / "p.xml"), read) << content;
+    }
 }
 
 TEST(PatchInfoFile, SavesTheUninstallSchemaAsTinyXmlPrintsIt) {
@@ -151,13 +114,6 @@ TEST(PatchInfoFile, SavesTheUninstallSchemaAsTinyXmlPrintsIt) {
                                "    <RegistryGroupChanges>\n        <new Path=\"Grp\" />\n    </RegistryGroupChanges>\n"
                                "    <RegistryHive>HKEY_USERS</RegistryHive>\n    <RegistryPath></RegistryPath>\n"
                                "</IronvaleWestPatch>\n"));
-    // Read back as a description, the items are its new items.
-    PatchInfoFile info;
-    info.Load(folder / "u.xml");
-    info.ResetIterators();
-    EXPECT_EQ(Lists(info), "| C:\\G\\a.txt@ C:\\G\\b&c.txt@ | | | | | | Grp | | ");
-    EXPECT_EQ(info.GetHive(), RegistryHive::Users);
-
     // A hive outside the three cannot be written, and nothing is.
     EXPECT_THROW(PatchInfoFile::Save(folder / "none.xml", {}, {}, {}, {}, RegistryHive::None, ""), Exception);
     EXPECT_FALSE(PathExists(folder / "none.xml"));
