@@ -19,14 +19,10 @@ public:
 // the unit tests cover, but cost ASan time per megabyte: left out for pace.
 bool ModestDictionary(const uint8_t* data, size_t size) {
     if (size < 13) return true;
-    uint64_t dictionary = 0, unpacked = 0;
-    bool known = false;
+    uint64_t dictionary = 0, unpacked = 0;  // an unknown size is all ones
     for (int i = 3; i >= 0; --i) dictionary = (dictionary << 8) | data[1 + i];
-    for (int i = 7; i >= 0; --i) {
-        unpacked = (unpacked << 8) | data[5 + i];
-        known = known || data[5 + i] != 0xFF;
-    }
-    return (known ? std::min(dictionary, unpacked) : dictionary) <= (1u << 20);
+    for (int i = 7; i >= 0; --i) unpacked = (unpacked << 8) | data[5 + i];
+    return std::min(dictionary, unpacked) <= (1u << 20);
 }
 
 }  // namespace

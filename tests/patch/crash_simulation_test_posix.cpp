@@ -96,9 +96,7 @@ public:
             current.erase(source);
         });
     }
-    void RemovedFile(const std::string& path) override {
-        Record(path, [this](const std::string& file) { current.erase(file); });
-    }
+    void RemovedFile(const std::string& path) override { RemovedDirectory(path); }  // nothing lies below
     void MadeDirectories(const std::string& path) override {
         Record(path, [this](const std::string& folder) {
             for (size_t slash = 0; slash != std::string::npos;) {

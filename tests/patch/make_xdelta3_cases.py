@@ -1,13 +1,8 @@
 #!/usr/bin/env python3
-"""Seeded old and new files and their xdelta3 deltas (no secondary compressor;
-with and without window checksums).
-
-  make_xdelta3_cases.py OUTDIR               the files and OUTDIR/manifest.txt
-  make_xdelta3_cases.py --fuzz-seeds OUTDIR  small ones packed as fuzz inputs
-
-Manifest lines name SOURCE DELTA TARGET; a fuzz input is the 2-byte source
-length (little-endian), the source, then the delta.
-"""
+"""Seeded files and their xdelta3 deltas (no secondary compressor; with and
+without window checksums). OUTDIR: the files and manifest.txt (lines SOURCE
+DELTA TARGET); --fuzz-seeds OUTDIR: small ones as fuzz inputs (2-byte source
+length, little-endian, the source, the delta)."""
 import random
 import struct
 import subprocess

@@ -6,12 +6,12 @@
 #include <ostream>
 #include <random>
 #include <sstream>
+#include <stdexcept>
 
 #include "base/atomic_file.h"
-#include "base/file_operations.h"
-#include "base/file_stream.h"
 #include "base/paths.h"
 #include "tools/publisher/archive_writer.h"
+#include "tools/publisher/lzma_encoder.h"
 #include "tools/publisher/patch_builder.h"
 
 namespace fs = std::filesystem;
@@ -155,13 +155,8 @@ TestBatch::TestBatch(const Tree& installed, const Tree& target, bool published) 
     WriteTextFile(VersionFile(), "1");
     if (published) {
         WriteTree(root / "new", target);
-        BuildOptions options;
-        options.fromDir = Installation();
-        options.toDir = root / "new";
-        options.version = "2";
-        options.outDir = root / "out";
-        options.maxArchiveSize = 3000;
-        fs::rename(fs::u8path(BuildPatch(options)), fs::u8path(PatchFolder()));
+        const std::string built = BuildPatch({Installation(), root / "new", "2", root / "out", 3000});
+        fs::rename(fs::u8path(built), fs::u8path(PatchFolder()));
         fs::rename(fs::u8path(PathJoin(PatchFolder(), "patchinfo.xml")), fs::u8path(root / "patchinfo.xml"));
         for (const char* scratch : {"new", "out"}) fs::remove_all(fs::u8path(root / scratch));
         return;
@@ -175,11 +170,8 @@ TestBatch::TestBatch(const Tree& installed, const Tree& target, bool published) 
         const std::string archive = file.first.substr(0, file.first.find('/')) + ".dat";
         if (!archives[archive]) archives[archive] = std::make_unique<ArchiveWriter>(PathJoin(PatchFolder(), archive));
         (old == installed.files.end() ? description.newFiles : description.diffFiles).emplace_back(path, archive);
-        WriteTextFile(root / "member",
-                      old == installed.files.end() ? file.second : PrefixDelta(old->second, file.second));
-        FileStream member;
-        member.Open(root / "member");
-        archives[archive]->AddMember(path, member);
+        archives[archive]->AddStoredMember(
+            path, EncodeLzma(old == installed.files.end() ? file.second : PrefixDelta(old->second, file.second)));
     }
     for (const auto& file : installed.files) {
         if (target.files.count(file.first) == 0) description.deletedFiles.push_back(Backslashed(file.first));
@@ -214,12 +206,8 @@ void BatchRun::Apply() {
 }
 
 void BatchRun::Resume() {
-    switch (FindInterruptedBatch(ReadTextFile(versionFile), progress)) {
-        case InterruptedBatch::Resume:
-            return Apply();
-        case InterruptedBatch::None:
-            return;
-        case InterruptedBatch::Reinstall:
-            throw std::runtime_error("the next start would reinstall the complete build");
-    }
+    const InterruptedBatch next = FindInterruptedBatch(ReadTextFile(versionFile), progress);
+    if (next == InterruptedBatch::Reinstall)
+        throw std::runtime_error("the next start would reinstall the complete build");
+    if (next == InterruptedBatch::Resume) Apply();
 }
