@@ -1,10 +1,15 @@
-// The archive scan and the LZMA decoder on arbitrary bytes: every input
-// must end in a result or an Exception, within bounded memory.
+// The binary formats of a patch on arbitrary bytes: every input must end in
+// a result or an Exception, within bounded memory. Each input goes to the
+// archive scan, the LZMA decoder and the VCDIFF decoder (which reads it as
+// a 2-byte little-endian source length, the source, then the delta), so
+// the seeds of each format serve its parser.
 #include <algorithm>
+#include <vector>
 
 #include "base/memory_stream.h"
 #include "patch/lzma_decoder.h"
 #include "patch/patch_archive.h"
+#include "patch/vcdiff_decoder.h"
 #include "tests/fuzz/fuzz_files.h"
 
 namespace {
@@ -25,9 +30,26 @@ bool ModestDictionary(const uint8_t* data, size_t size) {
     return std::min(dictionary, unpacked) <= (1u << 20);
 }
 
+void DecodeVcdiff(const uint8_t* data, size_t size) {
+    if (size < 2) return;
+    const size_t sourceLength = std::min<size_t>(data[0] | data[1] << 8, size - 2);
+    // Separate buffers, so that a read past either one is caught.
+    std::vector<uint8_t> sourceBytes(data + 2, data + 2 + sourceLength),
+        deltaBytes(data + 2 + sourceLength, data + size);
+    // Room for a good deal more than any input could describe without
+    // RUNs or copies; longer targets end in the decoder's write check.
+    static std::vector<uint8_t> target(4 << 20);
+    MemoryStream source, delta, output;
+    source.Attach(sourceBytes.data(), static_cast<int32_t>(sourceBytes.size()));
+    delta.Attach(deltaBytes.data(), static_cast<int32_t>(deltaBytes.size()));
+    output.Attach(target.data(), static_cast<int32_t>(target.size()));
+    ExpectNoCrash([&] { VcdiffDecoder::Decode(&source, &delta, &output); });
+}
+
 }  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+    DecodeVcdiff(data, size);
     const std::string archive = WriteFuzzFile("archive.pak", data, size);
     const std::string output = PathJoin(FuzzFolder(), "member.out");
     // The first member's own name reaches the decoder; a missing name
