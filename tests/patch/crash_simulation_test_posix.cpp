@@ -19,11 +19,6 @@
 
 namespace {
 
-std::string ParentOf(const std::string& path) {
-    const size_t slash = path.rfind('/');
-    return slash == std::string::npos ? std::string() : path.substr(0, slash);
-}
-
 // Records a run's operations, then replays them one by one onto a model:
 // every file and folder an inode with the bytes the program sees and those
 // on the disk, names as the program sees them and as the last sync left them.
@@ -109,10 +104,10 @@ public:
     void SyncedFolder(const std::string& path) override {
         Record(path, [this](const std::string& folder) {
             for (auto it = durable.begin(); it != durable.end();) {
-                it = ParentOf(it->first) == folder ? durable.erase(it) : std::next(it);
+                it = GetParentDirectory(it->first) == folder ? durable.erase(it) : std::next(it);
             }
             for (const auto& entry : current) {
-                if (ParentOf(entry.first) == folder) durable[entry.first] = entry.second;
+                if (GetParentDirectory(entry.first) == folder) durable[entry.first] = entry.second;
             }
         });
     }
@@ -151,7 +146,8 @@ private:
         Tree tree;
         for (const auto& [path, id] : names) {
             bool reachable = true;
-            for (std::string folder = ParentOf(path); !folder.empty() && reachable; folder = ParentOf(folder)) {
+            for (std::string folder = GetParentDirectory(path); !folder.empty() && reachable;
+                 folder = GetParentDirectory(folder)) {
                 reachable = names.count(folder) != 0 && inodes[names.at(folder)].folder;
             }
             const Inode& inode = inodes[id];
