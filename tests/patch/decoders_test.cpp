@@ -27,34 +27,38 @@
 
 namespace {
 
-// Reads the bytes attached (its failingRead-th read throws, as a file does
-// that cannot be read) and, unlike a memory stream, takes writes of nothing.
-struct Stream : MemoryStream {
+// A memory stream over its own bytes, with room for at least capacity. Its
+// failingRead-th read throws, as a file does that cannot be read, and it
+// takes writes of nothing.
+struct Bytes : MemoryStream {
+    explicit Bytes(const std::string& text, size_t capacity = 0) : bytes(text) {
+        bytes.resize(std::max(text.size(), capacity));
+        Attach(reinterpret_cast<uint8_t*>(&bytes[0]), static_cast<int32_t>(bytes.size()));
+    }
     uint32_t Read(void* destination, uint32_t count) override {
         if (++reads == failingRead) throw Exception("Failed to read data from file.");
         return MemoryStream::Read(destination, count);
     }
     uint32_t Write(const void* source, uint32_t count) override {
-        written.append(static_cast<const char*>(source), count);
-        return count;
+        return count == 0 ? 0 : MemoryStream::Write(source, count);
     }
+    std::string Written() { return bytes.substr(0, static_cast<size_t>(GetPosition())); }
+    std::string bytes;
     int failingRead = 0;
     int reads = 0;
-    std::string written;
 };
 
 // The decoded data, or "error: " and the Exception's text.
-std::string Decode(std::string lzma, int failingRead = 0) {
-    Stream input;
-    Stream output;
+std::string Decode(const std::string& lzma, int failingRead = 0) {
+    Bytes input(lzma);
+    Bytes output("", 1 << 18);
     input.failingRead = failingRead;
-    input.Attach(reinterpret_cast<uint8_t*>(&lzma[0]), static_cast<int32_t>(lzma.size()));
     try {
         DecodeLzma(input, output);
     } catch (const Exception& error) {
         return "error: " + error.message;
     }
-    return output.written;
+    return output.Written();
 }
 
 // Writes value over bytes bytes of the stream, lowest first.
@@ -230,16 +234,6 @@ std::string OwnTable(uint8_t nearSize, uint8_t sameSize, const std::vector<CodeT
     return Header(0x02) + Varint(compressed.size() + 2) + static_cast<char>(nearSize) + static_cast<char>(sameSize) +
            compressed;
 }
-
-// A memory stream over its own bytes, with room for at least capacity.
-struct Bytes : MemoryStream {
-    explicit Bytes(const std::string& text, size_t capacity = 0) : bytes(text) {
-        bytes.resize(std::max(text.size(), capacity));
-        Attach(reinterpret_cast<uint8_t*>(&bytes[0]), static_cast<int32_t>(bytes.size()));
-    }
-    std::string Written() { return bytes.substr(0, static_cast<size_t>(GetPosition())); }
-    std::string bytes;
-};
 
 // Runs the decoder's own steps, so that a missing source reaches it: what
 // reached the target, and the error text (empty on success).

@@ -57,6 +57,7 @@ TEST(PatchInfoFile, ReadsDescriptionsOrRefusesThem) {
     const auto archive = [](const std::string& name, const std::string& size, const std::string& sha256) {
         return "<archive File=\"" + name + "\" Size=\"" + size + "\" Sha256=\"" + sha256 + "\" />";
     };
+    const auto list = [](const std::string& archives) { return "<P><Archives>" + archives + "</Archives></P>"; };
     const std::string badList = "Invalid archive list in patch info file: ";
     const std::pair<std::string, std::string> rows[] = {
         {"<AnyRootName>\n  <FileChanges>\n"
@@ -83,20 +84,14 @@ TEST(PatchInfoFile, ReadsDescriptionsOrRefusesThem) {
         {"<P><FileChanges></P>", "Failed to load patch info file. (0)"},
         {"<P><RegistryHive>hkey_local_machine</RegistryHive></P>", "Hive not recognized (0)"},
         // The archives judge downloads: a list not read whole is refused.
-        {"<P><Archives><archive Size=\"12\" Sha256=\"" + digest + "\" /></Archives></P>",
-         badList + "an archive without a name (12)"},
-        {"<P><Archives><archive File=\"p0\" Sha256=\"" + digest + "\" /></Archives></P>",
-         badList + "the size of p0 (12)"},
-        {"<P><Archives>" + archive("p0", "-1", digest) + "</Archives></P>", badList + "the size of p0 (12)"},
-        {"<P><Archives>" + archive("p0", " 12", digest) + "</Archives></P>", badList + "the size of p0 (12)"},
-        {"<P><Archives>" + archive("p0", "9999999999999999999", digest) + "</Archives></P>",
-         badList + "the size of p0 (12)"},
-        {"<P><Archives>" + archive("p0", "1", digest.substr(1)) + "</Archives></P>",
-         badList + "the SHA-256 of p0 (12)"},
-        {"<P><Archives>" + archive("p0", "1", digest.substr(1) + "g") + "</Archives></P>",
-         badList + "the SHA-256 of p0 (12)"},
-        {"<P><Archives>" + archive("p0", "1", digest) + archive("p0", "1", digest) + "</Archives></P>",
-         badList + "p0 is listed twice (12)"},
+        {list("<archive Size=\"12\" Sha256=\"" + digest + "\" />"), badList + "an archive without a name (12)"},
+        {list("<archive File=\"p0\" Sha256=\"" + digest + "\" />"), badList + "the size of p0 (12)"},
+        {list(archive("p0", "-1", digest)), badList + "the size of p0 (12)"},
+        {list(archive("p0", " 12", digest)), badList + "the size of p0 (12)"},
+        {list(archive("p0", "9999999999999999999", digest)), badList + "the size of p0 (12)"},
+        {list(archive("p0", "1", digest.substr(1))), badList + "the SHA-256 of p0 (12)"},
+        {list(archive("p0", "1", digest.substr(1) + "g")), badList + "the SHA-256 of p0 (12)"},
+        {list(archive("p0", "1", digest) + archive("p0", "1", digest)), badList + "p0 is listed twice (12)"},
     };
     TempFolder folder;
     PatchInfoFile info;
