@@ -17,24 +17,13 @@
 #include "tests/fuzz/fuzz_files.h"
 #include "tools/publisher/patch_description.h"
 
-namespace {
-
 namespace fs = std::filesystem;
-
-void Check(bool condition) {
-    if (!condition) std::abort();
-}
-
-}  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     std::vector<std::string> names(1);
     for (size_t i = 0; i < size && names.size() <= 8; ++i) {
-        if (data[i] == '\n') {
-            names.emplace_back();
-        } else if (data[i] != 0) {
-            names.back() += static_cast<char>(data[i]);
-        }
+        if (data[i] == '\n') names.emplace_back();
+        if (data[i] != '\n' && data[i] != 0) names.back() += static_cast<char>(data[i]);
     }
     const fs::path root = FuzzFolder();
     const fs::path install = root / "install";
@@ -44,7 +33,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
         std::string portable = name;
         for (char& c : portable) c = c == '\\' ? '/' : c;
         const fs::path joined = (install / portable).lexically_normal();
-        Check(joined.string().rfind(install.string() + "/", 0) == 0);
+        if (joined.string().rfind(install.string() + "/", 0) != 0) std::abort();
     }
 
     fs::remove_all(install);
@@ -81,8 +70,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     }
     // Only the installation and the file beside it may be in the folder.
     for (const auto& entry : fs::directory_iterator(root)) {
-        Check(entry.path() == install || entry.path() == outside);
+        if (entry.path() != install && entry.path() != outside) std::abort();
     }
-    Check(fs::exists(outside));
+    if (!fs::exists(outside)) std::abort();
     return 0;
 }

@@ -144,14 +144,10 @@ private:
 
     Tree Image(const Names& names, Data data, std::mt19937& random) const {
         Tree tree;
-        for (const auto& [path, id] : names) {
-            bool reachable = true;
-            for (std::string folder = GetParentDirectory(path); !folder.empty() && reachable;
-                 folder = GetParentDirectory(folder)) {
-                reachable = names.count(folder) != 0 && inodes[names.at(folder)].folder;
-            }
+        for (const auto& [path, id] : names) {  // parents first: a name is reachable when its folder is
+            const std::string parent = GetParentDirectory(path);
+            if (!parent.empty() && tree.folders.count(parent) == 0) continue;
             const Inode& inode = inodes[id];
-            if (!reachable) continue;
             if (inode.folder) {
                 tree.folders.insert(path);
                 continue;
