@@ -199,10 +199,8 @@ void SimulateEveryCrash(const TestBatch& batch, const Tree& installed, const Tre
             } catch (const std::exception& error) {
                 outcome = error.what();
             }
-            if (!outcome.empty()) {
-                ++failures;
-                ADD_FAILURE() << "after operation " << k << " of " << simulator.OperationCount() << ": " << outcome;
-            }
+            EXPECT_EQ(outcome, "") << "after operation " << k << " of " << simulator.OperationCount();
+            failures += outcome.empty() ? 0 : 1;
         }
     }
     std::printf("crash states checked: %d\n", checked);

@@ -1,9 +1,6 @@
-// A batch run through both stages on real folders: the ways the stages end
-// early, the resume of a stage two cut short or killed, and hostile items.
-// Every name of a description passes one check before anything is written
-// or deleted, in both stages: a hostile item is refused with the item in
-// the message, and neither the installation nor anything beside it
-// changes, not even what the items before it would have done.
+// Batches run through both stages on real folders: early ends, the resume
+// of a stage two cut short or killed, and hostile items, which either stage
+// refuses before anything changes, even what the items before them would do.
 #include <gtest/gtest.h>
 
 #include <chrono>
@@ -68,25 +65,21 @@ TEST(StageOne, EndsEarlyWithAClearErrorAndTheInstallationUntouched) {
     }
 }
 
-// Ends stage two after some actions, as a crash would. "cfg" is deleted and
-// then created anew as the last action: one path, two actions.
-void InterruptAfter(TestBatch& batch, int actions) {
+// Stage two ends after its last action, as a crash would, and the moves
+// had begun. "cfg" is deleted and then created anew: the record names the
+// creation, and taking the deletion for it would throw away what was moved.
+TEST(Resume, TheRecordedActionIsKnownByOrdinalAndPath) {
+    TestBatch batch(kInstalled, kTarget);
     batch.description.deletedDirectories.push_back("cfg");
     batch.description.newDirectories.push_back("cfg");
     batch.WriteInfo();
     BatchRun run(batch);
     run.Prepare();
+    int actions = kActions;
     run.onReport = [&actions](const std::string&) {
         if (--actions == 0) throw std::runtime_error("interrupted");
     };
     EXPECT_THROW(run.Apply(), std::runtime_error);
-}
-
-// The record names the creation of "cfg", and the moves had begun: taking
-// the earlier deletion of "cfg" for it would throw away what was moved in.
-TEST(Resume, TheRecordedActionIsKnownByOrdinalAndPath) {
-    TestBatch batch(kInstalled, kTarget);
-    InterruptAfter(batch, kActions);
     ASSERT_TRUE(MoveFileReplacing(PathJoin(batch.PatchedFiles(), "cfg\\user.ini"),
                                   PathJoin(batch.Installation(), "cfg\\user.ini")));
     BatchRun(batch).Resume();

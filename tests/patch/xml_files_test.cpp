@@ -101,8 +101,33 @@ TEST(PatchInfoFile, ReadsDescriptionsOrRefusesThem) {
     }
 }
 
-TEST(PatchInfoFile, SavesTheUninstallSchemaAsTinyXmlPrintsIt) {
+std::string RecordText(int32_t action, const std::string& file) {
+    return "<?xml version=\"1.0\" ?>\n<WestPatchStatus>\n    <PatchPath>C:\\Game\\Patch</PatchPath>\n"
+           "    <PatchedFilesPath>C:\\Game\\Patch\\Patched</PatchedFilesPath>\n"
+           "    <PatchURI>http://host/patches/1_to_2/</PatchURI>\n    <PatchStatus action=\"" +
+           std::to_string(action) + "\" file=\"" + file + "\" />\n    <Version>2.0</Version>\n</WestPatchStatus>\n";
+}
+
+// The progress record and the uninstall schema, exactly as TinyXML prints them.
+TEST(XmlFiles, AreWrittenAsTinyXmlPrintsThem) {
     TempFolder folder;
+    WriteTextFile(folder / "full.xml", RecordText(12, "data\\old.bin"));
+    PatchProgressFile record;
+    record.SetDirectory(folder.Path());
+    ASSERT_TRUE(record.WriteRecord());
+    PatchProgressFile loaded;
+    loaded.LoadRecord(folder / "full.xml");
+    loaded.LoadRecord(folder / "PPF.xml");
+    EXPECT_EQ(loaded.GetPatchPath() + loaded.GetPatchedFilesPath() + loaded.GetPatchUri() + loaded.GetVersion() +
+                  loaded.GetFile() + std::to_string(loaded.GetActionIndex()),
+              "-1")
+        << "empty values replace the loaded ones";
+
+    record.LoadRecord(folder / "full.xml");
+    ASSERT_TRUE(record.WriteRecord());
+    EXPECT_EQ(ReadTextFile(folder / "PPF.xml"), WithPlatformLineBreaks(RecordText(12, "data\\old.bin")));
+    EXPECT_FALSE(PathExists(folder / "_PPF.xml"));
+
     ASSERT_TRUE(PatchInfoFile::Save(folder / "u.xml", {"C:\\G\\a.txt", "C:\\G\\b&c.txt"}, {}, {}, {"Grp"},
                                     RegistryHive::Users, ""));
     EXPECT_EQ(
@@ -116,35 +141,6 @@ TEST(PatchInfoFile, SavesTheUninstallSchemaAsTinyXmlPrintsIt) {
     // A hive outside the three cannot be written, and nothing is.
     EXPECT_THROW(PatchInfoFile::Save(folder / "none.xml", {}, {}, {}, {}, RegistryHive::None, ""), Exception);
     EXPECT_FALSE(PathExists(folder / "none.xml"));
-}
-
-std::string RecordText(int32_t action, const std::string& file) {
-    return "<?xml version=\"1.0\" ?>\n<WestPatchStatus>\n    <PatchPath>C:\\Game\\Patch</PatchPath>\n"
-           "    <PatchedFilesPath>C:\\Game\\Patch\\Patched</PatchedFilesPath>\n"
-           "    <PatchURI>http://host/patches/1_to_2/</PatchURI>\n    <PatchStatus action=\"" +
-           std::to_string(action) + "\" file=\"" + file + "\" />\n    <Version>2.0</Version>\n</WestPatchStatus>\n";
-}
-
-std::string Fields(const PatchProgressFile& record) {
-    return record.GetPatchPath() + "|" + record.GetPatchedFilesPath() + "|" + record.GetPatchUri() + "|" +
-           record.GetVersion() + "|" + std::to_string(record.GetActionIndex()) + "|" + record.GetFile();
-}
-
-TEST(PatchProgressFile, WritesTheRecordAsTinyXmlPrintsItAndReadsItBack) {
-    TempFolder folder;
-    WriteTextFile(folder / "full.xml", RecordText(12, "data\\old.bin"));
-    PatchProgressFile record;
-    record.SetDirectory(folder.Path());
-    ASSERT_TRUE(record.WriteRecord());
-    PatchProgressFile loaded;
-    loaded.LoadRecord(folder / "full.xml");
-    loaded.LoadRecord(folder / "PPF.xml");
-    EXPECT_EQ(Fields(loaded), "||||-1|") << "empty values replace the loaded ones";
-
-    record.LoadRecord(folder / "full.xml");
-    ASSERT_TRUE(record.WriteRecord());
-    EXPECT_EQ(ReadTextFile(folder / "PPF.xml"), WithPlatformLineBreaks(RecordText(12, "data\\old.bin")));
-    EXPECT_FALSE(PathExists(folder / "_PPF.xml"));
 }
 
 // "PPF.xml", "_PPF.xml" (or none), and the outcome: the action and file of

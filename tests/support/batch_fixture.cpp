@@ -188,11 +188,6 @@ TestBatch::TestBatch(const Tree& installed, const Tree& target, bool published) 
 
 void TestBatch::WriteInfo() const { WritePatchDescription(description, root / "patchinfo.xml"); }
 
-void BatchRun::OnApplyProgress(const std::string& fileName, int32_t permille) {
-    reports.emplace_back(fileName, permille);
-    if (onReport) onReport(fileName);
-}
-
 BatchRun::BatchRun(const std::string& root)
     : versionFile(PathJoin(root, "version")),
       work{PathJoin(root, "install"), PathJoin(root, "patch"), PathJoin(root, "patched"), "", "2", {}} {
