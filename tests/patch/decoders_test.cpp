@@ -19,6 +19,7 @@
 #include "patch/lzma_decoder.h"
 #include "patch/patch_archive.h"
 #include "patch/vcdiff_decoder.h"
+#include "tests/support/batch_fixture.h"
 #include "tests/support/test_files.h"
 #include "tools/publisher/lzma_encoder.h"
 
@@ -79,10 +80,7 @@ TEST(DecodeLzma, DecodesEveryShapeAndRefusesBrokenStreams) {
     const std::string sized = EncodeLzma(text);
     const std::string markedText = EncodeLzma(text, marked);
     const std::string sizeAndMarker = EncodeLzma(text, {5, 0, 3, 0, 2, true, true});
-    // Noise, so that the stream takes several reads.
-    std::string noise(200000, '\0');
-    uint32_t state = 1;
-    for (char& c : noise) c = static_cast<char>((state = state * 1103515245u + 12345u) >> 24);
+    const std::string noise = SeededBytes(200000, 1);  // a stream of several reads
     const struct {
         const char* name;
         std::string lzma;
@@ -247,8 +245,8 @@ std::pair<std::string, std::string> DecodeDelta(FileStream* source, const std::s
 }
 
 template <typename... Args>
-std::string Delta(Args... windowArguments) {
-    return Header() + Window(windowArguments...);
+std::string Delta(Args... window) {
+    return Header() + Window(window...);
 }
 
 const std::string kTargetSegment =
@@ -373,9 +371,8 @@ TEST(VcdiffDecoder, DecodesWhatXdelta3NeverWritesAndRefusesEveryDamage) {
 }
 
 TEST(VcdiffDecoder, DefaultCodeTableAndChecksum) {
-    // Entries of two instructions, which xdelta3 never writes: the first
-    // and last of every group, as the six rows carry them (index, then the
-    // types, sizes and modes of the two halves).
+    // Entries of two instructions, which xdelta3 never writes: the first and
+    // last of every group (index, types, sizes and modes of the two halves).
     const uint8_t entries[][7] = {
         {163, kAdd, kCopy, 1, 4, 0, 0}, {165, kAdd, kCopy, 1, 6, 0, 0}, {166, kAdd, kCopy, 2, 4, 0, 0},
         {234, kAdd, kCopy, 4, 6, 0, 5}, {235, kAdd, kCopy, 1, 4, 0, 6}, {246, kAdd, kCopy, 4, 4, 0, 8},

@@ -1,7 +1,6 @@
-// The two XML files of a batch: patch descriptions read through the nine
-// cursors or refused, the uninstall schema and the progress record written
-// exactly as TinyXML prints them, and the recovery matrix of "PPF.xml" and
-// "_PPF.xml" with every torn write.
+// The XML files of a batch: descriptions read or refused, the progress record
+// and uninstall schema printed as TinyXML does, and the progress record's
+// recovery from "PPF.xml" and "_PPF.xml" with every torn write.
 #include <gtest/gtest.h>
 
 #include <array>
