@@ -8,7 +8,6 @@
 #include <string>
 #include <vector>
 
-#include "base/exception.h"
 #include "base/item_path.h"
 #include "patch/patch_applier.h"
 #include "patch/patch_info_file.h"

@@ -31,10 +31,7 @@ public:
         for (const auto& [path, bytes] : tree.files) current[path] = durable[path] = NewInode(false, bytes);
         SetFileJournal(this);
     }
-    ~CrashSimulator() { StopRecording(); }
-    void StopRecording() {
-        if (GetFileJournal() == this) SetFileJournal(nullptr);
-    }
+    ~CrashSimulator() { SetFileJournal(nullptr); }
 
     size_t OperationCount() const { return operations.size(); }
     void Replay(size_t operation) { operations[operation](); }
@@ -128,14 +125,11 @@ private:
 
     // The path relative to the folder ("" for the folder itself).
     bool Relative(std::string& path) {
-        const std::string slashed = path + "/";
-        if (slashed.compare(0, root.size(), root) != 0) {
-            outside.push_back(path);
-            return false;
-        }
-        path = slashed.substr(root.size());
+        const bool inside = (path + "/").rfind(root, 0) == 0;
+        if (!inside) outside.push_back(path);
+        path = inside ? (path + "/").substr(root.size()) : path;
         while (!path.empty() && path.back() == '/') path.pop_back();
-        return true;
+        return inside;
     }
 
     void Record(std::string path, std::function<void(const std::string&)> operation) {
@@ -173,12 +167,11 @@ void SimulateEveryCrash(const TestBatch& batch, const Tree& installed, const Tre
     BatchRun run(batch);
     run.Prepare();
     run.Apply();
-    simulator.StopRecording();
+    SetFileJournal(nullptr);
     ASSERT_EQ(simulator.outside, std::vector<std::string>());
 
     std::mt19937 random(1);
-    int checked = 0;
-    int failures = 0;
+    int checked = 0, failures = 0;
     for (size_t k = 0; k <= simulator.OperationCount() && failures < 3; ++k) {
         if (k > 0) simulator.Replay(k - 1);
         for (const Tree& state : simulator.States(random)) {

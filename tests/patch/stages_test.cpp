@@ -34,7 +34,6 @@ const Tree kTarget =
         "game.exe=new|sub/kept.dat=kept|cfg/user.ini=new|data/nested deep/level.bin=l|readme=r|grows=now|"
         "shrinks=|new-empty=|fresh/empty/folder/|swap/swap=|old=file|Game Data/Bank 2.bnk=b")
         .File("a.bin", SeededBytes(50000, 1) + SeededBytes(30000, 2));
-const int kActions = 17;  // 5 files deleted, 4 folders deleted (cfg too), 8 created (cfg too)
 
 TEST(StageOne, EndsEarlyWithAClearErrorAndTheInstallationUntouched) {
     const std::tuple<std::function<void(BatchRun&)>, ErrorCode, std::string> cases[] = {
@@ -75,7 +74,7 @@ TEST(Resume, TheRecordedActionIsKnownByOrdinalAndPath) {
     batch.WriteInfo();
     BatchRun run(batch);
     run.Prepare();
-    int actions = kActions;
+    int actions = 17;  // 5 files deleted, 4 folders deleted (cfg too), 8 created (cfg too)
     run.onReport = [&actions](const std::string&) {
         if (--actions == 0) throw std::runtime_error("interrupted");
     };
@@ -86,10 +85,9 @@ TEST(Resume, TheRecordedActionIsKnownByOrdinalAndPath) {
     EXPECT_EQ(ReadTree(batch.Installation()), kTarget);
 }
 
-// Stage two in a process of its own, run whole once and then killed at
-// seeded moments (SIGKILL natively, TerminateProcess under Wine), then the
-// next start: the batch is finished to exactly the target, or it had not
-// begun and the old installation stands.
+// Stage two in a process of its own, run whole once, then killed at seeded
+// moments (SIGKILL natively, TerminateProcess under Wine): the next start
+// finishes it to exactly the target, or it had not begun and nothing changed.
 TEST(Kill, StageTwoKilledAtSeededMomentsIsFinishedByTheNextStart) {
     std::mt19937 random(20261206);
     long long fullRun = 0;  // microseconds, measured on the first run, which is not killed
@@ -133,8 +131,7 @@ const char* const kHostileNames[] = {
 // The updater's own work folder and records, which items may not reach.
 const char* const kOwnNames[] = {"tempPatch", "TEMPPATCH\\patched\\x", "PPF.xml", "_ppf.xml", "InstallationData.xml"};
 
-// Where the hostile name goes: the path of each item kind, or the archive
-// name of a file item.
+// Where the hostile name goes: each item kind's path, or a file's archive.
 const char* const kItems[] = {
     R"(<FileChanges>VICTIM<diff Path="NAME" File="patch0.lzma" /></FileChanges>)",
     R"(<FileChanges>VICTIM<new Path="NAME" File="patch0.lzma" /></FileChanges>)",

@@ -25,9 +25,7 @@ std::string Read(PatchInfoFile& info, const std::string& path) {
         return error.message + " (" + std::to_string(error.code) + ")";
     }
     info.ResetIterators();
-    std::string out;
-    std::string item;
-    std::string archive;
+    std::string out, item, archive;
     for (auto next : {&PatchInfoFile::NextDiffFile, &PatchInfoFile::NextNewFile}) {
         while ((info.*next)(item, archive)) out += item + "@" + archive + " ";
         out += "| ";
