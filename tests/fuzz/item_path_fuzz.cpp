@@ -8,58 +8,21 @@
 #include <string>
 #include <vector>
 
-#include "base/archive_source.h"
-#include "base/exception.h"
 #include "base/item_path.h"
 #include "patch/patch_applier.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
 #include "patch/patch_stages.h"
 #include "tests/fuzz/fuzz_files.h"
-
-namespace {
+#include "tools/publisher/patch_description.h"
 
 namespace fs = std::filesystem;
-
-class ArchivesInPlace final : public IArchiveSource {
-public:
-    ArchiveState WaitForArchive(const std::string&) override { return ArchiveState::Arrived; }
-};
-
-std::string XmlEscaped(const std::string& text) {
-    std::string escaped;
-    for (const char c : text) {
-        switch (c) {
-            case '&':
-                escaped += "&amp;";
-                break;
-            case '<':
-                escaped += "&lt;";
-                break;
-            case '"':
-                escaped += "&quot;";
-                break;
-            default:
-                escaped += c;
-        }
-    }
-    return escaped;
-}
-
-void Check(bool condition) {
-    if (!condition) std::abort();
-}
-
-}  // namespace
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     std::vector<std::string> names(1);
     for (size_t i = 0; i < size && names.size() <= 8; ++i) {
-        if (data[i] == '\n') {
-            names.emplace_back();
-        } else if (data[i] != 0) {
-            names.back() += static_cast<char>(data[i]);
-        }
+        if (data[i] == '\n') names.emplace_back();
+        if (data[i] != '\n' && data[i] != 0) names.back() += static_cast<char>(data[i]);
     }
     const fs::path root = FuzzFolder();
     const fs::path install = root / "install";
@@ -69,50 +32,45 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
         std::string portable = name;
         for (char& c : portable) c = c == '\\' ? '/' : c;
         const fs::path joined = (install / portable).lexically_normal();
-        Check(joined.string().rfind(install.string() + "/", 0) == 0);
+        if (joined.string().rfind(install.string() + "/", 0) != 0) std::abort();
     }
 
     fs::remove_all(install);
     fs::create_directories(install / "tempPatch" / "patched");
     WriteFuzzFile("outside.txt", data, 0);
     WriteFuzzFile("install/game.txt", data, 0);
-    std::string description = "<IronvaleWestPatch><FileChanges>";
-    const char* const kinds[] = {"<delete Path=\"", "<new File=\"patch0.lzma\" Path=\"",
-                                 "<diff File=\"patch0.lzma\" Path=\""};
-    for (size_t i = 0; i < names.size(); ++i) description += kinds[i % 3] + XmlEscaped(names[i]) + "\" />";
-    description += "</FileChanges><DirectoryChanges>";
+    PatchDescription description;
     for (size_t i = 0; i < names.size(); ++i) {
-        description += std::string(i % 2 ? "<new" : "<delete") + " Path=\"" + XmlEscaped(names[i]) + "\" />";
+        if (i % 3 == 0) {
+            description.deletedFiles.push_back(names[i]);
+        } else {
+            (i % 3 == 1 ? description.newFiles : description.diffFiles).emplace_back(names[i], "patch0.lzma");
+        }
+        (i % 2 ? description.newDirectories : description.deletedDirectories).push_back(names[i]);
     }
-    description += "</DirectoryChanges></IronvaleWestPatch>";
-    const std::string path = WriteFuzzFile("install/tempPatch/patchinfo.xml",
-                                           reinterpret_cast<const uint8_t*>(description.data()), description.size());
+    const std::string path = (install / "tempPatch" / "patchinfo.xml").string();
     try {
+        WritePatchDescription(description, path);
         PatchInfoFile info;
         info.Load(path);
         PatchProgressFile progress;
         progress.SetDirectory(install.string());
         PatchApplier applier;
         PatchStages stages(info, progress, applier);
-        const PatchBatch batch{install.string(),
-                               (install / "tempPatch").string(),
-                               (install / "tempPatch" / "patched").string(),
-                               "",
-                               "2",
-                               {}};
-        ArchivesInPlace archives;
+        const std::string work = (install / "tempPatch").string();
+        const PatchBatch batch{install.string(), work, PathJoin(work, "patched"), "", "2", {}};
         try {
-            stages.Prepare(batch, &archives, nullptr);
+            stages.Prepare(batch, nullptr, nullptr);
         } catch (const Exception&) {
-            // The archive does not exist: stage two runs on what was prepared.
+            // No archive comes: stage two runs on what was prepared.
         }
         stages.Apply(batch, nullptr, nullptr);
     } catch (const Exception&) {
     }
     // Only the installation and the file beside it may be in the folder.
     for (const auto& entry : fs::directory_iterator(root)) {
-        Check(entry.path() == install || entry.path() == outside);
+        if (entry.path() != install && entry.path() != outside) std::abort();
     }
-    Check(fs::exists(outside));
+    if (!fs::exists(outside)) std::abort();
     return 0;
 }

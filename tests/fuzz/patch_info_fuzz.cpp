@@ -1,9 +1,12 @@
-// PatchInfoFile::Load and every cursor on arbitrary files.
+// The two XML files of a batch on arbitrary bytes: PatchInfoFile::Load with
+// every cursor, and PatchProgressFile::LoadRecord.
 #include "patch/patch_info_file.h"
+#include "patch/patch_progress_file.h"
 #include "tests/fuzz/fuzz_files.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     const std::string path = WriteFuzzFile("patchinfo.xml", data, size);
+    ExpectNoCrash([&] { PatchProgressFile().LoadRecord(path); });
     ExpectNoCrash([&] {
         PatchInfoFile info;
         info.Load(path);

@@ -1,13 +1,9 @@
 #!/usr/bin/env python3
-"""Seeded old and new files and their xdelta3 deltas (no secondary compressor;
-with and without window checksums).
-
-  make_xdelta3_cases.py OUTDIR               the files and OUTDIR/manifest.txt
-  make_xdelta3_cases.py --fuzz-seeds OUTDIR  small ones packed as fuzz inputs
-
-Manifest lines name SOURCE DELTA TARGET; a fuzz input is the 2-byte source
-length (little-endian), the source, then the delta.
-"""
+"""Seeded files and their xdelta3 deltas (no secondary compressor; with and
+without window checksums). OUTDIR: the files and manifest.txt (lines SOURCE
+DELTA TARGET); --fuzz-seeds OUTDIR: small ones as fuzz inputs (2-byte source
+length, little-endian, the source, the delta)."""
+import itertools
 import random
 import struct
 import subprocess
@@ -74,12 +70,12 @@ def make_cases(outdir):
 def make_fuzz_seeds(outdir):
     outdir.mkdir(parents=True, exist_ok=True)
     s, t, d = (outdir / name for name in ("s", "t", "d"))
-    for name, source, target, options in pairs(random.Random(7), 8):
-        for suffix, checksums in (("", []), (".n", ["-n"])):
-            s.write_bytes(source)
-            t.write_bytes(target)
-            xdelta3(checksums + options, s, t, d)
-            (outdir / (name + suffix)).write_bytes(struct.pack("<H", len(source)) + source + d.read_bytes())
+    for (name, source, target, options), (suffix, checksums) in itertools.product(
+            pairs(random.Random(7), 8), (("", []), (".n", ["-n"]))):
+        s.write_bytes(source)
+        t.write_bytes(target)
+        xdelta3(checksums + options, s, t, d)
+        (outdir / (name + suffix)).write_bytes(struct.pack("<H", len(source)) + source + d.read_bytes())
     for scratch in (s, t, d):
         scratch.unlink()
 

@@ -1,15 +1,23 @@
-// A batch run through both stages on real folders: the result, the ways
-// the stages end early, and the resume of a stage two cut short.
+// Batches run through both stages on real folders: early ends, the resume
+// of a stage two cut short or killed, and hostile items, which either stage
+// refuses before anything changes, even what the items before them would do.
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <functional>
+#include <random>
 #include <stdexcept>
+#include <thread>
 #include <tuple>
+#include <vector>
 
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/paths.h"
 #include "tests/support/batch_fixture.h"
+#include "tests/support/child_process.h"
+#include "tools/publisher/archive_writer.h"
+#include "tools/publisher/lzma_encoder.h"
 
 namespace {
 
@@ -26,19 +34,6 @@ const Tree kTarget =
         "game.exe=new|sub/kept.dat=kept|cfg/user.ini=new|data/nested deep/level.bin=l|readme=r|grows=now|"
         "shrinks=|new-empty=|fresh/empty/folder/|swap/swap=|old=file|Game Data/Bank 2.bnk=b")
         .File("a.bin", SeededBytes(50000, 1) + SeededBytes(30000, 2));
-const int kActions = 17;  // 5 files deleted, 4 folders deleted (cfg too), 8 created (cfg too)
-
-TEST(Batch, InstallationEndsEqualToTheTarget) {
-    TestBatch batch(kInstalled, kTarget);
-    // A longer file left by an earlier attempt must not keep its tail.
-    WriteTree(batch.PatchedFiles(), Tree().File("a.bin", SeededBytes(100000, 3)));
-    BatchRun run(batch);
-    run.Prepare();
-    run.Apply();
-    EXPECT_EQ(ReadTree(batch.Installation()), kTarget);
-    EXPECT_TRUE(ReadTree(batch.PatchedFiles()).files.empty());
-    EXPECT_EQ(run.reports.back().second, 1000);
-}
 
 TEST(StageOne, EndsEarlyWithAClearErrorAndTheInstallationUntouched) {
     const std::tuple<std::function<void(BatchRun&)>, ErrorCode, std::string> cases[] = {
@@ -69,41 +64,148 @@ TEST(StageOne, EndsEarlyWithAClearErrorAndTheInstallationUntouched) {
     }
 }
 
-// Ends stage two after some actions, as a crash would. "cfg" is deleted and
-// then created anew as the last action: one path, two actions.
-void InterruptAfter(TestBatch& batch, int actions) {
+// Stage two ends after its last action, as a crash would, and the moves
+// had begun. "cfg" is deleted and then created anew: the record names the
+// creation, and taking the deletion for it would throw away what was moved.
+TEST(Resume, TheRecordedActionIsKnownByOrdinalAndPath) {
+    TestBatch batch(kInstalled, kTarget);
     batch.description.deletedDirectories.push_back("cfg");
     batch.description.newDirectories.push_back("cfg");
     batch.WriteInfo();
     BatchRun run(batch);
     run.Prepare();
+    int actions = 17;  // 5 files deleted, 4 folders deleted (cfg too), 8 created (cfg too)
     run.onReport = [&actions](const std::string&) {
         if (--actions == 0) throw std::runtime_error("interrupted");
     };
     EXPECT_THROW(run.Apply(), std::runtime_error);
-}
-
-TEST(Resume, InterruptedAfterEveryActionTheNextRunFinishesTheBatch) {
-    for (int k = 1; k <= kActions; ++k) {
-        SCOPED_TRACE("after action " + std::to_string(k));
-        TestBatch batch(kInstalled, kTarget);
-        InterruptAfter(batch, k);
-        ASSERT_TRUE(PathExists(PathJoin(batch.Root(), "PPF.xml")));
-        BatchRun(batch).Resume();
-        EXPECT_EQ(ReadTree(batch.Installation()), kTarget);
-        EXPECT_FALSE(PathExists(PathJoin(batch.Root(), "PPF.xml")));
-    }
-}
-
-// The record names the creation of "cfg", and the moves had begun: taking
-// the earlier deletion of "cfg" for it would throw away what was moved in.
-TEST(Resume, TheRecordedActionIsKnownByOrdinalAndPath) {
-    TestBatch batch(kInstalled, kTarget);
-    InterruptAfter(batch, kActions);
     ASSERT_TRUE(MoveFileReplacing(PathJoin(batch.PatchedFiles(), "cfg\\user.ini"),
                                   PathJoin(batch.Installation(), "cfg\\user.ini")));
     BatchRun(batch).Resume();
     EXPECT_EQ(ReadTree(batch.Installation()), kTarget);
+}
+
+// Stage two in a process of its own, run whole once, then killed at seeded
+// moments (SIGKILL natively, TerminateProcess under Wine): the next start
+// finishes it to exactly the target, or it had not begun and nothing changed.
+TEST(Kill, StageTwoKilledAtSeededMomentsIsFinishedByTheNextStart) {
+    std::mt19937 random(20261206);
+    long long fullRun = 0;  // microseconds, measured on the first run, which is not killed
+    int killed = 0;
+    for (int trial = 0; trial <= 6; ++trial) {
+        TestBatch batch(kInstalled, kTarget);
+        // A longer file left by an earlier attempt must not keep its tail.
+        WriteTree(batch.PatchedFiles(), Tree().File("a.bin", SeededBytes(100000, 3)));
+        BatchRun(batch).Prepare();
+        const auto start = std::chrono::steady_clock::now();
+        ChildProcess child(TestProgramPath("stage_two_child"), {batch.Root()});
+        if (trial > 0) {
+            std::this_thread::sleep_for(std::chrono::microseconds(random() % fullRun));
+            child.Kill();
+        }
+        const int code = child.Wait();
+        if (trial == 0) {
+            ASSERT_EQ(code, 0);
+            fullRun =
+                std::chrono::duration_cast<std::chrono::microseconds>(std::chrono::steady_clock::now() - start).count();
+        }
+        killed += code == 0 ? 0 : 1;
+        BatchRun(batch).Resume();
+        const std::string version = ReadTextFile(batch.VersionFile());
+        const Tree now = ReadTree(batch.Installation());
+        EXPECT_TRUE((version == "2" && now == kTarget) || (version == "1" && now == kInstalled)) << "trial " << trial;
+        EXPECT_FALSE(PathExists(PathJoin(batch.Root(), "PPF.xml")) || PathExists(PathJoin(batch.Root(), "_PPF.xml")));
+    }
+    EXPECT_GT(killed, 0);
+}
+
+// One name of every kind the check refuses.
+// clang-format off
+const char* const kHostileNames[] = {
+    "", ".", ".\\", "./.", "a\\..\\b", "..", "\\rooted", "/rooted", "C:\\x", "C:x", "\\\\host\\share\\x",
+    "a\\\\b", "*", "dat?", "*.*", "a<b", "a>b", "a|b", "a&#34;b", "a&#9;b", "trailing.", "trailing ", "dir.\\x",
+    "CON", "con.txt", "Aux\\x", "nul", "COM1", "lpt9.dat", "prn",
+};
+// clang-format on
+
+// The updater's own work folder and records, which items may not reach.
+const char* const kOwnNames[] = {"tempPatch", "TEMPPATCH\\patched\\x", "PPF.xml", "_ppf.xml", "InstallationData.xml"};
+
+// Where the hostile name goes: each item kind's path, or a file's archive.
+const char* const kItems[] = {
+    R"(<FileChanges>VICTIM<diff Path="NAME" File="patch0.lzma" /></FileChanges>)",
+    R"(<FileChanges>VICTIM<new Path="NAME" File="patch0.lzma" /></FileChanges>)",
+    R"(<FileChanges>VICTIM<delete Path="NAME" /></FileChanges>)",
+    R"(<FileChanges>VICTIM</FileChanges><DirectoryChanges><new Path="NAME" /></DirectoryChanges>)",
+    R"(<FileChanges>VICTIM</FileChanges><DirectoryChanges><delete Path="NAME" /></DirectoryChanges>)",
+    R"(<FileChanges>VICTIM<new Path="fine.txt" File="NAME" /></FileChanges>)",
+};
+
+std::string Replace(std::string text, const std::string& what, const std::string& with) {
+    return text.replace(text.find(what), what.size(), with);
+}
+
+class HostileItems : public ::testing::Test {
+protected:
+    void SetUp() override {
+        WriteTree(install,
+                  TreeOf("victim.txt=must survive|InstallationData.xml=<InstallationData />|tempPatch/patched/"));
+        WriteTree(temp / "outside", TreeOf("keep.txt=beside the game"));
+        ArchiveWriter archive(PathJoin(install, "tempPatch/patch0.lzma"));
+        archive.AddStoredMember("fine.txt", EncodeLzma("fine"));
+        archive.Close();
+        installed = ReadTree(install);
+    }
+
+    // Runs one stage on a description whose first item deletes victim.txt,
+    // with the work folders and the record inside the installation.
+    void Run(const std::string& items, bool stageOne) {
+        WriteTextFile(temp / "patchinfo.xml", "<IronvaleWestPatch>" +
+                                                  Replace(items, "VICTIM", R"(<delete Path="victim.txt" />)") +
+                                                  "</IronvaleWestPatch>");
+        BatchRun run(temp.Path());
+        run.work = {install, PathJoin(install, "tempPatch"), PathJoin(install, "tempPatch/patched"), "served",
+                    "2",     {"InstallationData.xml"}};
+        run.progress.SetDirectory(install);
+        stageOne ? run.Prepare() : run.Apply();
+    }
+
+    TempFolder temp;
+    std::string install = temp / "install";
+    Tree installed;
+};
+
+TEST_F(HostileItems, AreRefusedInBothStagesBeforeAnythingChanges) {
+    std::vector<std::pair<std::string, std::string>> cases;
+    for (const char* item : kItems) {
+        for (const char* name : kHostileNames) cases.emplace_back(item, name);
+    }
+    // Archive names lie in the work folder anyway.
+    for (size_t item = 0; item + 1 < std::size(kItems); ++item) {
+        for (const char* name : kOwnNames) cases.emplace_back(kItems[item], name);
+    }
+    for (const auto& [item, name] : cases) {
+        for (const bool stageOne : {true, false}) {
+            SCOPED_TRACE(Replace(item, "NAME", name) + (stageOne ? " in stage one" : " in stage two"));
+            try {
+                Run(Replace(item, "NAME", name), stageOne);
+                ADD_FAILURE() << "accepted";
+            } catch (const Exception& error) {
+                EXPECT_EQ(error.code, 0);
+                EXPECT_NE(error.message.find("Unsafe path in patch description"), std::string::npos) << error.message;
+            }
+            EXPECT_EQ(ReadTree(install), installed);  // no record, nothing prepared
+            EXPECT_EQ(ReadTree(temp / "outside"), TreeOf("keep.txt=beside the game"));
+        }
+    }
+    // Names that only look like the refused ones are ordinary files.
+    for (const char* name :
+         {"console.txt", "COM10.dat", "lpt.txt", "a.b.c", "with space.txt", ".hidden", "x..y", "deep\\er/mixed"}) {
+        SCOPED_TRACE(name);
+        Run(Replace(kItems[1], "NAME", name), false);
+        EXPECT_FALSE(PathExists(PathJoin(install, "victim.txt")));
+        WriteTextFile(PathJoin(install, "victim.txt"), "must survive");
+    }
 }
 
 }  // namespace

@@ -6,12 +6,13 @@
 #include <ostream>
 #include <random>
 #include <sstream>
+#include <stdexcept>
 
-#include "base/exception.h"
-#include "base/file_operations.h"
-#include "base/file_stream.h"
+#include "base/atomic_file.h"
 #include "base/paths.h"
 #include "tools/publisher/archive_writer.h"
+#include "tools/publisher/lzma_encoder.h"
+#include "tools/publisher/patch_builder.h"
 
 namespace fs = std::filesystem;
 
@@ -148,10 +149,19 @@ Tree NextVersion(const Tree& old, unsigned seed) {
     return next.File("top_new", RandomContent(random));
 }
 
-TestBatch::TestBatch(const Tree& installed, const Tree& target) {
+TestBatch::TestBatch(const Tree& installed, const Tree& target, bool published) {
     WriteTree(Installation(), installed);
-    for (const std::string& folder : {PatchedFiles(), PatchFolder()}) WriteTree(folder, Tree());
+    WriteTree(PatchedFiles(), Tree());
     WriteTextFile(VersionFile(), "1");
+    if (published) {
+        WriteTree(root / "new", target);
+        const std::string built = BuildPatch({Installation(), root / "new", "2", root / "out", 3000});
+        fs::rename(fs::u8path(built), fs::u8path(PatchFolder()));
+        fs::rename(fs::u8path(PathJoin(PatchFolder(), "patchinfo.xml")), fs::u8path(root / "patchinfo.xml"));
+        for (const char* scratch : {"new", "out"}) fs::remove_all(fs::u8path(root / scratch));
+        return;
+    }
+    WriteTree(PatchFolder(), Tree());
     std::map<std::string, std::unique_ptr<ArchiveWriter>> archives;
     for (const auto& file : target.files) {
         const auto old = installed.files.find(file.first);
@@ -160,11 +170,8 @@ TestBatch::TestBatch(const Tree& installed, const Tree& target) {
         const std::string archive = file.first.substr(0, file.first.find('/')) + ".dat";
         if (!archives[archive]) archives[archive] = std::make_unique<ArchiveWriter>(PathJoin(PatchFolder(), archive));
         (old == installed.files.end() ? description.newFiles : description.diffFiles).emplace_back(path, archive);
-        WriteTextFile(root / "member",
-                      old == installed.files.end() ? file.second : PrefixDelta(old->second, file.second));
-        FileStream member;
-        member.Open(root / "member");
-        archives[archive]->AddMember(path, member);
+        archives[archive]->AddStoredMember(
+            path, EncodeLzma(old == installed.files.end() ? file.second : PrefixDelta(old->second, file.second)));
     }
     for (const auto& file : installed.files) {
         if (target.files.count(file.first) == 0) description.deletedFiles.push_back(Backslashed(file.first));
@@ -181,11 +188,6 @@ TestBatch::TestBatch(const Tree& installed, const Tree& target) {
 
 void TestBatch::WriteInfo() const { WritePatchDescription(description, root / "patchinfo.xml"); }
 
-void BatchRun::OnApplyProgress(const std::string& fileName, int32_t permille) {
-    reports.emplace_back(fileName, permille);
-    if (onReport) onReport(fileName);
-}
-
 BatchRun::BatchRun(const std::string& root)
     : versionFile(PathJoin(root, "version")),
       work{PathJoin(root, "install"), PathJoin(root, "patch"), PathJoin(root, "patched"), "", "2", {}} {
@@ -194,19 +196,13 @@ BatchRun::BatchRun(const std::string& root)
 }
 
 void BatchRun::Apply() {
-    stages.Apply(work, this, [this](const std::string& version) {
-        WriteTextFile(versionFile, version);
-        return true;
-    });
+    stages.Apply(work, this,
+                 [this](const std::string& version) { return ReplaceFileAtomically(versionFile, version); });
 }
 
 void BatchRun::Resume() {
-    switch (FindInterruptedBatch(ReadTextFile(versionFile), progress)) {
-        case InterruptedBatch::Resume:
-            return Apply();
-        case InterruptedBatch::None:
-            return;
-        case InterruptedBatch::Reinstall:
-            throw std::runtime_error("the next start would reinstall the complete build");
-    }
+    const InterruptedBatch next = FindInterruptedBatch(ReadTextFile(versionFile), progress);
+    if (next == InterruptedBatch::Reinstall)
+        throw std::runtime_error("the next start would reinstall the complete build");
+    if (next == InterruptedBatch::Resume) Apply();
 }

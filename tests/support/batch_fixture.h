@@ -37,11 +37,11 @@ Tree RandomTree(unsigned seed);
 Tree NextVersion(const Tree& old, unsigned seed);
 
 // A patch made from two trees, laid out as stage one finds it: the old tree
-// installed, the archives (one per top folder or top-level file) in the
-// patch folder, the description, and the installed version "1".
+// installed with version "1", the archives (one per top folder or file) and
+// the description; published: those of the publisher's tool (needs xdelta3).
 class TestBatch {
 public:
-    TestBatch(const Tree& installed, const Tree& target);
+    TestBatch(const Tree& installed, const Tree& target, bool published = false);
     std::string Root() const { return root.Path(); }  // also holds the progress record
     std::string Installation() const { return root / "install"; }
     std::string PatchedFiles() const { return root / "patched"; }
@@ -63,14 +63,16 @@ public:
     explicit BatchRun(const std::string& root);
     explicit BatchRun(const TestBatch& batch) : BatchRun(batch.Root()) {}
     ArchiveState WaitForArchive(const std::string&) override { return state; }
-    void OnApplyProgress(const std::string& fileName, int32_t permille) override;
+    void OnApplyProgress(const std::string& fileName, int32_t permille) override {
+        reports.emplace_back(fileName, permille);
+        if (onReport) onReport(fileName);
+    }
     void OnFileProgress(const std::string&, uint32_t, uint32_t) override {}
     void OnFileDone(const std::string&) override {}
     void Prepare() { stages.Prepare(work, this, this); }
     void Apply();  // stage two, storing the version in the batch's file
-    // What the next start does after an interruption, by the updater's own
-    // decision: stage two finished from its record, or (the batch had not
-    // marked the installation yet) the old installation left as it was.
+    // The next start after an interruption, by the updater's own decision:
+    // stage two resumed from its record, or nothing; a reinstall throws.
     void Resume();
 
     const std::string versionFile;

@@ -1,8 +1,7 @@
-// VcdiffDecoder on the deltas xdelta3 made at build time (bit for bit), on
-// hand-made deltas for what xdelta3 never writes (own code tables, target
-// segments, every address mode), and on every kind of damage.
-#include "patch/vcdiff_decoder.h"
-
+// DecodeLzma on streams of the SDK encoder in every shape the header allows,
+// of xz (data/make_lzma_fixtures.sh), broken or hostile; how PatchArchive
+// finds members; VcdiffDecoder on xdelta3's deltas (bit for bit), on
+// hand-made ones for what xdelta3 never writes, and on every kind of damage.
 #include <gtest/gtest.h>
 
 #include <algorithm>
@@ -17,9 +16,158 @@
 #include "base/paths.h"
 #include "patch/checksum.h"
 #include "patch/code_table.h"
+#include "patch/lzma_decoder.h"
+#include "patch/patch_archive.h"
+#include "patch/vcdiff_decoder.h"
+#include "tests/support/batch_fixture.h"
 #include "tests/support/test_files.h"
+#include "tools/publisher/lzma_encoder.h"
 
 namespace {
+
+// A memory stream over its own bytes, with room for at least capacity. Its
+// failingRead-th read throws, as a file does that cannot be read (negative:
+// the player asks to quit at that read), and it takes writes of nothing.
+struct Bytes : MemoryStream {
+    explicit Bytes(const std::string& text, size_t capacity = 0) : bytes(text) {
+        bytes.resize(std::max(text.size(), capacity));
+        Attach(reinterpret_cast<uint8_t*>(&bytes[0]), static_cast<int32_t>(bytes.size()));
+    }
+    uint32_t Read(void* destination, uint32_t count) override {
+        if (++reads == failingRead) throw Exception("Failed to read data from file.");
+        if (reads == -failingRead) quitRequested = true;
+        return MemoryStream::Read(destination, count);
+    }
+    uint32_t Write(const void* source, uint32_t count) override {
+        return count == 0 ? 0 : MemoryStream::Write(source, count);
+    }
+    std::string Written() { return bytes.substr(0, static_cast<size_t>(GetPosition())); }
+    std::string bytes;
+    int failingRead = 0;
+    int reads = 0;
+};
+
+// The decoded data, or "error: " and the Exception's text.
+std::string Decode(const std::string& lzma, int failingRead = 0) {
+    Bytes input(lzma);
+    Bytes output("", 1 << 18);
+    input.failingRead = failingRead;
+    try {
+        DecodeLzma(input, output);
+    } catch (const Exception& error) {
+        quitRequested = false;
+        return "error: " + error.message;
+    }
+    return output.Written();
+}
+
+// Writes value over bytes bytes of the stream, lowest first.
+std::string Patched(std::string lzma, size_t at, uint64_t value, int bytes = 1) {
+    for (int i = 0; i < bytes; ++i) lzma[at + i] = static_cast<char>(value >> (8 * i));
+    return lzma;
+}
+
+TEST(DecodeLzma, DecodesEveryShapeAndRefusesBrokenStreams) {
+    const std::string dataError = "error: Data error, please verify that downloaded files are complete and correct!";
+    const std::string allocationFailure = "error: Failed to allocate LZMA structures while decoding.";
+    // level, dictionary size, lc, lp, pb, size stored, end marker
+    const LzmaOptions marked = {5, 0, 3, 0, 2, false};
+    std::string text;  // as data/make_lzma_fixtures.sh writes it
+    for (int i = 0; i < 3000; ++i) {
+        text += "line " + std::to_string(i) + " of the fixture, value " + std::to_string(i * 7919 % 10007) + "\n";
+    }
+    const std::string buffer = text.substr(0, 65536);
+    const std::string sized = EncodeLzma(text);
+    const std::string markedText = EncodeLzma(text, marked);
+    const std::string sizeAndMarker = EncodeLzma(text, {5, 0, 3, 0, 2, true, true});
+    const std::string noise = SeededBytes(200000, 1);  // a stream of several reads
+    const struct {
+        const char* name;
+        std::string lzma;
+        std::string expected;
+        int failingRead = 0;
+    } cases[] = {
+        {"empty, size stored", EncodeLzma(""), ""},
+        {"empty, end marker", EncodeLzma("", marked), ""},
+        {"exactly one buffer", EncodeLzma(buffer), buffer},
+        {"exactly one buffer, end marker", EncodeLzma(buffer, marked), buffer},
+        {"one buffer and one", EncodeLzma(text.substr(0, 65537)), text.substr(0, 65537)},
+        {"size stored", sized, text},
+        {"end marker", markedText, text},
+        {"size and end marker", sizeAndMarker, text},
+        {"lc8 lp4 pb4", EncodeLzma(text, {5, 0, 8, 4, 4, false}), text},
+        {"data far larger than the dictionary", EncodeLzma(text, {5, 4096}), text},
+        {"huge dictionary bounded by the stated size", Patched(sized, 1, 0xFFFFFFFFu, 4), text},
+        {"xz", ReadTextFile(IRONVALE_SOURCE_DIR "/tests/patch/data/text.xz.lzma"), text},
+        {"xz, empty", ReadTextFile(IRONVALE_SOURCE_DIR "/tests/patch/data/empty.xz.lzma"), ""},
+        {"sized stream cut short", sized.substr(0, sized.size() / 2), dataError},
+        {"marked stream cut short", markedText.substr(0, markedText.size() - 8), dataError},
+        {"end marker before the stated size", Patched(sizeAndMarker, 5, text.size() + 1, 4), dataError},
+        {"range coder not starting with zero", Patched(sized, 13, 1), dataError},
+        {"header cut short", sized.substr(0, 12),
+         "error: Missing data, please verify that downloaded files are complete!"},
+        {"lc/lp/pb byte out of range", Patched(sized, 0, 225), allocationFailure},
+        {"dictionary over the limit, size unknown", Patched(markedText, 1, kMaximumLzmaDictionarySize + 1, 4),
+         allocationFailure},
+        // Passed on unchanged, and (under the leak checker) after freeing
+        // the decoder state.
+        {"stream error in the loop", EncodeLzma(noise), "error: Failed to read data from file.", 3},
+        // A stopped extraction must never pass for a finished, shorter one.
+        {"quit request: a cancel, which says nothing", EncodeLzma(noise), "error: ", -3},
+    };
+    for (const auto& c : cases) {
+        const std::string decoded = Decode(c.lzma, c.failingRead);
+        EXPECT_TRUE(decoded == c.expected) << c.name << ": " << decoded.substr(0, 80);
+    }
+}
+
+// A member header claiming size bytes of data, and the data.
+std::string Member(const std::string& name, const std::string& data, uint64_t size) {
+    return Patched(static_cast<char>(name.size()) + name + "12345", name.size() + 1, size, 5) + data;
+}
+std::string Member(const std::string& name, const std::string& data) { return Member(name, data, data.size()); }
+
+// The member's text, or the error message.
+std::string Extract(const std::string& archiveBytes, const std::string& member) {
+    TempFolder folder;
+    WriteTextFile(folder / "a.pak", archiveBytes);
+    try {
+        PatchArchive(folder / "a.pak").DecodeFile(member, folder / "out");
+        return ReadTextFile(folder / "out");
+    } catch (const Exception& error) {
+        return error.message;
+    }
+}
+
+TEST(PatchArchive, FindsMembersByExactName) {
+    // End markers instead of stated sizes: the decoder reads whole blocks and
+    // must stop at the marker, whatever follows in the file.
+    const LzmaOptions marked = {5, 0, 3, 0, 2, false};
+    const std::string archive = Member("data\\one.txt", EncodeLzma("first", marked)) +
+                                Member("data\\two.txt", EncodeLzma("second", marked)) +
+                                Member("data\\one.txt", EncodeLzma("shadowed", marked)) + Member("empty.txt", "");
+    const struct {
+        std::string bytes;
+        std::string member;
+        std::string found = "";  // none: not found
+    } cases[] = {
+        {archive, "data\\one.txt", "first"},
+        {archive, "data\\two.txt", "second"},
+        {archive, "DATA\\ONE.TXT"},
+        {archive, "data\\one"},
+        {archive, "empty.txt"},                               // a name with no data
+        {std::string(5, '\0'), ""},                           // five bytes hold no member
+        {archive + "\xFFshort", "data\\two.txt", "second"},   // a broken tail after the member
+        {archive + "\xFFshort", "short"},                     // a name running past the end
+        {Member("wanted", EncodeLzma("x"), 1000), "wanted"},  // a member larger than the file
+        // Sizes have 40 bits: cut to 32, this one would end where "x" starts.
+        {Member("huge", "", 1ull << 32) + Member("x", EncodeLzma("x")), "x"},
+    };
+    for (const auto& c : cases) {
+        EXPECT_EQ(Extract(c.bytes, c.member),
+                  c.found.empty() ? "Failed to find file in patch archive. File: " + c.member : c.found);
+    }
+}
 
 std::string Varint(uint32_t value) {
     std::string bytes(1, static_cast<char>(value & 0x7F));
@@ -78,16 +226,6 @@ std::string OwnTable(uint8_t nearSize, uint8_t sameSize, const std::vector<CodeT
            compressed;
 }
 
-// A memory stream over its own bytes, with room for at least capacity.
-struct Bytes : MemoryStream {
-    explicit Bytes(const std::string& text, size_t capacity = 0) : bytes(text) {
-        bytes.resize(std::max(text.size(), capacity));
-        Attach(reinterpret_cast<uint8_t*>(&bytes[0]), static_cast<int32_t>(bytes.size()));
-    }
-    std::string Written() { return bytes.substr(0, static_cast<size_t>(GetPosition())); }
-    std::string bytes;
-};
-
 // Runs the decoder's own steps, so that a missing source reaches it: what
 // reached the target, and the error text (empty on success).
 std::pair<std::string, std::string> DecodeDelta(FileStream* source, const std::string& delta,
@@ -106,42 +244,35 @@ std::pair<std::string, std::string> DecodeDelta(FileStream* source, const std::s
     return {target.Written(), error};
 }
 
-// Decodes with files, as the applier does; returns the error text or "".
-std::string DecodeFiles(const std::string& source, const std::string& delta, const std::string& target) {
-    FileStream sourceFile, deltaFile, targetFile;
-    try {
-        sourceFile.Open(source);
-        deltaFile.Open(delta);
-        targetFile.Create(target);
-        VcdiffDecoder::Decode(&sourceFile, &deltaFile, &targetFile);
-    } catch (const Exception& error) {
-        return error.message;
-    }
-    return "";
-}
-
 template <typename... Args>
-std::string Delta(Args... windowArguments) {
-    return Header() + Window(windowArguments...);
+std::string Delta(Args... window) {
+    return Header() + Window(window...);
 }
 
 const std::string kTargetSegment =
     Header() + Adding("hello world") + Window(2, 5, 6, 6, "!", CopyOp(5, 0) + AddOp(1), Varint(0)) + Adding(".");
 
-TEST(VcdiffDecoder, RebuildsXdelta3OutputFromFiles) {
+TEST(VcdiffDecoder, RebuildsXdelta3Output) {
     const auto path = [](const std::string& name) { return PathJoin(VCDIFF_CASES_DIR, name); };
     std::ifstream manifest(path("manifest.txt"));
-    TempFolder folder;
     int cases = 0;
     for (std::string source, delta, target; manifest >> source >> delta >> target; ++cases) {
-        EXPECT_EQ(DecodeFiles(path(source), path(delta), folder / "out"), "") << delta;
-        EXPECT_TRUE(ReadTextFile(folder / "out") == ReadTextFile(path(target))) << delta;
+        FileStream sourceFile;
+        sourceFile.Open(path(source));
+        const std::string expected = ReadTextFile(path(target));
+        const auto [decoded, error] = DecodeDelta(&sourceFile, ReadTextFile(path(delta)), expected.size());
+        EXPECT_TRUE(error.empty() && decoded == expected) << delta << ": " << error;
     }
     EXPECT_EQ(cases, 12) << "interop cases missing from " << VCDIFF_CASES_DIR;
 
     // The applier creates targets write-only: a target segment is an error.
+    TempFolder folder;
     WriteTextFile(folder / "delta", kTargetSegment);
-    EXPECT_EQ(DecodeFiles(path("empty.source"), folder / "delta", folder / "out"), "Failed to read data from file.");
+    FileStream source, delta, target;
+    source.Open(path("empty.source"));
+    delta.Open(folder / "delta");
+    target.Create(folder / "out");
+    EXPECT_THROW(VcdiffDecoder::Decode(&source, &delta, &target), Exception);
 }
 
 // A 3 GiB source without the disk space: the byte at p is p % 251.
@@ -240,9 +371,8 @@ TEST(VcdiffDecoder, DecodesWhatXdelta3NeverWritesAndRefusesEveryDamage) {
 }
 
 TEST(VcdiffDecoder, DefaultCodeTableAndChecksum) {
-    // Entries of two instructions, which xdelta3 never writes: the first
-    // and last of every group, as the six rows carry them (index, then the
-    // types, sizes and modes of the two halves).
+    // Entries of two instructions, which xdelta3 never writes: the first and
+    // last of every group (index, types, sizes and modes of the two halves).
     const uint8_t entries[][7] = {
         {163, kAdd, kCopy, 1, 4, 0, 0}, {165, kAdd, kCopy, 1, 6, 0, 0}, {166, kAdd, kCopy, 2, 4, 0, 0},
         {234, kAdd, kCopy, 4, 6, 0, 5}, {235, kAdd, kCopy, 1, 4, 0, 6}, {246, kAdd, kCopy, 4, 4, 0, 8},
