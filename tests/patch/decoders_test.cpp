@@ -47,7 +47,8 @@ struct Bytes : MemoryStream {
     int reads = 0;
 };
 
-// The decoded data, or "error: " and the Exception's text.
+// The decoded data, or "error: " ("cancelled: " for a cancel) and the
+// Exception's text.
 std::string Decode(const std::string& lzma, int failingRead = 0) {
     Bytes input(lzma);
     Bytes output("", 1 << 18);
@@ -56,7 +57,7 @@ std::string Decode(const std::string& lzma, int failingRead = 0) {
         DecodeLzma(input, output);
     } catch (const Exception& error) {
         quitRequested = false;
-        return "error: " + error.message;
+        return (error.Code() == ErrorCode::UserCancelled ? "cancelled: " : "error: ") + error.message;
     }
     return output.Written();
 }
@@ -113,7 +114,7 @@ TEST(DecodeLzma, DecodesEveryShapeAndRefusesBrokenStreams) {
         // the decoder state.
         {"stream error in the loop", EncodeLzma(noise), "error: Failed to read data from file.", 3},
         // A stopped extraction must never pass for a finished, shorter one.
-        {"quit request: a cancel, which says nothing", EncodeLzma(noise), "error: ", -3},
+        {"quit request: a cancel, which says nothing", EncodeLzma(noise), "cancelled: ", -3},
     };
     for (const auto& c : cases) {
         const std::string decoded = Decode(c.lzma, c.failingRead);
