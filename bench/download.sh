@@ -78,7 +78,7 @@ wine_json=
 if [ -f "$wintool" ]; then
   "$root/scripts/wine-run.sh" "$wintool" fetch "$url" "Z:$work/out/wine.bin"
   cmp -s "$work/www/big.bin" "$work/out/wine.bin" || { echo "download bench: WinINet file differs" >&2; exit 1; }
-  hyperfine --style none --runs 3 --export-json "$work/wine.json" \
+  hyperfine --style none --warmup 1 --runs "$runs" --export-json "$work/wine.json" \
     -n wininet "$root/scripts/wine-run.sh $wintool fetch $url Z:$work/out/wine.bin" >/dev/null
   wine_json=$work/wine.json
 fi

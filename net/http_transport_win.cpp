@@ -1,6 +1,7 @@
 #include <windows.h>
 #include <wininet.h>
 
+#include <chrono>
 #include <vector>
 
 #include "net/http_transport.h"
@@ -24,9 +25,16 @@ private:
 const char kAgent[] = "IronvaleUpdater";
 const char kHeaders[] = "Accept: */*\r\n\r\n";
 const DWORD kHeadersLength = 15;
-// WinINet reads in these pieces; progress is reported after every one.
-// Each call is costly (under Wine far more so), so the pieces are large.
-const DWORD kReadSize = 64 * 1024;
+// A WinINet read returns once its whole piece has arrived, and each call is
+// costly (under Wine far more so). The piece doubles while reads come back
+// quickly and halves when one takes long: a fast line is read in large
+// pieces, and a slow one still reports progress (after every read) and
+// hears a stop within about a quarter of a second.
+const DWORD kFirstRead = 64 * 1024;
+const DWORD kSmallestRead = 16 * 1024;
+const DWORD kLargestRead = 1024 * 1024;
+const auto kQuickRead = std::chrono::milliseconds(50);
+const auto kSlowRead = std::chrono::milliseconds(250);
 
 }  // namespace
 
@@ -47,11 +55,16 @@ HttpOutcome HttpGet(const std::string& address, HttpResponseSink& sink) {
         HttpQueryInfoA(request.get(), HTTP_QUERY_CONTENT_LENGTH | HTTP_QUERY_FLAG_NUMBER, &length, &size, nullptr);
     if (!sink.OnResponse(statusText, lengthKnown != FALSE, length)) return HttpOutcome::Abandoned;
 
-    std::vector<char> buffer(kReadSize);
+    std::vector<char> buffer(kLargestRead);
+    DWORD piece = kFirstRead;
     while (sink.KeepReading()) {
+        const auto began = std::chrono::steady_clock::now();
         DWORD read = 0;
-        if (!InternetReadFile(request.get(), buffer.data(), kReadSize, &read)) return HttpOutcome::ReadFailed;
+        if (!InternetReadFile(request.get(), buffer.data(), piece, &read)) return HttpOutcome::ReadFailed;
         if (read == 0) return HttpOutcome::Complete;
+        const auto took = std::chrono::steady_clock::now() - began;
+        if (took < kQuickRead && piece < kLargestRead) piece *= 2;
+        if (took > kSlowRead && piece > kSmallestRead) piece /= 2;
         if (!sink.OnData(buffer.data(), read)) return HttpOutcome::Abandoned;
     }
     return HttpOutcome::Stopped;
