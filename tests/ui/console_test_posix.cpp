@@ -1,7 +1,6 @@
-// The console front end of the native build: the progress line on stderr
-// (one line per change, or rewritten in place on a terminal), Ctrl+C with
-// the confirmation question, the language question and the move retry box,
-// answered on stdin.
+// The console front end of the native build: the progress line on stderr (one line per change, or rewritten in place
+// on a terminal), Ctrl+C with the confirmation question, the language question and the move retry box, answered on
+// stdin.
 
 #include <gtest/gtest.h>
 
@@ -27,9 +26,8 @@
 
 namespace {
 
-// While it lives, std::cin reads the answers and descriptor 2 (where the
-// front end writes, and which it asks whether it is a terminal) is a pipe
-// or a terminal, whose other end Shown() reads.
+// While it lives, std::cin reads the answers and descriptor 2 (where the front end writes, and which it asks whether it
+// is a terminal) is a pipe or a terminal, whose other end Shown() reads.
 class Console {
 public:
     Console(bool terminal, const std::string& text) : answers(text), input(std::cin.rdbuf(answers.rdbuf())) {
