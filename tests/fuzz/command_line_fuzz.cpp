@@ -1,6 +1,5 @@
-// The command line is untrusted: any text must parse without a crash, and
-// joining and splitting again must give the words back whenever no word
-// holds a double quote (which a joined line cannot carry).
+// The command line is untrusted: any text must parse without a crash, and joining and splitting again must give the
+// words back whenever no word holds a double quote (which a joined line cannot carry).
 #include "app/updater_arguments.h"
 #include "base/command_line.h"
 #include "tests/fuzz/fuzz_files.h"

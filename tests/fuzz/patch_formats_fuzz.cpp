@@ -1,8 +1,6 @@
-// The binary formats of a patch on arbitrary bytes: every input must end in
-// a result or an Exception, within bounded memory. Each input goes to the
-// archive scan, whose first member reaches the LZMA decoder, and to the
-// VCDIFF decoder (as a 2-byte little-endian source length, the source,
-// then the delta), so the seeds of each format serve its parser.
+// The binary formats of a patch on arbitrary bytes: every input must end in a result or an Exception, within bounded
+// memory. Each input goes to the archive scan, whose first member reaches the LZMA decoder, and to the VCDIFF decoder
+// (as a 2-byte little-endian source length, the source, then the delta), so the seeds of each format serve its parser.
 #include <algorithm>
 #include <vector>
 
@@ -13,9 +11,8 @@
 
 namespace {
 
-// Whether the stream header at data asks for at most 1 MiB of dictionary
-// (after the cut to a stated size). Larger ones pass one comparison that
-// the unit tests cover, but cost ASan time per megabyte: left out for pace.
+// Whether the stream header at data asks for at most 1 MiB of dictionary (after the cut to a stated size). Larger ones
+// pass one comparison that the unit tests cover, but cost ASan time per megabyte: left out for pace.
 bool ModestDictionary(const uint8_t* data, size_t size) {
     if (size < 13) return true;
     uint64_t dictionary = 0, unpacked = 0;  // an unknown size is all ones
@@ -30,8 +27,8 @@ void DecodeVcdiff(const uint8_t* data, size_t size) {
     // Separate buffers, so that a read past either one is caught.
     std::vector<uint8_t> sourceBytes(data + 2, data + 2 + sourceLength),
         deltaBytes(data + 2 + sourceLength, data + size);
-    // Room for a good deal more than any input could describe without
-    // RUNs or copies; longer targets end in the decoder's write check.
+    // Room for a good deal more than any input could describe without RUNs or copies; longer targets end in the
+    // decoder's write check.
     static std::vector<uint8_t> target(4 << 20);
     MemoryStream source, delta, output;
     source.Attach(sourceBytes.data(), static_cast<int32_t>(sourceBytes.size()));
@@ -46,8 +43,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     DecodeVcdiff(data, size);
     const std::string archive = WriteFuzzFile("archive.pak", data, size);
     const std::string output = PathJoin(FuzzFolder(), "member.out");
-    // The first member's own name reaches the decoder; a missing name
-    // makes the scan walk every header.
+    // The first member's own name reaches the decoder; a missing name makes the scan walk every header.
     const size_t nameLength = size == 0 ? 0 : std::min<size_t>(data[0], size - 1);
     const size_t firstData = size == 0 ? 0 : std::min<size_t>(size, 1 + nameLength + 5);
     if (ModestDictionary(data + firstData, size - firstData)) {

@@ -1,5 +1,4 @@
-// The two XML files of a batch on arbitrary bytes: PatchInfoFile::Load with
-// every cursor, and PatchProgressFile::LoadRecord.
+// The two XML files of a batch on arbitrary bytes: PatchInfoFile::Load with every cursor, and PatchProgressFile.
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
 #include "tests/fuzz/fuzz_files.h"

@@ -1,6 +1,6 @@
-// The console front end of the native build: the progress line on stderr
-// (one line per change, or rewritten in place on a terminal), Ctrl+C with
-// the confirmation question, and the language question, answered on stdin.
+// The console front end of the native build: the progress line on stderr (one line per change, or rewritten in place
+// on a terminal), Ctrl+C with the confirmation question, the language question and the move retry box, answered on
+// stdin.
 
 #include <gtest/gtest.h>
 
@@ -15,16 +15,19 @@
 #include <sstream>
 #include <string>
 
+#include "base/exception.h"
+#include "base/paths.h"
 #include "patch/lzma_decoder.h"
+#include "tests/support/batch_fixture.h"
 #include "text/localization.h"
 #include "ui/gui_manager.h"
 #include "ui/language_dialog.h"
+#include "ui/move_retry_box.h"
 
 namespace {
 
-// While it lives, std::cin reads the answers and descriptor 2 (where the
-// front end writes, and which it asks whether it is a terminal) is a pipe
-// or a terminal, whose other end Shown() reads.
+// While it lives, std::cin reads the answers and descriptor 2 (where the front end writes, and which it asks whether it
+// is a terminal) is a pipe or a terminal, whose other end Shown() reads.
 class Console {
 public:
     Console(bool terminal, const std::string& text) : answers(text), input(std::cin.rdbuf(answers.rdbuf())) {
@@ -146,6 +149,27 @@ TEST(ConsoleFrontEnd, LanguageQuestion) {
         EXPECT_EQ(name, c.chosen != nullptr ? c.chosen : "") << c.answers;
         EXPECT_NE(console.Shown().find("  1) English (current)\n"), std::string::npos);
     }
+}
+
+// A prepared file that something blocks: Retry asks again, Cancel ends stage two with StepFailed.
+TEST(ConsoleFrontEnd, MoveRetryAsksAgainUntilCancelled) {
+    Console console(false, "r\nc\n");
+    TestBatch batch(Tree(), TreeOf("blocked.bin=new content"));
+    BatchRun run(batch);
+    MoveRetryBox retryBox;
+    run.applier.SetRetryQuestion(&retryBox);
+    run.Prepare();
+    WriteTree(batch.Installation(), TreeOf("blocked.bin/inside.txt=a folder that a move cannot replace"));
+    try {
+        run.Apply();
+        ADD_FAILURE() << "the move succeeded";
+    } catch (const Exception& error) {
+        EXPECT_EQ(error.Code(), ErrorCode::StepFailed);
+    }
+    const std::string shown = console.Shown();
+    const size_t first = shown.find("[R]etry / [c]ancel? ");  // asked exactly twice
+    EXPECT_TRUE(first != shown.npos && shown.find("[R]etry", first + 1) == shown.rfind("[R]etry")) << shown;
+    EXPECT_TRUE(PathExists(PathJoin(batch.PatchedFiles(), "blocked.bin")));
 }
 
 }  // namespace

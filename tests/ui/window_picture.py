@@ -1,14 +1,7 @@
 #!/usr/bin/python3
-"""Checks the updater's main window on the X server ($DISPLAY).
-
-usage: window_picture.py LEFT TOP LENGTH BACKGROUND FAILED_PNG
-
-Compares the screen with the window's background picture, the window at
-LEFT TOP, until the bar is drawn LENGTH px long, the title, status line and
-"Cancel" label are drawn, every colour-key pixel shows the screen behind
-and no pixel is near the colour key (a pink fringe). Prints the measures;
-after ten seconds without, saves the screen as FAILED_PNG and exits 1.
-"""
+"""window_picture.py LEFT TOP LENGTH BACKGROUND FAILED_PNG: waits up to ten seconds for the window at LEFT TOP on
+$DISPLAY to show its bar LENGTH px long, title, status and "Cancel" drawn, and the screen behind every colour-key
+pixel with no pink fringe; else saves the screen as FAILED_PNG and exits 1."""
 import os
 import sys
 import time

@@ -1,8 +1,7 @@
 #!/usr/bin/env bash
-# The Windows program's window, boxes and fonts under Wine and Xvfb, as the
-# player meets them, in German, whose button labels differ from the
-# system's: window_driver shows them as the update run does and answers
-# its boxes, xdotool clicks and drags, window_picture.py reads the screen.
+# The Windows program's window, boxes and fonts under Wine and Xvfb as the player meets them, in German, whose button
+# labels differ from the system's: window_driver shows them as the update run does and answers its boxes, xdotool
+# clicks and drags, window_picture.py reads the screen.
 #   window_wine.sh UPDATER HOLD_INSTANCE DIALOG_ANSWER WINDOW_DRIVER
 set -euo pipefail
 program=$(realpath "$1")
@@ -17,20 +16,17 @@ fail() { echo "FAIL: $*" >&2; exit 1; }
 export WINEPREFIX="$(dirname "$program")/wineprefix"
 "$run" "$holder_exe" 0 >/dev/null 2>&1 || true
 log="$WINEPREFIX/drive_c/users/$(id -un)/Temp/IronvaleUpdater.log"
-[ -d "$(dirname "$log")" ] || log="$WINEPREFIX/drive_c/users/$(id -un)/AppData/Local/Temp/IronvaleUpdater.log"
 
-# The X server picks a free display number itself and says it once it is
-# ready. It must not reset when its last client leaves. Wine's desktop
-# process stays tied to the display it was started on, so the prefix's Wine
-# processes end before the session begins and again before its display goes.
+# The X server picks a free display number itself and says it once it is ready. It must not reset when its last
+# client leaves. Wine's desktop process stays tied to the display it was started on, so the prefix's Wine processes
+# end before the session begins and again before its display goes.
 end_wine() { { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true; }
 end_wine
+retry() { for _ in $(seq 100); do "$@" && return; sleep 0.1; done; false; }  # COMMAND...: for ten seconds
 display_file=$(mktemp)
-Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp -noreset 3>"$display_file" >/dev/null 2>&1 &
-xvfb=$!
+Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp -noreset 3>"$display_file" >/dev/null 2>&1 & xvfb=$!
 trap 'cleanup; end_wine; kill $xvfb 2>/dev/null || true; rm -f "$display_file"' EXIT
-for _ in $(seq 200); do [ -s "$display_file" ] && break; sleep 0.05; done
-[ -s "$display_file" ] || fail "Xvfb did not start"
+retry test -s "$display_file" || fail "Xvfb did not start"
 export DISPLAY=:$(head -1 "$display_file")
 key='HKCU\Software\Halvard\Ironvale'
 driver_log="$(dirname "$log")/window_driver.log"
@@ -47,16 +43,9 @@ forget_fonts() {
 }
 # The prefix is shared with the other Wine tests: the game's key and Wine's
 # memory of this test's fonts go.
-cleanup() {
-  forget_fonts
-  "$run" reg delete "$key" /f >/dev/null 2>&1 || true
-  rm -rf "$scratch"
-}
+cleanup() { forget_fonts; "$run" reg delete "$key" /f >/dev/null 2>&1 || true; rm -rf "$scratch"; }
 
-start_driver() {
-  : >"$driver_log"
-  coproc DRIVER { "$run" "$driver_exe" 2>>"$scratch/driver.err"; }
-}
+start_driver() { : >"$driver_log"; coproc DRIVER { "$run" "$driver_exe" 2>>"$scratch/driver.err"; }; }
 stop_driver() { exec {DRIVER[1]}>&-; wait "$DRIVER_PID" 2>/dev/null || true; }
 send() {
   echo "$1" >&"${DRIVER[1]}"
@@ -83,16 +72,15 @@ bar() {  # VALUE LENGTH: at that progress the screen shows the window, its bar L
 }
 bar 0 0
 bar 500 165
-# A drag from the title line moves the window by the pointer's way. The
-# next picture waits for the screen to show it there, where clicks go.
+# A drag from the title line moves the window by the pointer's way. The next picture waits for the screen to show it
+# there, where clicks go.
 xdotool mousemove 346 158 mousedown 1 mousemove 396 188 mouseup 1
-for _ in $(seq 20); do send rect; [ "$reply" = "296 173" ] && break; sleep 0.1; done
-expect rect "296 173"
+moved() { send rect; [ "$reply" = "296 173" ]; }
+retry moved || fail "the drag left the window at $reply"
 left=296 top=173
 bar 1000 330
-# A question of the main thread owned by the window, then the confirmations
-# of the window's thread (with its own hook) answered No: the run goes on,
-# and the bar still follows it.
+# A question of the main thread owned by the window, then the confirmations of the window's thread (with its own
+# hook) answered No: the run goes on, and the bar still follows it.
 yes_no="[6 Ja] [7 Nein]"
 expect "ask 7 Weiter?" "no | Weiter? $yes_no"
 going="cancelled=0 cancels=0 quit=0 window=1"
@@ -106,50 +94,36 @@ click 515 15
 expect "confirm 6" "cancelled=1 cancels=1 quit=1 window=0 | $(german INSTALLER_CONFIRM_QUIT) $yes_no"
 stop_driver
 
-# The updater's own first box, before any window: the instance-running
-# warning, whose OK differs from the system's in Spanish.
-# It says so in a box, in its log, and by ending with -1.
+# The updater's own first box, before any window: the instance-running warning (in a box whose OK differs from
+# the system's in Spanish, in its log, and by ending with -1).
 set_value Language Spanish
-"$run" "$holder_exe" 60000 >"$scratch/holder.out" 2>&1 &
-holder=$!
-for _ in $(seq 100); do grep -q held "$scratch/holder.out" && break; sleep 0.1; done
-grep -q held "$scratch/holder.out" || fail "the holder did not take the mutex"
-code=0
-"$run" "$program" &
-second=$!
+"$run" "$holder_exe" 60000 >"$scratch/holder.out" 2>&1 & holder=$!
+retry grep -q held "$scratch/holder.out" || fail "the holder did not take the mutex"
+"$run" "$program" & second=$!
 text=$("$run" "$answer_exe" "Ironvale - Actualizador" 1 30000 | tr -d '\r') || true
-wait "$second" || code=$?
+wait "$second" && code=0 || code=$?
 kill "$holder"; wait "$holder" 2>/dev/null || true
 grep -qx '\[button\] Aceptar' <<<"$text" || fail "the instance-running box's button: $text"
 [ "$code" -eq 255 ] || fail "second instance exit code $code, expected 255 (-1)"
 tail -1 "$log" | grep -q ': Error: There is already another updater instance running\.' || fail "no log line"
 
-# Japanese. Wine finds fonts through fontconfig and remembers them in its
-# registry and in every running Wine process: each case gets a fontconfig
-# of its own, the memory is cleared and the Wine processes end before the
-# driver starts.
+# Japanese. Wine finds fonts through fontconfig and remembers them in its registry and in every running Wine process:
+# each case gets a fontconfig of its own, the memory is cleared and the Wine processes end before the driver starts.
 set_value Language Japanese
 with_fonts() {  # NAME FOLDER...: the driver, knowing only these fonts
-  { echo '<?xml version="1.0"?><fontconfig>'
-    printf '<dir>%s</dir>' "${@:2}"
-    echo "<cachedir>$scratch/fontcache</cachedir></fontconfig>"; } >"$scratch/$1.conf"
   export FONTCONFIG_FILE="$scratch/$1.conf"
-  forget_fonts
-  end_wine
-  start_driver
+  echo "<fontconfig>$(printf '<dir>%s</dir>' "${@:2}")<cachedir>$scratch/fontcache</cachedir></fontconfig>" >"$FONTCONFIG_FILE"
+  forget_fonts; end_wine; start_driver
 }
-searched() {
-  [ "$(grep -c 'Trace: Finding dialog font\.\.\.' "$driver_log")" -eq "$1" ] || fail "dialog font not searched $1 times"
-}
+searched() { [ "$(grep -c 'Trace: Finding dialog font' "$driver_log")" -eq "$1" ] || fail "font not searched $1 times"; }
 # No Japanese font: no font is made, and each request searches again.
 with_fonts latin /usr/share/fonts/truetype/dejavu
 expect dialogfont none
 expect dialogfont none
 stop_driver
 searched 2
-# A Japanese font, none of the candidates: the system's choice for an empty
-# face name at the default size, made once; the boxes, which the hook gives
-# that font, keep their labels.
+# A Japanese font, none of the candidates: the system's choice for an empty face name at the default size, made once;
+# the boxes, which the hook gives that font, keep their labels.
 with_fonts japanese /usr/share/fonts/truetype/dejavu /usr/share/fonts/opentype/ipafont-gothic
 expect dialogfont "'' 14 400"
 expect "ask 6 OK?" "yes | OK? [6 はい] [7 いいえ]"
