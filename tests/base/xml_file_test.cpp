@@ -26,13 +26,10 @@ TEST(MeasureXmlNesting, CountsOpenElementsTheWayTheParserSeesThem) {
         {"<a><!DOCTYPE x><b></b></a>", 2},              // unknown markup ends at '>'
         {"<a/>trailing <b><c><d>", 0},                  // the parser stops at text after the root
         {"<r>&#x</r>x1;<a>&#x</a>x1;<b/></a></r>", 2},  // "&#x" runs to the next ';'
-        {"<r>&#</r>#1;<a/></r>", 1},                    // so does "&#"
         {"<r><a b=\"&#x\"/>x1;\"><c/></a></r>", 2},     // even across a quote
         {"<r>&#xz;</r>", -1},                           // a bad reference ends the parse
         {"<a><b>", -1},                                 // unclosed
-        {"<a><!-- never closed", -1},
-        {"<a b=\"unterminated></a>", -1},
-        {"<a b=c\"d\"></a>", -1},  // quote in an unquoted value
+        {"<a b=c\"d\"></a>", -1},                       // quote in an unquoted value
     };
     int64_t nodes = 0;
     for (const auto& [text, depth] : cases) EXPECT_EQ(MeasureXmlNesting(text, 10, nodes), depth) << text;

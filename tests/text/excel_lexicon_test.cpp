@@ -15,8 +15,6 @@ TEST(ExcelLexiconTest, NoUsableColumnLeavesAnEmptyLexicon) {
     const std::tuple<std::string, std::u16string, bool> cases[] = {
         {"SPA_ES", table, false},
         {"keys", u"KEYS\tENG_US\r\nKEY_PLAIN\tHello\r\n", false},  // the first cell names no language
-        {"", table, false},
-        {"ENG_US", u"", false},
         {"ENG_US", u"\r\n\r\n", false},
         {"ENG_US", u"\uFEFF \tENG_US\r\n", true},
     };
