@@ -2,7 +2,6 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <ctime>
 #include <functional>
 #include <random>
 #include <thread>
@@ -104,9 +103,11 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         uint32_t total;    // of the progress reports; 0: not checked
         size_t transfers;  // the view hears of
         How how = kPlain;
+        int64_t serverClockOffset = 0;  // signed addresses expire an hour ahead of the server's clock
     } cases[] = {
         {server.Url("/sized"), done, body, 150000, 1},
-        {server.Url("/signed"), done, body, 150000, 1, kSigned},
+        {server.Url("/signed?lang=en"), done, body, 150000, 1, kSigned, -3500},
+        {server.Url("/signed"), failed, old, 0, 0, kSigned, -3700},
         {server.Url("/signed"), failed, old, 0, 0},        // unsigned
         {server.Url("/unsized"), done, body, 1048576, 1},  // against an assumed megabyte
         {server.Url("/empty"), done, "", 0, 1},
@@ -142,6 +143,7 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
             entry.declaredSize = static_cast<int64_t>(body.size());
             entry.declaredSha256 = HexDigits(digest.data(), digest.size());
         }
+        SetServerClockOffset(item.serverClockOffset);
         HttpDownloader downloader;
         view.stopper = item.how == kStopped ? &downloader : nullptr;
         downloader.SetStatusView(&view);
@@ -219,19 +221,10 @@ TEST(Locations, JoinWithTheSeparatorOfTheirKindAndNameTheirHost) {
     for (const auto& [url, host] : hosts) EXPECT_EQ(GetUrlHostName(url), host) << url;
 }
 
-TEST(Signing, Md5MatchesTheReferenceUpToAZeroAndSignedUrlsExpireAnHourAheadOfTheServer) {
+TEST(Md5, MatchesTheReferenceUpToAZeroAndOverSeveralBlocks) {
     EXPECT_EQ(Md5Hex(std::string("abc\0def", 7)), "900150983cd24fb0d6963f7d28e17f72");
     EXPECT_EQ(Md5Hex("12345678901234567890123456789012345678901234567890123456789012345678901234567890"),
               "57edf4a22be3c955ac49da2e2107b67a");
-    const std::string url = "http://patches.example.com/a.bin?lang=en";
-    SetServerClockOffset(-600);
-    const int64_t earliest = static_cast<int64_t>(std::time(nullptr)) - 600 + 3600;
-    const std::string signedUrl = SignUrl(url);
-    SetServerClockOffset(0);
-    // With a query "&", without one "?" (as the downloader's signed requests show).
-    ASSERT_EQ(signedUrl.rfind(url + "&e=", 0), 0u) << signedUrl;
-    const int64_t expiry = std::stoll(signedUrl.substr(url.size() + 3));
-    EXPECT_TRUE(expiry >= earliest && expiry <= earliest + 5) << signedUrl;
 }
 
 }  // namespace

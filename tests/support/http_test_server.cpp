@@ -76,13 +76,13 @@ void HttpTestServer::Answer(const TestSocket& connection) {
     const size_t targetAt = head.find(' ') + 1;
     const std::string target = head.substr(targetAt, head.find(' ', targetAt) - targetAt);
     HttpTestResponse response = Lookup(target.substr(0, target.find('?')));
-    // The update server's check: "e=" and an expiry not in the past, then "&h=" and the digest of the shared secret
-    // and everything before "&h=".
-    static const std::regex form("(.*[?&]e=([0-9]{1,18}))&h=([0-9a-f]{32})");
+    // The update server's check: the query's last parameters are "e=" with an expiry not in the past, then "h=" with
+    // the digest of the shared secret and everything before "&h=".
+    static const std::regex form(R"(([^?]*\?([^?]*&)?e=([0-9]{1,18}))&h=([0-9a-f]{32}))");
     std::smatch parts;
     if (response.requireSignature &&
-        !(std::regex_match(target, parts, form) && std::stoll(parts[2].str()) >= std::time(nullptr) &&
-          parts[3].str() == Md5Hex(kSharedSecret + Url(parts[1].str())))) {
+        !(std::regex_match(target, parts, form) && std::stoll(parts[3].str()) >= std::time(nullptr) &&
+          parts[4].str() == Md5Hex(kSharedSecret + Url(parts[1].str())))) {
         response = HttpTestResponse{403, "bad signature"};
     }
     std::string reply = "HTTP/1.1 " + std::to_string(response.status) + " Test\r\nConnection: close\r\n";
