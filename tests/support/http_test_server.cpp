@@ -45,8 +45,9 @@ std::vector<std::string> HttpTestServer::Requests() const {
     return requests;
 }
 
-HttpTestResponse HttpTestServer::Lookup(const std::string& path) {
+HttpTestResponse HttpTestServer::Lookup(const std::string& head, const std::string& path) {
     std::lock_guard<std::mutex> lock(mutex);
+    requests.push_back(head);
     if (routes.count(path) != 0) return routes[path];
     for (const auto& [prefix, served] : folders) {
         const std::string name = path.substr(std::min(path.size(), prefix.size()));
@@ -70,12 +71,9 @@ void HttpTestServer::Answer(const TestSocket& connection) {
         head.append(buffer, static_cast<size_t>(count));
     }
     head.resize(head.find("\r\n\r\n") + 2);
-    std::unique_lock<std::mutex> lock(mutex);
-    requests.push_back(head);
-    lock.unlock();
     const size_t targetAt = head.find(' ') + 1;
     const std::string target = head.substr(targetAt, head.find(' ', targetAt) - targetAt);
-    HttpTestResponse response = Lookup(target.substr(0, target.find('?')));
+    HttpTestResponse response = Lookup(head, target.substr(0, target.find('?')));
     // The update server's check: the query's last parameters are "e=" with an expiry not in the past, then "h=" with
     // the digest of the shared secret and everything before "&h=".
     static const std::regex form(R"(([^?]*\?([^?]*&)?e=([0-9]{1,18}))&h=([0-9a-f]{32}))");

@@ -36,7 +36,7 @@ public:
 
 private:
     void Answer(const TestSocket& connection);
-    HttpTestResponse Lookup(const std::string& path);
+    HttpTestResponse Lookup(const std::string& head, const std::string& path);  // records the request too
 
     uint16_t port = 0;
     TestSocket listener;

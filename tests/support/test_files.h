@@ -18,8 +18,8 @@ private:
     std::string path;
 };
 
-// Whole-file helpers for fixtures; they throw std::runtime_error on failure so a broken fixture cannot pass for a
-// product fault.
+// Whole-file helpers for fixtures; they throw std::runtime_error (or a filesystem_error) on failure so a broken
+// fixture cannot pass for a product fault.
 void WriteTextFile(const std::string& path, const std::string& content);
 std::string ReadTextFile(const std::string& path);
 bool PathExists(const std::string& path);
