@@ -38,7 +38,7 @@ struct LogFolder : TempFolder {
     const std::string path = *this / "test.log";
 };
 
-TEST(LogFileTest, AppendsUpToFiveMillionBytesThenStartsAfresh) {
+TEST(LogFileTest, AppendsUpToFiveMillionBytesThenStartsAfreshAndIsExclusiveBothWays) {
     for (const size_t size : {5000000u, 5000001u}) {
         LogFolder log;
         WriteTextFile(log.path, std::string(size, 'x'));
@@ -51,9 +51,6 @@ TEST(LogFileTest, AppendsUpToFiveMillionBytesThenStartsAfresh) {
         EXPECT_TRUE(std::regex_match(ReadTextFile(log.path).substr(kept),
                                      std::regex(kStamp + R"(log_test.cpp\(\d+\): Info: first 42\r\n)")));
     }
-}
-
-TEST(LogFileTest, IsExclusiveBothWays) {
     LogFolder log;
     {
         // Another holder of the file: the log stays closed and lines go nowhere.

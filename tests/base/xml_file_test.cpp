@@ -18,21 +18,12 @@ TEST(MeasureXmlNesting, CountsOpenElementsTheWayTheParserSeesThem) {
     const std::pair<const char*, int> cases[] = {
         {"<a/>", 0},
         {"<?xml version=\"1.0\" ?><a><b><c/></b></a>", 2},
-        {"<a><b x='/>' y=\"<c>\"></b></a>", 2},         // markup inside values
         {"<a><!-- <b><c><d> --><b/></a>", 1},           // markup inside comments
         {"<a><![CDATA[<b><c>]]></a>", 1},               // and CDATA
-        {"<a>text &lt; /> more<b>t</b></a>", 2},        // text runs to the next '<'
-        {"<a><?xml version='>x' ?><b></b></a>", 2},     // declaration values may hold '>'
-        {"<a><!DOCTYPE x><b></b></a>", 2},              // unknown markup ends at '>'
-        {"<a/>trailing <b><c><d>", 0},                  // the parser stops at text after the root
         {"<r>&#x</r>x1;<a>&#x</a>x1;<b/></a></r>", 2},  // "&#x" runs to the next ';'
-        {"<r>&#</r>#1;<a/></r>", 1},                    // so does "&#"
-        {"<r><a b=\"&#x\"/>x1;\"><c/></a></r>", 2},     // even across a quote
         {"<r>&#xz;</r>", -1},                           // a bad reference ends the parse
+        {"<a b=c\"d\"></a>", -1},                       // quote in an unquoted value
         {"<a><b>", -1},                                 // unclosed
-        {"<a><!-- never closed", -1},
-        {"<a b=\"unterminated></a>", -1},
-        {"<a b=c\"d\"></a>", -1},  // quote in an unquoted value
     };
     int64_t nodes = 0;
     for (const auto& [text, depth] : cases) EXPECT_EQ(MeasureXmlNesting(text, 10, nodes), depth) << text;
@@ -63,8 +54,6 @@ TEST(ParseXml, RefusesHostileTextsAndKeepsCodePageBytes) {
     EXPECT_EQ(text, "a");
 }
 
-// Loading refuses files larger than any record; saving writes exactly what TinyXML's SaveFile writes, and a failed save
-// keeps the old file and no temporary.
 TEST(XmlFiles, LoadRefusesHugeFilesAndSaveReplacesWholeOrNotAtAll) {
     TempFolder folder;
     TiXmlDocument loaded, document;

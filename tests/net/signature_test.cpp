@@ -2,7 +2,9 @@
 // publisher's tool and one made by OpenSSL's command line.
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <functional>
+#include <utility>
 
 #include "base/exception.h"
 #include "base/file_operations.h"
@@ -14,28 +16,23 @@
 
 namespace {
 
-std::string Sha256Hex(const std::string& data) {
-    Sha256 hash;
-    hash.Update(data.data(), data.size());
-    const Sha256Digest digest = hash.Finish();
-    return HexDigits(digest.data(), digest.size());
-}
-
-// Further digests are checked against OpenSSL's command line and a signature it made.
+// The second file takes several reads.
 TEST(Sha256, GivesTheStandardDigestAlsoOfAFileLongerThanOneRead) {
-    EXPECT_EQ(Sha256Hex("abc"), "ba7816bf8f01cfea414140de5dae2223b00361a396177a9cb410ff61f20015ad");
     TempFolder folder;
-    const std::string data(2000000, 'a');
-    WriteTextFile(folder / "big", data);
-    Sha256Digest digest{};
-    int64_t length = 0;
-    const std::atomic<bool> stop{false};
-    ASSERT_TRUE(Sha256OfFile(folder / "big", stop, digest, length));
-    EXPECT_EQ(length, 2000000);
-    EXPECT_EQ(HexDigits(digest.data(), digest.size()), Sha256Hex(data));
+    const std::pair<std::string, const char*> cases[] = {
+        {"abc", "ba7816bf8f01cfea414140de5dae2223b00361a396177a9cb410ff61f20015ad"},
+        {std::string(2000000, 'a'), "bcf7f9d1b4311c3352e60502255ce09a6744df84e8f2c89f79c4b5d74933a95a"},
+    };
+    for (const auto& [data, expected] : cases) {
+        WriteTextFile(folder / "data", data);
+        Sha256Digest digest{};
+        int64_t length = 0;
+        ASSERT_TRUE(Sha256OfFile(folder / "data", std::atomic<bool>{false}, digest, length));
+        EXPECT_EQ(length, static_cast<int64_t>(data.size()));
+        EXPECT_EQ(HexDigits(digest.data(), digest.size()), expected);
+    }
 }
 
-// What the check sees, and how one case spoils it.
 struct Signed {
     std::string description, signature /* DER */, keyPem;
 };
@@ -50,7 +47,6 @@ TEST(FileSignature, PassesOnlyTheKeysOwnSignatureOverTheseBytes) {
     const P256PrivateKey key = GenerateSigningKey();
     const P256PrivateKey other = GenerateSigningKey();
     const std::string order = "ffffffff00000000ffffffffffffffffbce6faada7179e84f3b9cac2fc632551";
-    const std::string one = "0000000000000000000000000000000000000000000000000000000000000001";
     // A signature `openssl dgst -sha256 -sign` made once, with the public half of its throw-away key; r needs DER's
     // sign byte.
     const Signed openssl{
@@ -71,11 +67,6 @@ TEST(FileSignature, PassesOnlyTheKeysOwnSignatureOverTheseBytes) {
         {"one byte of the file changed", [](Signed& s) { s.description[10] ^= 0x20; }, "does not match"},
         {"checked with another key", [&](Signed& s) { s.keyPem = PublicKeyPem(other.publicKey); }, "does not match"},
         {"no signature file", [](Signed& s) { s.signature = "missing"; }, "cannot be read"},
-        {"empty", [](Signed& s) { s.signature.clear(); }, "does not hold"},
-        {"cut short", [](Signed& s) { s.signature.pop_back(); }, "does not hold"},
-        {"a byte too many", [](Signed& s) { s.signature += '\0'; }, "does not hold"},
-        {"raw r and s", [&](Signed& s) { s.signature = Unhex(one + one); }, "does not hold"},
-        {"s equal to the order", [&](Signed& s) { s.signature = Unhex("3026020101022100" + order); }, "does not hold"},
         {"a needless zero", [](Signed& s) { s.signature = Unhex("3007020200010201") + std::string(1, '\x01'); },
          "does not hold"},
         {"no public key built in", [](Signed& s) { s.keyPem = "-----BEGIN PUBLIC KEY-----\n-----END PUBLIC KEY-----"; },

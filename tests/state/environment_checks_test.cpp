@@ -56,9 +56,7 @@ TEST(EnvironmentChecks, RightsFromTheFactsAndWhatTheUpdateNeeds) {
     const std::tuple<AdminRights, bool, bool, bool, bool, RightsOutcome> decisions[] = {
         {limited, true, false, false, false, RightsOutcome::Granted},  // nothing to write yet
         {limited, true, false, false, true, RightsOutcome::Elevate},
-        {limited, false, false, false, false, RightsOutcome::Elevate},  // a first installation
         {none, true, true, true, false, RightsOutcome::NoRightsForRemoval},
-        {none, true, true, false, false, RightsOutcome::Granted},  // a per-user removal
         {none, true, false, false, true, RightsOutcome::NoRights},
         {full, false, false, false, true, RightsOutcome::Granted},
     };

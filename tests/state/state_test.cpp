@@ -19,7 +19,6 @@ TEST(RegistryManager, LocateTakesTheFirstHiveThatNamesAnInstallation) {
         int found;  // which of them; -1: none
     } cases[] = {
         {{"C:\\Machine", "C:\\User", "C:\\Sid"}, true, 0},
-        {{" \t\r\n", "C:\\User", nullptr}, true, 1},  // a blank folder names none
         {{nullptr, nullptr, "C:\\Sid"}, true, 2},
         {{nullptr, nullptr, "C:\\Sid"}, false, -1},
     };

@@ -11,10 +11,9 @@
 extern char** environ;
 
 ChildProcess::ChildProcess(const std::string& program, const std::vector<std::string>& arguments) {
-    std::vector<std::string> words{program};
-    words.insert(words.end(), arguments.begin(), arguments.end());
-    std::vector<char*> argv;
-    for (std::string& word : words) argv.push_back(word.data());
+    // posix_spawn leaves the words as they are.
+    std::vector<char*> argv{const_cast<char*>(program.c_str())};
+    for (const std::string& word : arguments) argv.push_back(const_cast<char*>(word.c_str()));
     argv.push_back(nullptr);
     pid_t child = 0;
     if (posix_spawn(&child, program.c_str(), nullptr, nullptr, argv.data(), environ) != 0) {

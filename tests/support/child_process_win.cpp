@@ -21,10 +21,8 @@ ChildProcess::ChildProcess(const std::string& program, const std::vector<std::st
 }
 
 ChildProcess::~ChildProcess() {
-    if (!waited) {
-        Kill();
-        Wait();
-    }
+    Kill();
+    Wait();
     CloseHandle(reinterpret_cast<HANDLE>(handle));
 }
 

@@ -45,15 +45,9 @@ std::vector<std::string> HttpTestServer::Requests() const {
     return requests;
 }
 
-bool HttpTestServer::SignatureValid(const std::string& url, int64_t now) {
-    static const std::regex form("(.*[?&]e=([0-9]{1,18}))&h=([0-9a-f]{32})");
-    std::smatch parts;
-    return std::regex_match(url, parts, form) && std::stoll(parts[2].str()) >= now &&
-           parts[3].str() == Md5Hex(kSharedSecret + parts[1].str());
-}
-
-HttpTestResponse HttpTestServer::Lookup(const std::string& path) {
+HttpTestResponse HttpTestServer::Lookup(const std::string& head, const std::string& path) {
     std::lock_guard<std::mutex> lock(mutex);
+    requests.push_back(head);
     if (routes.count(path) != 0) return routes[path];
     for (const auto& [prefix, served] : folders) {
         const std::string name = path.substr(std::min(path.size(), prefix.size()));
@@ -77,13 +71,16 @@ void HttpTestServer::Answer(const TestSocket& connection) {
         head.append(buffer, static_cast<size_t>(count));
     }
     head.resize(head.find("\r\n\r\n") + 2);
-    std::unique_lock<std::mutex> lock(mutex);
-    requests.push_back(head);
-    lock.unlock();
     const size_t targetAt = head.find(' ') + 1;
     const std::string target = head.substr(targetAt, head.find(' ', targetAt) - targetAt);
-    HttpTestResponse response = Lookup(target.substr(0, target.find('?')));
-    if (response.requireSignature && !SignatureValid(Url(target), std::time(nullptr))) {
+    HttpTestResponse response = Lookup(head, target.substr(0, target.find('?')));
+    // The update server's check: the query's last parameters are "e=" with an expiry not in the past, then "h=" with
+    // the digest of the shared secret and everything before "&h=".
+    static const std::regex form(R"(([^?]*\?([^?]*&)?e=([0-9]{1,18}))&h=([0-9a-f]{32}))");
+    std::smatch parts;
+    if (response.requireSignature &&
+        !(std::regex_match(target, parts, form) && std::stoll(parts[3].str()) >= std::time(nullptr) &&
+          parts[4].str() == Md5Hex(kSharedSecret + Url(parts[1].str())))) {
         response = HttpTestResponse{403, "bad signature"};
     }
     std::string reply = "HTTP/1.1 " + std::to_string(response.status) + " Test\r\nConnection: close\r\n";

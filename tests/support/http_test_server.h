@@ -18,7 +18,7 @@ struct HttpTestResponse {
     size_t breakOffAfter = std::string::npos;  // hang up after this much of the body
     size_t pieceSize = 0;                      // with a pause after each (0: all at once), so a stop lands mid-transfer
     std::chrono::milliseconds pause{0};
-    bool requireSignature = false;  // answer 403 unless SignatureValid
+    bool requireSignature = false;  // answer 403 unless the address is signed
 };
 
 // An HTTP/1.1 server on 127.0.0.1 on a thread of the test program, so the same tests run natively and under Wine. One
@@ -33,13 +33,10 @@ public:
     void ServeFolder(const std::string& prefix, const std::string& folder, const HttpTestResponse& behaviour);
     std::string Url(const std::string& path) const;  // "http://127.0.0.1:PORT" followed by path
     std::vector<std::string> Requests() const;       // the request line and headers of each request so far
-    // The update server's check at time now: "e=" and an expiry not before now, then "&h=" and the digest of the shared
-    // secret and everything before "&h=".
-    static bool SignatureValid(const std::string& url, int64_t now);
 
 private:
     void Answer(const TestSocket& connection);
-    HttpTestResponse Lookup(const std::string& path);
+    HttpTestResponse Lookup(const std::string& head, const std::string& path);  // records the request too
 
     uint16_t port = 0;
     TestSocket listener;

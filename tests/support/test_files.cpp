@@ -36,7 +36,4 @@ std::string ReadTextFile(const std::string& path) {
     return std::string(std::istreambuf_iterator<char>(in), std::istreambuf_iterator<char>());
 }
 
-bool PathExists(const std::string& path) {
-    std::error_code ignored;
-    return fs::exists(path, ignored);
-}
+bool PathExists(const std::string& path) { return fs::exists(path); }

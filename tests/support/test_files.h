@@ -2,8 +2,7 @@
 
 #include <string>
 
-// A fresh folder under the system's temporary folder, removed with all its
-// contents when the object goes away.
+// A fresh folder under the system's temporary folder, removed with all its contents when the object goes away.
 class TempFolder {
 public:
     TempFolder();
@@ -19,8 +18,8 @@ private:
     std::string path;
 };
 
-// Whole-file helpers for fixtures; they throw std::runtime_error on failure
-// so a broken fixture cannot pass for a product fault.
+// Whole-file helpers for fixtures; they throw std::runtime_error (or a filesystem_error) on failure so a broken
+// fixture cannot pass for a product fault.
 void WriteTextFile(const std::string& path, const std::string& content);
 std::string ReadTextFile(const std::string& path);
 bool PathExists(const std::string& path);

@@ -7,12 +7,11 @@
 #include "resources/resource_ids.h"
 
 // Test programs link the same resource object as IronvaleUpdater.exe: its icon, manifest (no elevation prompt, modern
-// controls), version block and string table.
-TEST(ProgramResourcesTest, IconManifestVersionAndStringTable) {
+// controls), version block and string table (read by the string table test).
+TEST(ProgramResourcesTest, IconManifestAndVersion) {
     EXPECT_NE(FindResourceA(nullptr, MAKEINTRESOURCEA(IDI_IRONVALE), MAKEINTRESOURCEA(14) /* RT_GROUP_ICON */),
               nullptr);
     EXPECT_NE(FindResourceA(nullptr, MAKEINTRESOURCEA(1), MAKEINTRESOURCEA(16) /* RT_VERSION */), nullptr);
-    EXPECT_NE(FindResourceA(nullptr, "IDS_STRINGS", "CSV"), nullptr);
     HRSRC manifest = FindResourceA(nullptr, MAKEINTRESOURCEA(1), MAKEINTRESOURCEA(24) /* RT_MANIFEST */);
     ASSERT_NE(manifest, nullptr);
     const std::string body(static_cast<const char*>(LockResource(LoadResource(nullptr, manifest))),
