@@ -1,6 +1,5 @@
-// Whole runs of the updater, as a process of its own, against patches and
-// builds made by the publisher's tool and served over HTTP on 127.0.0.1,
-// with the player's answers on standard input.
+// Whole runs of the updater as a process of its own, against patches made by the publisher's tool served over
+// HTTP on 127.0.0.1, with the player's answers on standard input.
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/file.h>
@@ -142,11 +141,10 @@ protected:
         EXPECT_FALSE(PathExists(temp / "tmp/patchinfo.xml"));
     }
 
-    size_t ArchiveRequests(size_t from) {
+    long ArchiveRequests(size_t from) {
         const std::vector<std::string> requests = server.Requests();
-        return static_cast<size_t>(
-            std::count_if(requests.begin() + static_cast<std::ptrdiff_t>(from), requests.end(),
-                          [](const std::string& head) { return head.find(".lzma") != std::string::npos; }));
+        return std::count_if(requests.begin() + static_cast<std::ptrdiff_t>(from), requests.end(),
+                             [](const std::string& head) { return head.find(".lzma") != std::string::npos; });
     }
 
     Tree published;  // the tree the last patch leads to
@@ -157,7 +155,7 @@ protected:
 
 TEST_F(UpdateRun, PatchesToTheLatestVersionAndStartsTheGame) {
     Publish(Version(1), Version(2), "2", nullptr);
-    const std::string output = Run("y\ny\n");
+    Run("y\ny\n");
     EXPECT_EQ(Game(), Version(2));
     EXPECT_EQ(InstalledVersion(), "2");
     ExpectNoLeftovers();
@@ -178,16 +176,11 @@ TEST_F(UpdateRun, PatchesToTheLatestVersionAndStartsTheGame) {
     }
 }
 
-// Runs that end without the patch, or take it only as the publisher made
-// it: the installation stays as it was, and nothing is fetched unless the
-// run goes on. The game is started only when the player says so, or when
-// there was nothing to do. An installed file changed since its version was
-// made cannot be rebuilt by the patch: the complete build is offered in the
-// same run, when the server has one. Descriptions and archives as an
-// attacker or a broken cache may serve them: the plain program judges
-// archives by what a description declares; the one with the publisher's key
-// built in also refuses every description not signed by that key for the
-// version it asked for, before it fetches a single archive.
+// Runs that end without the patch, or take it only as the publisher made it: the installation stays as it was,
+// nothing is fetched unless the run goes on, the game starts only when the player says so or nothing was to do. A
+// file changed since its version was made gets the complete build offered. The plain program judges archives by
+// what a description declares; the keyed one also refuses every description not signed by its key for the version
+// it asked for, before it fetches a single archive.
 TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
     const P256PrivateKey signer = LoadSigningKey(IRONVALE_BINARY_DIR "/test-key/private.pem");
     const P256PrivateKey other = GenerateSigningKey();
@@ -200,6 +193,12 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
     rebuilt.File("added/new.txt", "new");
     Tree modded = Version(1);
     modded.files.rbegin()->second = "modded";
+    const auto replace = [&](const char* pattern, const char* with) {
+        return [=] {
+            Edit(PathJoin(patch, "patchinfo.xml"),
+                 [&](std::string& text) { text = std::regex_replace(text, std::regex(pattern), with); });
+        };
+    };
     const auto changed = [&](bool build) {
         Publish(Version(1), rebuilt, "2", nullptr);
         Install(modded, "1");
@@ -218,38 +217,22 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
         const char* program = "served_updater";
     } cases[] = {
         {"up to date", [&] { SetVersion("2"); }, "2", "", "", "2", true, false, 0},
-        {"declined", nullptr, "2", "n\n", "Do you want to update the game now?", "1", false, false, 0},
-        // Versions are numbers: 9 is older than 10.
-        {"9 to 10", [&] { SetVersion("9"); }, "10", "n\n", "Latest version: 10", "9", false, false, 0},
+        {"9 to 10, declined", [&] { SetVersion("9"); }, "10", "n\n", "Latest version: 10", "9", false, false, 0},
         {"missing, play", nullptr, "5", "y\ny\n", "play the installed version instead", "1", true, false, 0},
         {"missing, quit", nullptr, "5", "y\nn\n", "play the installed version instead", "1", false, false, 0},
-        {"no room",
-         [&] {
-             Edit(PathJoin(patch, "patchinfo.xml"), [](std::string& text) {
-                 text = std::regex_replace(text, std::regex("<SpaceRequirement>\\d+"),
-                                           "<SpaceRequirement>9000000000000000000");
-             });
-         },
-         "2", "y\n", "9000000000000 MB of free space is required.", "1", false, false, 0},
+        {"no room", replace("<SpaceRequirement>\\d+", "<SpaceRequirement>9000000000000000000"), "2", "y\n",
+         "9000000000000 MB of free space is required.", "1", false, false, 0},
         {"changed, the build taken", [&] { changed(true); }, "2", "y\ny\nn\n", "Download size: ", "2", false, true, -1},
         {"changed, the build declined", [&] { changed(true); }, "2", "y\nn\n", corrupt, "1", false, true, -1},
         {"changed, no build to offer", [&] { changed(false); }, "2", "y\n", "Failed to apply delta file", "1", false,
          false, -1},
         {"plain, a description without the new elements",
-         [&] {
-             Edit(PathJoin(patch, "patchinfo.xml"), [](std::string& text) {
-                 text = std::regex_replace(text, std::regex("<Version>[^<]*</Version>|<Archives>[\\s\\S]*</Archives>"),
-                                           "");
-             });
-         },
-         "2", "y\nn\n", "", "2", false, false, -1},
+         replace("<Version>[^<]*</Version>|<Archives>[\\s\\S]*</Archives>", ""), "2", "y\nn\n", "", "2", false, false,
+         -1},
         {"plain, an archive with one byte flipped",
          [&] { Edit(PathJoin(patch, "patch0.lzma"), [](std::string& data) { data[9] ^= 1; }); }, "2", "y\n", corrupt,
          "1", false, false, 2},
         {"keyed, signed", nullptr, "2", "y\nn\n", "", "2", false, false, -1, "keyed_updater"},
-        {"keyed, one byte changed",
-         [&] { Edit(PathJoin(patch, "patchinfo.xml"), [](std::string& text) { text[text.find("diff") + 1] = 'o'; }); },
-         "2", "y\n", corrupt, "1", false, false, 0, "keyed_updater"},
         {"keyed, signed by another key", [&] { SignPatchDescription(patch, other); }, "2", "y\n", corrupt, "1", false,
          false, 0, "keyed_updater"},
         {"keyed, unsigned", [&] { RemoveFile(PathJoin(patch, kDescriptionSignatureName)); }, "2", "y\n", corrupt, "1",
@@ -278,11 +261,8 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
         EXPECT_EQ(InstalledVersion(), c.version);
         EXPECT_EQ(Game(), c.version != versionBefore ? published : before);
         EXPECT_EQ(GameStarted(), c.started);
-        if (c.archives < 0) {
-            EXPECT_GT(ArchiveRequests(requests), 0u);
-        } else {
-            EXPECT_EQ(ArchiveRequests(requests), static_cast<size_t>(c.archives));
-        }
+        const long archives = ArchiveRequests(requests);
+        EXPECT_TRUE(c.archives < 0 ? archives > 0 : archives == c.archives) << archives;
         ExpectNoLeftovers();
     }
 }
