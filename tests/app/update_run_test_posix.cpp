@@ -75,8 +75,7 @@ protected:
         return data.currentVersion;
     }
 
-    // The patch from tree from to tree to (the complete build of to beside
-    // it), with version.txt naming version; signed with key when given.
+    // The patch from tree from to tree to, the complete build of to, version.txt; signed with key when given.
     std::string Publish(const Tree& from, const Tree& to, const std::string& version, const P256PrivateKey* key) {
         WriteTree(temp / "old", from);
         WriteTree(temp / "new", to);
@@ -97,9 +96,8 @@ protected:
         return patch;
     }
 
-    // The program started in folder (the test's own by default) with its
-    // own temporary folder and answers on its input; Run waits for it to
-    // end as every run does, with 1, and gives its output.
+    // The program started in folder (the test's own by default) with its own temporary folder and answers on its
+    // input; Run waits for it to end as every run does, with 1, and gives its output.
     ChildProcess Start(const std::string& answers, std::vector<std::string> arguments,
                        const std::string& program = "served_updater", const std::string& folder = "") {
         WriteTextFile(temp / "answers", answers);
@@ -267,8 +265,7 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
     }
 }
 
-// The updater killed at seeded moments of a whole run, then started again
-// until it reports success: the new version, complete, and nothing left.
+// The updater killed at seeded moments of a whole run, then started again: the new version, nothing left.
 TEST_F(UpdateRun, KilledAtAnyMomentTheNextStartsFinishTheUpdate) {
     Publish(Version(1), Version(2), "2", nullptr);
     const auto start = std::chrono::steady_clock::now();
@@ -293,9 +290,8 @@ TEST_F(UpdateRun, KilledAtAnyMomentTheNextStartsFinishTheUpdate) {
     }
 }
 
-// The three modes the game's uninstaller calls touch the installation only:
-// never a file of the same name where the program was started, never a
-// recorded name outside the installation.
+// The three modes the game's uninstaller calls touch the installation only: never a file of the same name where
+// the program was started, never a recorded name outside the installation.
 TEST_F(UpdateRun, UninstallerModesStayInsideTheInstallationAndTheDocuments) {
     WriteTree(temp / "cwd", TreeOf("corvid.dll=decoy"));
     for (const bool present : {false, true}) {
@@ -316,8 +312,7 @@ TEST_F(UpdateRun, UninstallerModesStayInsideTheInstallationAndTheDocuments) {
     }
     unsetenv("XDG_DOCUMENTS_DIR");
 
-    // A record someone edited to list a file beside the game and the game's
-    // folder itself.
+    // A record someone edited to list a file beside the game and the game's folder itself.
     const std::string recorded = Version(1).files.rbegin()->first;
     WriteTextFile(temp / "beside.txt", "beside the game");
     WriteTextFile(PathJoin(install, "Uninstall.xml"),
@@ -332,10 +327,9 @@ TEST_F(UpdateRun, UninstallerModesStayInsideTheInstallationAndTheDocuments) {
     EXPECT_TRUE(PathExists(PathJoin(install, "IronvaleGame.exe")));
 }
 
-// The real program with no game installed: the language question (Enter
-// keeps the current one), then the message that says so. While another
-// copy holds the single-instance guard a second start is refused, but
-// never the elevated copy. (The log's exact format is checked under Wine.)
+// The real program with no game installed: the language question (Enter keeps the current one), then the message
+// that says so. While another copy holds the single-instance guard a second start is refused, but never the
+// elevated copy. (The log's exact format is checked under Wine.)
 TEST_F(UpdateRun, StartsAndKeepsASecondCopyOut) {
     const std::string updater = IRONVALE_BINARY_DIR "/IronvaleUpdater";
     DeleteDirectory(temp / "registry/HKEY_LOCAL_MACHINE/SOFTWARE/Halvard", true);
