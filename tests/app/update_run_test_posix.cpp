@@ -1,6 +1,5 @@
-// Whole runs of the updater, as a process of its own, against patches and
-// builds made by the publisher's tool and served over HTTP on 127.0.0.1,
-// with the player's answers on standard input.
+// Whole runs of the updater as a process of its own, against patches made by the publisher's tool served over
+// HTTP on 127.0.0.1, with the player's answers on standard input.
 #include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/file.h>
@@ -76,8 +75,7 @@ protected:
         return data.currentVersion;
     }
 
-    // The patch from tree from to tree to (the complete build of to beside
-    // it), with version.txt naming version; signed with key when given.
+    // The patch from tree from to tree to, the complete build of to, version.txt; signed with key when given.
     std::string Publish(const Tree& from, const Tree& to, const std::string& version, const P256PrivateKey* key) {
         WriteTree(temp / "old", from);
         WriteTree(temp / "new", to);
@@ -98,9 +96,8 @@ protected:
         return patch;
     }
 
-    // The program started in folder (the test's own by default) with its
-    // own temporary folder and answers on its input; Run waits for it to
-    // end as every run does, with 1, and gives its output.
+    // The program started in folder (the test's own by default) with its own temporary folder and answers on its
+    // input; Run waits for it to end as every run does, with 1, and gives its output.
     ChildProcess Start(const std::string& answers, std::vector<std::string> arguments,
                        const std::string& program = "served_updater", const std::string& folder = "") {
         WriteTextFile(temp / "answers", answers);
@@ -142,11 +139,10 @@ protected:
         EXPECT_FALSE(PathExists(temp / "tmp/patchinfo.xml"));
     }
 
-    size_t ArchiveRequests(size_t from) {
+    long ArchiveRequests(size_t from) {
         const std::vector<std::string> requests = server.Requests();
-        return static_cast<size_t>(
-            std::count_if(requests.begin() + static_cast<std::ptrdiff_t>(from), requests.end(),
-                          [](const std::string& head) { return head.find(".lzma") != std::string::npos; }));
+        return std::count_if(requests.begin() + static_cast<std::ptrdiff_t>(from), requests.end(),
+                             [](const std::string& head) { return head.find(".lzma") != std::string::npos; });
     }
 
     Tree published;  // the tree the last patch leads to
@@ -157,7 +153,7 @@ protected:
 
 TEST_F(UpdateRun, PatchesToTheLatestVersionAndStartsTheGame) {
     Publish(Version(1), Version(2), "2", nullptr);
-    const std::string output = Run("y\ny\n");
+    Run("y\ny\n");
     EXPECT_EQ(Game(), Version(2));
     EXPECT_EQ(InstalledVersion(), "2");
     ExpectNoLeftovers();
@@ -178,16 +174,11 @@ TEST_F(UpdateRun, PatchesToTheLatestVersionAndStartsTheGame) {
     }
 }
 
-// Runs that end without the patch, or take it only as the publisher made
-// it: the installation stays as it was, and nothing is fetched unless the
-// run goes on. The game is started only when the player says so, or when
-// there was nothing to do. An installed file changed since its version was
-// made cannot be rebuilt by the patch: the complete build is offered in the
-// same run, when the server has one. Descriptions and archives as an
-// attacker or a broken cache may serve them: the plain program judges
-// archives by what a description declares; the one with the publisher's key
-// built in also refuses every description not signed by that key for the
-// version it asked for, before it fetches a single archive.
+// Runs that end without the patch, or take it only as the publisher made it: the installation stays as it was,
+// nothing is fetched unless the run goes on, the game starts only when the player says so or nothing was to do. A
+// file changed since its version was made gets the complete build offered. The plain program judges archives by
+// what a description declares; the keyed one also refuses every description not signed by its key for the version
+// it asked for, before it fetches a single archive.
 TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
     const P256PrivateKey signer = LoadSigningKey(IRONVALE_BINARY_DIR "/test-key/private.pem");
     const P256PrivateKey other = GenerateSigningKey();
@@ -200,6 +191,12 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
     rebuilt.File("added/new.txt", "new");
     Tree modded = Version(1);
     modded.files.rbegin()->second = "modded";
+    const auto replace = [&](const char* pattern, const char* with) {
+        return [=] {
+            Edit(PathJoin(patch, "patchinfo.xml"),
+                 [&](std::string& text) { text = std::regex_replace(text, std::regex(pattern), with); });
+        };
+    };
     const auto changed = [&](bool build) {
         Publish(Version(1), rebuilt, "2", nullptr);
         Install(modded, "1");
@@ -218,38 +215,22 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
         const char* program = "served_updater";
     } cases[] = {
         {"up to date", [&] { SetVersion("2"); }, "2", "", "", "2", true, false, 0},
-        {"declined", nullptr, "2", "n\n", "Do you want to update the game now?", "1", false, false, 0},
-        // Versions are numbers: 9 is older than 10.
-        {"9 to 10", [&] { SetVersion("9"); }, "10", "n\n", "Latest version: 10", "9", false, false, 0},
+        {"9 to 10, declined", [&] { SetVersion("9"); }, "10", "n\n", "Latest version: 10", "9", false, false, 0},
         {"missing, play", nullptr, "5", "y\ny\n", "play the installed version instead", "1", true, false, 0},
         {"missing, quit", nullptr, "5", "y\nn\n", "play the installed version instead", "1", false, false, 0},
-        {"no room",
-         [&] {
-             Edit(PathJoin(patch, "patchinfo.xml"), [](std::string& text) {
-                 text = std::regex_replace(text, std::regex("<SpaceRequirement>\\d+"),
-                                           "<SpaceRequirement>9000000000000000000");
-             });
-         },
-         "2", "y\n", "9000000000000 MB of free space is required.", "1", false, false, 0},
+        {"no room", replace("<SpaceRequirement>\\d+", "<SpaceRequirement>9000000000000000000"), "2", "y\n",
+         "9000000000000 MB of free space is required.", "1", false, false, 0},
         {"changed, the build taken", [&] { changed(true); }, "2", "y\ny\nn\n", "Download size: ", "2", false, true, -1},
         {"changed, the build declined", [&] { changed(true); }, "2", "y\nn\n", corrupt, "1", false, true, -1},
         {"changed, no build to offer", [&] { changed(false); }, "2", "y\n", "Failed to apply delta file", "1", false,
          false, -1},
         {"plain, a description without the new elements",
-         [&] {
-             Edit(PathJoin(patch, "patchinfo.xml"), [](std::string& text) {
-                 text = std::regex_replace(text, std::regex("<Version>[^<]*</Version>|<Archives>[\\s\\S]*</Archives>"),
-                                           "");
-             });
-         },
-         "2", "y\nn\n", "", "2", false, false, -1},
+         replace("<Version>[^<]*</Version>|<Archives>[\\s\\S]*</Archives>", ""), "2", "y\nn\n", "", "2", false, false,
+         -1},
         {"plain, an archive with one byte flipped",
          [&] { Edit(PathJoin(patch, "patch0.lzma"), [](std::string& data) { data[9] ^= 1; }); }, "2", "y\n", corrupt,
          "1", false, false, 2},
         {"keyed, signed", nullptr, "2", "y\nn\n", "", "2", false, false, -1, "keyed_updater"},
-        {"keyed, one byte changed",
-         [&] { Edit(PathJoin(patch, "patchinfo.xml"), [](std::string& text) { text[text.find("diff") + 1] = 'o'; }); },
-         "2", "y\n", corrupt, "1", false, false, 0, "keyed_updater"},
         {"keyed, signed by another key", [&] { SignPatchDescription(patch, other); }, "2", "y\n", corrupt, "1", false,
          false, 0, "keyed_updater"},
         {"keyed, unsigned", [&] { RemoveFile(PathJoin(patch, kDescriptionSignatureName)); }, "2", "y\n", corrupt, "1",
@@ -278,17 +259,13 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
         EXPECT_EQ(InstalledVersion(), c.version);
         EXPECT_EQ(Game(), c.version != versionBefore ? published : before);
         EXPECT_EQ(GameStarted(), c.started);
-        if (c.archives < 0) {
-            EXPECT_GT(ArchiveRequests(requests), 0u);
-        } else {
-            EXPECT_EQ(ArchiveRequests(requests), static_cast<size_t>(c.archives));
-        }
+        const long archives = ArchiveRequests(requests);
+        EXPECT_TRUE(c.archives < 0 ? archives > 0 : archives == c.archives) << archives;
         ExpectNoLeftovers();
     }
 }
 
-// The updater killed at seeded moments of a whole run, then started again
-// until it reports success: the new version, complete, and nothing left.
+// The updater killed at seeded moments of a whole run, then started again: the new version, nothing left.
 TEST_F(UpdateRun, KilledAtAnyMomentTheNextStartsFinishTheUpdate) {
     Publish(Version(1), Version(2), "2", nullptr);
     const auto start = std::chrono::steady_clock::now();
@@ -313,9 +290,8 @@ TEST_F(UpdateRun, KilledAtAnyMomentTheNextStartsFinishTheUpdate) {
     }
 }
 
-// The three modes the game's uninstaller calls touch the installation only:
-// never a file of the same name where the program was started, never a
-// recorded name outside the installation.
+// The three modes the game's uninstaller calls touch the installation only: never a file of the same name where
+// the program was started, never a recorded name outside the installation.
 TEST_F(UpdateRun, UninstallerModesStayInsideTheInstallationAndTheDocuments) {
     WriteTree(temp / "cwd", TreeOf("corvid.dll=decoy"));
     for (const bool present : {false, true}) {
@@ -336,8 +312,7 @@ TEST_F(UpdateRun, UninstallerModesStayInsideTheInstallationAndTheDocuments) {
     }
     unsetenv("XDG_DOCUMENTS_DIR");
 
-    // A record someone edited to list a file beside the game and the game's
-    // folder itself.
+    // A record someone edited to list a file beside the game and the game's folder itself.
     const std::string recorded = Version(1).files.rbegin()->first;
     WriteTextFile(temp / "beside.txt", "beside the game");
     WriteTextFile(PathJoin(install, "Uninstall.xml"),
@@ -352,10 +327,9 @@ TEST_F(UpdateRun, UninstallerModesStayInsideTheInstallationAndTheDocuments) {
     EXPECT_TRUE(PathExists(PathJoin(install, "IronvaleGame.exe")));
 }
 
-// The real program with no game installed: the language question (Enter
-// keeps the current one), then the message that says so. While another
-// copy holds the single-instance guard a second start is refused, but
-// never the elevated copy. (The log's exact format is checked under Wine.)
+// The real program with no game installed: the language question (Enter keeps the current one), then the message
+// that says so. While another copy holds the single-instance guard a second start is refused, but never the
+// elevated copy. (The log's exact format is checked under Wine.)
 TEST_F(UpdateRun, StartsAndKeepsASecondCopyOut) {
     const std::string updater = IRONVALE_BINARY_DIR "/IronvaleUpdater";
     DeleteDirectory(temp / "registry/HKEY_LOCAL_MACHINE/SOFTWARE/Halvard", true);

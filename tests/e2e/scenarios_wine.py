@@ -1,16 +1,11 @@
 #!/usr/bin/env python3
-"""IronvaleUpdater.exe under Wine as a player's machine runs it: the game in
-the registry, patches made by ironvale-patch and served by nginx (or from
-the program's folder, or file://), the window on a private Xvfb display,
-dialog_answer playing the player. One table row per scenario.
-
-  scenarios_wine.py BUILD_DIR [NAME...]   (the Windows build folder)
-"""
+"""IronvaleUpdater.exe under Wine as a player's machine runs it, one table row per scenario: patches made by
+ironvale-patch served by nginx, the window on a private Xvfb display, dialog_answer playing the player.
+  scenarios_wine.py BUILD_DIR [NAME...]   (the Windows build folder)"""
 import os
 import random
 import re
 import shutil
-import signal
 import socket
 import subprocess
 import sys
@@ -37,10 +32,9 @@ def wait_until(condition, seconds, pause=0.05):
         time.sleep(pause)
 
 
+# Files edited, added and removed from version to version, a file that becomes a folder; the big game's stage two
+# replaces hundreds of small files, long enough to be interrupted at many moments.
 def version_tree(number, big=False):
-    """Files edited, added and removed from version to version, a file that
-    becomes a folder; the big game replaces hundreds of small files, so its
-    stage two lasts long enough to be interrupted at many moments."""
     rng = random.Random(number)
     tree = {f"data{i % 3}/file{i}.bin": rng.randbytes(300 + i * 37) + b"v%d" % number
             for i in range(12) if (i + number) % 7}
@@ -68,14 +62,13 @@ class Session:
         self.work = Path(tempfile.mkdtemp(prefix="ivl-e2e-"))
         self.env = dict(os.environ, WINEPREFIX=str(self.build / "wineprefix"), WINEDEBUG="-all")
         self.users = self.build / "wineprefix/drive_c/users" / os.environ.get("USER", "root")
-        temp = next((d for d in (self.users / "Temp", self.users / "AppData/Local/Temp") if d.is_dir()), None)
-        self.log = (temp or self.users / "Temp") / "IronvaleUpdater.log"
+        temp = self.users / "AppData/Local/Temp"
+        self.log = (temp if temp.is_dir() else self.users / "Temp") / "IronvaleUpdater.log"
         self.tool = next((t for p in ("native-asan", "native", "native-release")
                           if (t := self.build.parent / p / "tools/ironvale-patch").exists()), None)
         check(self.tool, "build the native ironvale-patch first (cmake --preset native; cmake --build --preset native)")
-        # No reset when the last client leaves. Wine's desktop process stays
-        # tied to the display it was started on: the prefix's Wine processes
-        # end before the session begins and again before its display goes.
+        # No reset when the last client leaves. Wine's desktop process stays tied to the display it was started on:
+        # the prefix's Wine processes end before the session begins and again before its display goes.
         self.end_wine()
         read, write = os.pipe()
         self.xvfb = subprocess.Popen(["Xvfb", "-displayfd", str(write), "-screen", "0", "1024x768x24", "-nolisten",
@@ -109,12 +102,9 @@ class Session:
             f"  server {{ listen 127.0.0.1:{port}; root {self.work}/server;\n"
             f"    location /slow/ {{ alias {self.work}/server/; limit_rate 64k; }} }} }}\n")
         nginx = subprocess.Popen(["nginx", "-c", str(self.work / "nginx.conf")], stderr=subprocess.DEVNULL)
-        for _ in range(100):
-            with socket.socket() as client:
-                if client.connect_ex(("127.0.0.1", port)) == 0:
-                    return nginx, port
-            time.sleep(0.05)
-        check(False, "nginx did not start")
+        wait_until((self.work / "nginx.pid").exists, 5)  # written once it listens
+        check((self.work / "nginx.pid").exists(), "nginx did not start")
+        return nginx, port
 
     def end_wine(self):
         for flag in ("-k", "-w"):  # -k signals the server; -w waits until it is gone
@@ -140,9 +130,8 @@ class Session:
         return subprocess.Popen([ROOT / "scripts/wine-run.sh", program, *args], env=env or self.env, cwd=cwd, **QUIET)
 
     def answer(self, button, expected="", language=ENGLISH, caption=None, timeout_ms=30000, may_miss=False):
-        """Waits for a box of the run, presses button (0: none, it stays) and
-        returns its text, which must hold expected (a string key or a text);
-        "" when none came and may_miss."""
+        """The text of the next box, which must hold expected (a string key or text), after button (0: none, it
+        stays) is pressed; "" when none came and may_miss."""
         done = self.wine(self.programs / "dialog_answer.exe", caption or self.caption(language), button, timeout_ms,
                          check=False)
         check(done.returncode == 0 or may_miss, f"no box to answer with {button}")
@@ -155,7 +144,7 @@ class Session:
         return "Z:" + str(path).replace("/", "\\")
 
     def publish(self, old, new, version, out):
-        """The patch from tree old to new, the complete build of new, version.txt."""
+        # The patch from tree old to new, the complete build of new, version.txt.
         trees = self.work / "trees"
         write_tree(trees / "old", old)
         write_tree(trees / "new", new)
@@ -166,16 +155,13 @@ class Session:
         return out / f"patch_515195_{version}"
 
     def run_log(self):
-        """The log of the last run, from the empty line before its separator
-        on, each line with its CR."""
+        # The last run's log from the empty line before its separator, each line with its CR.
         lines = self.log.read_bytes().decode(errors="replace").split("\n")
         starts = [i for i, line in enumerate(lines) if line.rstrip("\r").endswith("-" * 103)]
         return "\n".join(lines[max(starts[-1] - 1, 0) if starts else 0:])
 
 
-class Run:
-    """One scenario's installation, its server location and the runs on it."""
-
+class Run:  # one scenario's installation, its server location and the runs on it
     def __init__(self, session, name):
         self.s = session
         self.folder = session.work / name
@@ -196,7 +182,7 @@ class Run:
             self.s.wine("reg", "add", "HKLM\\Software\\Halvard\\Ironvale", "/v", name, "/d", value, "/reg:32", "/f")
 
     def ready(self, out=None, language=ENGLISH):
-        """Version 1 installed, the patch to 2 published (on the server unless out); its folder."""
+        # Version 1 installed, the patch to 2 published (on the server unless out); its folder.
         self.install_version(version_tree(1), "1", language)
         return self.s.publish(version_tree(1), version_tree(2), "2", out or self.s.work / "server")
 
@@ -214,8 +200,7 @@ class Run:
             check(False, "the run did not end (a box nobody expected?)")
 
     def play(self, args, answers, tree, version, game=None, language=ENGLISH, **start):
-        """A run whose boxes get answers (expected text, button) in turn, then
-        the checks of expect; the boxes' texts."""
+        # A run whose boxes get answers (expected text, button) in turn, then the checks of expect; the boxes' texts.
         process = self.start(*args, **start)
         texts = [self.s.answer(button, expected, language) for expected, button in answers]
         self.finish(process)
@@ -223,8 +208,8 @@ class Run:
         return texts
 
     def expect(self, tree, version, game=None):
-        """The tree and version, nothing left over, nothing beside touched;
-        game: a text its command line holds, None (not started) or "" (either)."""
+        # The tree and version, nothing left over or beside touched; game: a text its command line holds, None (not
+        # started) or "" (either).
         check(read_tree(self.install, OWN) == {k: v for k, v in tree.items() if k not in OWN},
               "the installed tree is not the expected version")
         check(self.version() == version and self.outside.read_text() == "beside the game",
@@ -239,25 +224,15 @@ class Run:
               f"the game's start: {started}, expected {game}")
 
 
-def terminate(process):
-    """Ends the program at once, as TerminateProcess does: SIGKILL to the Wine
-    process that runs it (a taskkill would start 0.15 s late)."""
-    process.send_signal(signal.SIGKILL)
-    process.wait()
-
-
 def wait_for_line(s, process, line, pause=0.005):
     wait_until(lambda: line in s.run_log() or process.poll() is not None, 120, pause)
 
 
 # ------------------------------------------------------------- scenarios
 def start_up(s, run):
-    """No game installed and no language chosen: the language dialog (OK
-    keeps the current one), then the not-installed box; the run's opening
-    log lines in their exact format."""
     s.forget_game()
     process = s.start(s.build / "IronvaleUpdater.exe", "-serverDeltaTime", "-3.7", "-hostname", "test host")
-    s.answer(OK)
+    s.answer(OK)  # the language dialog: OK keeps the current one
     s.answer(OK, "INSTALLER_GAME_IS_NOT_INSTALLED")
     run.finish(process)
     s.forget_game()
@@ -270,10 +245,7 @@ def start_up(s, run):
               f"line {i} of the run: {lines[i:i + 1]}")
 
 
-def patch_1_to_2(s, run, language=ENGLISH, location=None, beside=None):
-    """1 to 2, both questions in the registry's language, the game started:
-    over HTTP with the patch's own addresses signed, or from the program's
-    own folder (beside) or a file:// location."""
+def patch_1_to_2(s, run, language=ENGLISH, location=None, beside=None):  # beside: the program's own folder
     run.ready(beside or location and run.folder / "served", language)
     if beside:
         shutil.copy(s.build / "IronvaleUpdater.exe", beside)
@@ -290,13 +262,13 @@ def patch_1_to_2(s, run, language=ENGLISH, location=None, beside=None):
 
 
 def interrupt_stage_two(s, run, rng):
-    """Version 1 of the big game, its stage two to 2 ended at a seeded moment."""
     run.install_version(version_tree(1, big=True), "1")
     process = run.start("-latestVersion", "2")
     s.answer(YES)
     wait_for_line(s, process, "ApplyPatch Start")
     time.sleep(rng.random() * 0.5)
-    terminate(process)
+    process.kill()  # SIGKILL to the Wine process, as TerminateProcess ends it (a taskkill starts 0.15 s late)
+    process.wait()
 
 
 def scenario_chain_resume(s, run):
@@ -314,7 +286,6 @@ def scenario_chain_resume(s, run):
 
 
 def scenario_terminate(s, run):
-    """TerminateProcess at seeded moments of stage two, then a clean start."""
     s.publish(version_tree(1, big=True), version_tree(2, big=True), "2", s.work / "server")
     rng = random.Random(16)
     for trial in range(12):
@@ -329,9 +300,7 @@ def scenario_terminate(s, run):
 
 def scenario_reinstall(s, run):
     s.publish(version_tree(1), version_tree(2), "2", s.work / "server")
-    damaged = dict(version_tree(2))
-    damaged.pop(sorted(damaged)[0])
-    run.install_version(damaged, "-1")
+    run.install_version(dict(sorted(version_tree(2).items())[1:]), "-1")  # one file missing
     run.play(["-latestVersion", "2"], [("", NO)], version_tree(2), "2")
     check("build_2" in s.run_log(), "the complete build was not fetched")
 
@@ -356,15 +325,14 @@ def scenario_cancel_download(s, run):
 
 
 def scenario_cancel_preparation(s, run):
-    """24 MiB of incompressible bytes take a second or two to unpack. The
-    member is made by xz, in the archive's layout (name length, name, 40-bit
-    size, LZMA data)."""
+    # 24 MiB of random bytes take a second or two to unpack; the archive's layout: name length, name, 40-bit size, data.
     patch = run.folder / "served/patch_515195_2"
     patch.mkdir(parents=True)
     lzma = subprocess.run(["xz", "--format=lzma", "-0", "-T1", "-c"], input=random.Random(3).randbytes(24 << 20),
                           stdout=subprocess.PIPE, check=True).stdout
     (patch / "patch0.lzma").write_bytes(b"\x0fdata0\\large.bin" + len(lzma).to_bytes(5, "little") + lzma)
-    describe(patch, '<FileChanges><new Path="data0\\large.bin" File="patch0.lzma" /></FileChanges>')
+    (patch / "patchinfo.xml").write_bytes(described('<FileChanges><new Path="data0\\large.bin" File="patch0.lzma" />'
+                                                    "</FileChanges>")(None))
     run.install_version(version_tree(1), "1")
     run.env["IRONVALE_TEST_UPDATE_LOCATION"] = "file://" + s.windows_path(run.folder / "served")
     cancel_in_window(s, run, "Decoding file: data0\\large.bin")
@@ -376,10 +344,7 @@ def scenario_missing_patch(s, run):
              "+webSiteHostName")
 
 
-def scenario_locked_file(s, run):
-    """A file held as a running game holds it: the retry question, answered
-    Retry once it is let go; then again with Cancel, which leaves stage two
-    to the next start."""
+def scenario_locked_file(s, run):  # Retry once the file is let go; Cancel leaves stage two to the next start
     changed = next(p for p, c in version_tree(2).items() if version_tree(1).get(p, c) != c)
     for button in (RETRY, CANCEL):
         run.ready()
@@ -405,30 +370,24 @@ def scenario_locked_file(s, run):
         run.expect(version_tree(2), "2")
 
 
-def describe(patch, items):
-    (patch / "patchinfo.xml").write_text(f"<IronvaleWestPatch>{items}</IronvaleWestPatch>")
+def described(items):
+    return lambda _: f"<IronvaleWestPatch>{items}</IronvaleWestPatch>".encode()
 
 
-def damaged_archive(patch, cut=None, flip=None):
-    data = bytearray((patch / "patch0.lzma").read_bytes())
-    if flip:
-        data[flip] ^= 0xFF
-    (patch / "patch0.lzma").write_bytes(bytes(data[:cut]))
-
-
-HOSTILE = [  # what the patch does to the published patch, what the error box says
-    (lambda p: describe(p, '<FileChanges><delete Path="..\\outside.txt" /></FileChanges>'), "Unsafe path"),
-    (lambda p: describe(p, '<DirectoryChanges><delete Path=".\\" /></DirectoryChanges>'), "Unsafe path"),
-    (lambda p: describe(p, '<FileChanges><delete Path="*.*" /></FileChanges>'), "Unsafe path"),
-    (lambda p: (p / "patchinfo.xml").write_text("not XML at all"), "Failed to load patch info file"),
-    (lambda p: damaged_archive(p, cut=40), "INSTALLER_ERROR_CORRUPT_DATA"),
-    (lambda p: damaged_archive(p, flip=60), "INSTALLER_ERROR_CORRUPT_DATA"),
+HOSTILE = [  # the published patch's file, its new content from the old, what the error box says
+    ("patchinfo.xml", described('<FileChanges><delete Path="..\\outside.txt" /></FileChanges>'), "Unsafe path"),
+    ("patchinfo.xml", described('<DirectoryChanges><delete Path=".\\" /></DirectoryChanges>'), "Unsafe path"),
+    ("patchinfo.xml", described('<FileChanges><delete Path="*.*" /></FileChanges>'), "Unsafe path"),
+    ("patchinfo.xml", lambda _: b"not XML at all", "Failed to load patch info file"),
+    ("patch0.lzma", lambda data: data[:40], "INSTALLER_ERROR_CORRUPT_DATA"),
+    ("patch0.lzma", lambda data: data[:60] + bytes([data[60] ^ 0xFF]) + data[61:], "INSTALLER_ERROR_CORRUPT_DATA"),
 ]
 
 
 def scenario_hostile(s, run):
-    for damage, expected in HOSTILE:
-        damage(run.ready())
+    for name, damage, expected in HOSTILE:
+        file = run.ready() / name
+        file.write_bytes(damage(file.read_bytes()))
         run.play(["-latestVersion", "2"], [("", YES), (expected, OK)], version_tree(1), "1")
 
 
@@ -439,7 +398,6 @@ def scenario_up_to_date(s, run):
 
 
 def scenario_component_removal(s, run):
-    """Mode 1 looks for corvid.dll in the installation, never where it was started."""
     decoy = run.folder / "cwd/corvid.dll"
     for present in (True, False):
         run.install_version(version_tree(1), "1")
@@ -462,7 +420,6 @@ def scenario_settings_removal(s, run):
 
 
 def scenario_uninstall_cleanup(s, run):
-    """Mode 3 removes what the record lists inside the installation only."""
     run.install_version({**version_tree(1), "corvid.dll": b"", "GL.ini": b"", "pb/pb.dll": b""}, "1")
     listed = [p for p in version_tree(1) if "/" in p][:3]
     files = "".join(f'<new Path="{s.windows_path(run.install / p)}" />' for p in listed)
@@ -477,10 +434,6 @@ def scenario_uninstall_cleanup(s, run):
 
 
 def scenario_elevated_copy(s, run):
-    """RunElevated ("runas"; Wine grants it without a prompt) starts the
-    updater as the rights check would, with -SID: the copy reads the starting
-    user's key under HKEY_USERS (its language: Polish), and its exit code
-    comes back."""
     sid = "S-1-5-21-4242-4242-4242-1002"
     s.forget_game()
     for name, value in (("Install Dir", "C:\\Games\\Ironvale\\"), ("Language", "Polish")):
@@ -495,11 +448,11 @@ def scenario_elevated_copy(s, run):
 
 
 SCENARIOS = [
-    ("start-up", start_up),  # no game: the language dialog, the not-installed box, the log's format
-    ("patch over HTTP", patch_1_to_2),  # signed addresses, both questions, the game started
+    ("start-up", start_up),  # no game: the language dialog, the not-installed box, the log's exact format
+    ("patch over HTTP", patch_1_to_2),  # signed addresses, both questions in the registry's language, the game started
     ("chain 1 to 3", scenario_chain_resume),  # a record of an interrupted run resumed, then the newest
     ("reinstall", scenario_reinstall),  # -1 without a record: the complete build
-    ("terminate", scenario_terminate),  # TerminateProcess in stage two, then a clean start
+    ("terminate", scenario_terminate),  # TerminateProcess at seeded moments of stage two, then a clean start
     ("cancel download", scenario_cancel_download),  # "Cancel" then Yes while an archive arrives
     ("cancel preparation", scenario_cancel_preparation),  # ... while a large file is unpacked
     ("missing patch", scenario_missing_patch),  # the play-old question; Yes starts the game
@@ -510,10 +463,12 @@ SCENARIOS = [
     ("up to date", scenario_up_to_date),  # no question, the game started
     ("program folder", lambda s, run: patch_1_to_2(s, run, location="", beside=run.folder / "updater")),
     ("file location", lambda s, run: patch_1_to_2(s, run, location="file://" + s.windows_path(run.folder / "served"))),
-    ("component removal", scenario_component_removal),  # mode 1
+    ("component removal", scenario_component_removal),  # mode 1: corvid.dll in the installation, not where started
     ("settings removal", scenario_settings_removal),  # mode 2 answered No and Yes
-    ("uninstall clean-up", scenario_uninstall_cleanup),  # mode 3
-    ("elevated copy", scenario_elevated_copy),  # runas with -SID
+    ("uninstall clean-up", scenario_uninstall_cleanup),  # mode 3: what the record lists inside the installation only
+    # RunElevated ("runas", granted by Wine) as the rights check starts it: the copy reads the starting user's key
+    # under HKEY_USERS by -SID (its language: Polish), its exit code comes back.
+    ("elevated copy", scenario_elevated_copy),
 ]
 
 

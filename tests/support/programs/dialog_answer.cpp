@@ -1,8 +1,6 @@
-// dialog_answer CAPTION BUTTON_ID TIMEOUT_MS: waits for a dialog box (class
-// #32770) with that caption, prints its message text (UTF-8), then
-// "[button] " and the label of that button, and presses it (id 0: none, the
-// box stays for a later call). Exit 0 once a pressed box has closed, 2 when
-// none appeared.
+// dialog_answer CAPTION BUTTON_ID TIMEOUT_MS: waits for a dialog box (class #32770) with that caption, prints its
+// message text (UTF-8), then "[button] " and the label of that button, and presses it (id 0: none, the box stays for
+// a later call). Exit 0 once a pressed box has closed, 2 when none appeared.
 #include <windows.h>
 
 #include <cstdio>

@@ -1,6 +1,4 @@
-// The updater as tests run it against a server of their own: the same
-// program, with the location of its patches taken from the environment
-// (IRONVALE_TEST_UPDATE_LOCATION) instead of being built in.
+// The updater with its patch location from IRONVALE_TEST_UPDATE_LOCATION.
 #include <cstdlib>
 #include <string>
 #include <vector>

@@ -1,10 +1,7 @@
-// window_driver: the updater's main window and boxes, driven by commands on
-// stdin as the update run drives them, each answered by one line on stdout.
-// A thread of its own answers a box (button ID) and describes it as BOX:
-// its text's first line, "[ID LABEL]" per button, "{ENTRIES} SELECTED" for
-// a list. Start-up is the updater's: the language from the game's registry
-// key, the button hook on the main thread, GDI+; the log goes to
-// window_driver.log in the temporary folder.
+// window_driver: the updater's main window and boxes, driven by commands on stdin as the update run drives them, each
+// answered by one line on stdout. A thread of its own answers a box (button ID) and describes it as BOX: its text's
+// first line, "[ID LABEL]" per button, "{ENTRIES} SELECTED" for a list. Start-up is the updater's: the language from
+// the game's registry key, the button hook on the main thread, GDI+; the log goes to window_driver.log in %TEMP%.
 //   start              shows the window with a status line: "started"
 //   rect               "LEFT TOP" of the window
 //   progress N         overall and file progress: "ok"
@@ -103,13 +100,6 @@ std::string Answered(int button, const std::wstring& choice, Show show) {
     return result + " |" + seen;
 }
 
-std::string DescribeDialogFont() {
-    LOGFONTA font = {};
-    if (GetObjectA(GetDialogFont(), sizeof(font), &font) == 0) return "none";
-    return "'" + std::string(font.lfFaceName) + "' " + std::to_string(font.lfHeight) + " " +
-           std::to_string(font.lfWeight);
-}
-
 }  // namespace
 
 int main() {
@@ -171,7 +161,11 @@ int main() {
                 return chosen;
             });
         } else if (command == "dialogfont") {
-            reply = DescribeDialogFont();
+            LOGFONTA font = {};
+            const bool made = GetObjectA(GetDialogFont(), sizeof(font), &font) != 0;
+            reply = made ? "'" + std::string(font.lfFaceName) + "' " + std::to_string(font.lfHeight) + " " +
+                               std::to_string(font.lfWeight)
+                         : "none";
         }
         std::cout << reply << std::endl;
     }
