@@ -231,6 +231,9 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
          [&] { Edit(PathJoin(patch, "patch0.lzma"), [](std::string& data) { data[9] ^= 1; }); }, "2", "y\n", corrupt,
          "1", false, false, 2},
         {"keyed, signed", nullptr, "2", "y\nn\n", "", "2", false, false, -1, "keyed_updater"},
+        // The signature covers the very bytes the program reads.
+        {"keyed, changed after signing", replace("diff", "doff"), "2", "y\n", corrupt, "1", false, false, 0,
+         "keyed_updater"},
         {"keyed, signed by another key", [&] { SignPatchDescription(patch, other); }, "2", "y\n", corrupt, "1", false,
          false, 0, "keyed_updater"},
         {"keyed, unsigned", [&] { RemoveFile(PathJoin(patch, kDescriptionSignatureName)); }, "2", "y\n", corrupt, "1",
