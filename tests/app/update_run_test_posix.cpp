@@ -153,13 +153,16 @@ protected:
 
 TEST_F(UpdateRun, PatchesToTheLatestVersionAndStartsTheGame) {
     Publish(Version(1), Version(2), "2", nullptr);
+    WriteTextFile(PathJoin(install, "Uninstall.xml"), "unreadable");
     Run("y\ny\n");
+    EXPECT_EQ(ReadTextFile(PathJoin(install, "Uninstall.xml.bad")), "unreadable");  // kept aside, and a new one begun
+    RemoveFile(PathJoin(install, "Uninstall.xml.bad"));
     EXPECT_EQ(Game(), Version(2));
     EXPECT_EQ(InstalledVersion(), "2");
     ExpectNoLeftovers();
     const std::string history = ReadTextFile(PathJoin(install, "UpdateHistory.log"));
     EXPECT_EQ(history.substr(history.find(' ', history.find(' ') + 1)), " " + server.Url("/patch_515195_2\r\n"));
-    // The uninstall record, started by this run, lists what the patch added.
+    // The new uninstall record lists what the patch added.
     const std::string record = ReadTextFile(PathJoin(install, "Uninstall.xml"));
     for (const auto& file : Version(2).files) {
         if (Version(1).files.count(file.first) == 0) {
