@@ -30,41 +30,11 @@ cleanup() {
 }
 trap cleanup EXIT
 
-mkdir -p "$work/www" "$work/temp" "$work/out"
+mkdir -p "$work/www" "$work/out"
 head -c $((size_mib * 1024 * 1024)) /dev/urandom >"$work/www/big.bin"
-# nginx's workers run as an unprivileged user when started by root.
-chmod -R a+rX "$work"
-
-port=$(python3 -c 'import socket; s = socket.socket(); s.bind(("127.0.0.1", 0)); print(s.getsockname()[1])')
-cat >"$work/nginx.conf" <<CONF
-daemon off;
-worker_processes 1;
-pid $work/nginx.pid;
-error_log $work/error.log warn;
-events { worker_connections 64; }
-http {
-  access_log off;
-  sendfile on;
-  tcp_nopush on;
-  client_body_temp_path $work/temp/body;
-  proxy_temp_path $work/temp/proxy;
-  fastcgi_temp_path $work/temp/fastcgi;
-  uwsgi_temp_path $work/temp/uwsgi;
-  scgi_temp_path $work/temp/scgi;
-  server {
-    listen 127.0.0.1:$port;
-    root $work/www;
-  }
-}
-CONF
-nginx -p "$work" -c "$work/nginx.conf" &
-nginx_pid=$!
+source "$root/bench/support/loopback_nginx.sh"
+start_nginx "$work" big.bin
 url="http://127.0.0.1:$port/big.bin"
-for _ in $(seq 50); do
-  curl -sf -o /dev/null -r 0-0 "$url" && break
-  sleep 0.1
-done
-curl -sf -o /dev/null -r 0-0 "$url" || { echo "download bench: nginx did not start" >&2; cat "$work/error.log" >&2; exit 1; }
 
 # Both results must be the file itself, or the timing means nothing.
 "$tool" fetch "$url" "$work/out/check.bin"

@@ -66,38 +66,11 @@ PY
 "$tool" build --from v1 --to v2 --version 2 --out www --max-archive-size $((16 << 20)) >/dev/null
 patch=$(find www -maxdepth 1 -name 'patch_*' | head -1)
 mapfile -t archives < <(cd "$patch" && ls -- *.lzma | sort)
-# nginx's workers run as an unprivileged user when started by root.
-chmod -R a+rX "$work"
 echo "  $(du -sh v1 | cut -f1) installed, ${#archives[@]} archives of $(du -ch "$patch"/*.lzma | tail -1 | cut -f1)"
 
-port=$(python3 -c 'import socket; s = socket.socket(); s.bind(("127.0.0.1", 0)); print(s.getsockname()[1])')
-mkdir -p temp
-cat >nginx.conf <<CONF
-daemon off;
-worker_processes 1;
-pid $work/nginx.pid;
-error_log $work/error.log warn;
-events { worker_connections 64; }
-http {
-  access_log off;
-  sendfile on;
-  tcp_nopush on;
-  client_body_temp_path $work/temp/body;
-  proxy_temp_path $work/temp/proxy;
-  fastcgi_temp_path $work/temp/fastcgi;
-  uwsgi_temp_path $work/temp/uwsgi;
-  scgi_temp_path $work/temp/scgi;
-  server {
-    listen 127.0.0.1:$port;
-    root $work/www;
-  }
-}
-CONF
-nginx -p "$work" -c "$work/nginx.conf" &
-nginx_pid=$!
+source "$root/bench/support/loopback_nginx.sh"
+start_nginx "$work" version.txt
 location=http://127.0.0.1:$port
-for _ in $(seq 50); do curl -sf -o /dev/null "$location/version.txt" && break; sleep 0.1; done
-curl -sf -o /dev/null "$location/version.txt" || { echo "update bench: nginx did not start" >&2; cat error.log >&2; exit 1; }
 
 # The program with this server built in, in a build folder of its own.
 program_build=$root/build/bench-update
