@@ -74,7 +74,12 @@ class Session:
         self.xvfb = subprocess.Popen(["Xvfb", "-displayfd", str(write), "-screen", "0", "1024x768x24", "-nolisten",
                                       "tcp", "-noreset"], pass_fds=[write], **QUIET)
         os.close(write)
-        self.env["DISPLAY"] = ":" + os.read(read, 32).decode().split()[0]
+        # The server writes the number and its line end apart, and ends with a fatal error when the second write
+        # finds the reader gone: the whole line is read.
+        said = b""
+        while not said.endswith(b"\n"):
+            said += os.read(read, 32) or b"\n"
+        self.env["DISPLAY"] = ":" + said.decode().split()[0]
         os.close(read)
         self.nginx, self.port = self.start_nginx()
         # Without a window manager Wine waits for one after every closed box.

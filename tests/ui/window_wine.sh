@@ -17,15 +17,15 @@ export WINEPREFIX="$(dirname "$program")/wineprefix"
 "$run" "$holder_exe" 0 >/dev/null 2>&1 || true
 log="$WINEPREFIX/drive_c/users/$(id -un)/Temp/IronvaleUpdater.log"
 
-# The X server picks a free display number itself and says it once it is ready. It must not reset when its last
-# client leaves. Wine's desktop process stays tied to the display it was started on, so the prefix's Wine processes
-# end before the session begins and again before its display goes.
+# The X server picks a free display number itself and writes it to a file once it is ready. It must not reset when its
+# last client leaves. Wine's desktop process stays tied to the display it was started on, so the prefix's Wine
+# processes end before the session begins and again before its display goes, which is gone before the next test.
 end_wine() { { /usr/lib/wine/wineserver -k; /usr/lib/wine/wineserver -w; } 2>/dev/null || true; }
 end_wine
 retry() { for _ in $(seq 100); do "$@" && return; sleep 0.1; done; false; }  # COMMAND...: for ten seconds
 display_file=$(mktemp)
 Xvfb -displayfd 3 -screen 0 1024x768x24 -nolisten tcp -noreset 3>"$display_file" >/dev/null 2>&1 & xvfb=$!
-trap 'cleanup; end_wine; kill $xvfb 2>/dev/null || true; rm -f "$display_file"' EXIT
+trap 'cleanup; end_wine; kill $xvfb 2>/dev/null; wait $xvfb 2>/dev/null; rm -f "$display_file"' EXIT
 retry test -s "$display_file" || fail "Xvfb did not start"
 export DISPLAY=:$(head -1 "$display_file")
 key='HKCU\Software\Halvard\Ironvale'
