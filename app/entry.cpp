@@ -17,14 +17,6 @@ const char* const kLogFileName = "IronvaleUpdater.log";
 
 namespace {
 
-void ShowBox(const std::wstring& text, MessageIcon icon) {
-    MessageBoxRequest request;
-    request.text = text;
-    request.caption = GetWindowTitle();
-    request.icon = icon;
-    ShowMessageBox(request);
-}
-
 void ReportEscapedException(const Exception& error) {
     std::wstring text;
     switch (error.Code()) {
@@ -45,7 +37,7 @@ void ReportEscapedException(const Exception& error) {
             text = Localize("INSTALLER_ERROR_OCCURRED") + L"\n" + error.wideMessage;
             break;
     }
-    ShowBox(text, MessageIcon::Error);
+    ShowTitledMessage(text, MessageIcon::Error);
 }
 
 }  // namespace
@@ -83,7 +75,7 @@ int32_t RunUpdaterProcess(const std::string& commandLine, const std::string& upd
     SingleInstance instance;
     if (!arguments->internallyElevated && !instance.Acquire()) {
         LOG_AS("Main", Error) << "There is already another updater instance running.";
-        ShowBox(Localize("INSTALLER_INSTANCE_RUNNING"), MessageIcon::Warning);
+        ShowTitledMessage(Localize("INSTALLER_INSTANCE_RUNNING"), MessageIcon::Warning);
         return -1;
     }
     ui.StartGraphics();

@@ -10,26 +10,13 @@
 #include "ui/message_box.h"
 #include "uninstall/uninstaller.h"
 
-namespace {
-
-// The boxes of these checks appear before the window exists.
-void ShowCheckBox(const std::wstring& text, MessageIcon icon) {
-    MessageBoxRequest request;
-    request.text = text;
-    request.caption = GetWindowTitle();
-    request.icon = icon;
-    ShowMessageBox(request);
-}
-
-}  // namespace
-
 bool Updater::CheckOperatingSystem() {
     SystemMachineFacts facts;
     osInfo.osName = facts.OsName();
     osInfo.detected = true;
     if (IsSupportedOs(osInfo.osName, configuration.GetSupportedOsNames())) return true;
     LOG(Error) << "This OS is not supported.";
-    ShowCheckBox(Localize("INSTALLER_UNSUPPORTED_OS"), MessageIcon::Error);
+    ShowTitledMessage(Localize("INSTALLER_UNSUPPORTED_OS"), MessageIcon::Error);
     return false;
 }
 
@@ -38,8 +25,8 @@ bool Updater::CheckDirectX() {
     RegistryManager(RegistryHive::LocalMachine, "SOFTWARE\\Microsoft\\DirectX\\").ReadString("Version", installed);
     if (IsDirectXSufficient(installed, configuration.GetRequiredDirectXVersion())) return true;
     LOG(Error) << "DirectX version not supported: " << installed;
-    ShowCheckBox(Localize("INSTALLER_WRONG_DIRECTXVERSION") + L"\n" + Localize("INSTALLER_UPDATE_DIRECTXVERSION"),
-                 MessageIcon::Error);
+    ShowTitledMessage(Localize("INSTALLER_WRONG_DIRECTXVERSION") + L"\n" + Localize("INSTALLER_UPDATE_DIRECTXVERSION"),
+                      MessageIcon::Error);
     return false;
 }
 
@@ -75,17 +62,17 @@ bool Updater::EnsureRights(bool internallyElevated, int32_t& exitCode, bool need
             return false;
         }
         case RightsOutcome::NoRightsForRemoval:
-            ShowCheckBox(
+            ShowTitledMessage(
                 Localize("INSTALLER_POWERUSER_NOT_ENOUGH") + L"\n" + Localize("INSTALLER_LOG_ON_AS_ADMINISTRATOR"),
                 MessageIcon::Warning);
             return false;
         case RightsOutcome::NoRights:
-            ShowCheckBox(IsVistaOrWindows7(facts.OsName())
-                             ? Localize("INSTALLER_UAC_IS_OFF") + L"\n" + Localize("INSTALLER_UAC_TURN_ON") + L"\n" +
-                                   Localize("INSTALLER_LOG_ON_AS_ADMINISTRATOR")
-                             : Localize("INSTALLER_POWERUSER_NOT_ENOUGH") + L"\n" +
-                                   Localize("INSTALLER_LOG_ON_AS_ADMINISTRATOR"),
-                         MessageIcon::Warning);
+            ShowTitledMessage(IsVistaOrWindows7(facts.OsName())
+                                  ? Localize("INSTALLER_UAC_IS_OFF") + L"\n" + Localize("INSTALLER_UAC_TURN_ON") +
+                                        L"\n" + Localize("INSTALLER_LOG_ON_AS_ADMINISTRATOR")
+                                  : Localize("INSTALLER_POWERUSER_NOT_ENOUGH") + L"\n" +
+                                        Localize("INSTALLER_LOG_ON_AS_ADMINISTRATOR"),
+                              MessageIcon::Warning);
             return false;
     }
     return false;

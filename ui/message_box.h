@@ -20,3 +20,7 @@ struct MessageBoxRequest {
 };
 
 MessageAnswer ShowMessageBox(const MessageBoxRequest& request);
+
+// A box with OK under the program's title, for what must be said while no
+// window exists (before it is made, or after it is gone).
+void ShowTitledMessage(const std::wstring& text, MessageIcon icon);
