@@ -53,22 +53,6 @@ if [ -f "$wintool" ]; then
   wine_json=$work/wine.json
 fi
 
-python3 - "$size_mib" "$work/native.json" "$wine_json" <<'PY'
-import json, sys
-size_mib = int(sys.argv[1])
-def medians(path):
-    return {r["command"]: r["median"] for r in json.load(open(path))["results"]}
-native = medians(sys.argv[2])
-def line(name, seconds):
-    print(f"{name:<22} median {seconds:7.3f} s  {size_mib / seconds:8.1f} MiB/s")
-print(f"download of {size_mib} MiB from a loopback nginx")
-line("curl -o", native["curl"])
-line("ironvale (libcurl)", native["ironvale"])
-print(f"ratio ironvale/curl throughput: {native['curl'] / native['ironvale']:.2f}x (target >= 0.90x)")
-if sys.argv[3]:
-    wine = medians(sys.argv[3])
-    line("ironvale (WinINet/Wine)", wine["wininet"])
-    print(f"ratio WinINet under Wine/curl throughput: {native['curl'] / wine['wininet']:.2f}x")
-else:
-    print("WinINet under Wine: not measured (build the windows preset first)")
-PY
+python3 "$root/bench/support/throughput.py" "$size_mib" "download of $size_mib MiB from a loopback nginx" \
+  "$work/native.json" "curl=curl -o" "ironvale=ironvale (libcurl)" \
+  "$wine_json" "wininet=ironvale (WinINet, Wine)" 0.90x

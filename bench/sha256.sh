@@ -58,22 +58,6 @@ if [ -f "$wintool" ]; then
   wine_json=$work/wine.json
 fi
 
-python3 - "$size_mib" "$work/native.json" "$wine_json" <<'PY'
-import json, sys
-size_mib = int(sys.argv[1])
-def medians(path):
-    return {r["command"]: r["median"] for r in json.load(open(path))["results"]}
-native = medians(sys.argv[2])
-def line(name, seconds):
-    print(f"{name:<28} median {seconds:7.3f} s  {size_mib / seconds:8.1f} MiB/s")
-print(f"SHA-256 of a {size_mib} MiB patch archive")
-line("sha256sum", native["sha256sum"])
-line("ironvale check (OpenSSL)", native["ironvale"])
-print(f"ratio ironvale/sha256sum throughput: {native['sha256sum'] / native['ironvale']:.2f}x")
-if sys.argv[3]:
-    wine = medians(sys.argv[3])
-    line("ironvale check (CNG, Wine)", wine["cng"])
-    print(f"ratio CNG under Wine/sha256sum throughput: {native['sha256sum'] / wine['cng']:.2f}x")
-else:
-    print("CNG under Wine: not measured (build the windows preset first)")
-PY
+python3 "$root/bench/support/throughput.py" "$size_mib" "SHA-256 of a $size_mib MiB patch archive" \
+  "$work/native.json" "sha256sum=sha256sum" "ironvale=ironvale check (OpenSSL)" \
+  "$wine_json" "cng=ironvale check (CNG, Wine)"
