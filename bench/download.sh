@@ -18,17 +18,8 @@ for needed in nginx curl hyperfine python3; do
 done
 [ -x "$tool" ] || { echo "download bench: $tool not built" >&2; exit 2; }
 
-# Memory-backed scratch space when there is some, so the disk does not
-# decide the result.
-scratch_parent=${TMPDIR:-/tmp}
-[ -d /dev/shm ] && [ -w /dev/shm ] && scratch_parent=/dev/shm
-work=$(mktemp -d "$scratch_parent/ivl-bench-download.XXXXXX")
-nginx_pid=
-cleanup() {
-  [ -n "$nginx_pid" ] && kill "$nginx_pid" 2>/dev/null && wait "$nginx_pid" 2>/dev/null
-  rm -rf "$work"
-}
-trap cleanup EXIT
+source "$root/bench/support/scratch.sh"
+make_scratch download
 
 mkdir -p "$work/www" "$work/out"
 head -c $((size_mib * 1024 * 1024)) /dev/urandom >"$work/www/big.bin"

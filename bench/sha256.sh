@@ -19,12 +19,8 @@ for needed in sha256sum hyperfine python3; do
 done
 [ -x "$tool" ] || { echo "sha256 bench: $tool not built" >&2; exit 2; }
 
-# Memory-backed scratch space when there is some, so the disk does not
-# decide the result.
-scratch_parent=${TMPDIR:-/tmp}
-[ -d /dev/shm ] && [ -w /dev/shm ] && scratch_parent=/dev/shm
-work=$(mktemp -d "$scratch_parent/ivl-bench-sha256.XXXXXX")
-trap 'rm -rf "$work"' EXIT
+source "$root/bench/support/scratch.sh"
+make_scratch sha256
 
 # A patch of one archive, its description declaring what sha256sum says.
 mkdir -p "$work/patch"

@@ -27,17 +27,9 @@ for needed in nginx curl python3 xdelta3; do
   command -v "$needed" >/dev/null || { echo "update bench: $needed is missing" >&2; exit 2; }
 done
 
-# Memory-backed scratch space when there is some, so the disk does not
-# decide the result (the installation is copied afresh for every run).
-scratch_parent=${TMPDIR:-/tmp}
-[ -d /dev/shm ] && [ -w /dev/shm ] && scratch_parent=/dev/shm
-work=$(mktemp -d "$scratch_parent/ivl-bench-update.XXXXXX")
-nginx_pid=
-cleanup() {
-  [ -n "$nginx_pid" ] && kill "$nginx_pid" 2>/dev/null && wait "$nginx_pid" 2>/dev/null
-  rm -rf "$work"
-}
-trap cleanup EXIT
+# The installation is copied afresh for every run.
+source "$root/bench/support/scratch.sh"
+make_scratch update
 cd "$work"
 
 echo "making the installation, the new version and the patch ($size_mib MiB in $files files)"
