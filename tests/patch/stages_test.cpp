@@ -85,6 +85,26 @@ TEST(Resume, TheRecordedActionIsKnownByOrdinalAndPath) {
     EXPECT_EQ(ReadTree(batch.Installation()), kTarget);
 }
 
+// An action whose record cannot be written is not carried out: the run ends
+// where a crash after the action before it would have left the installation.
+TEST(Resume, NoActionRunsWithoutItsRecord) {
+    Tree trees[2];
+    for (const bool unwritable : {false, true}) {
+        TestBatch batch(kInstalled, kTarget);
+        BatchRun run(batch);
+        run.Prepare();
+        int actions = 6;
+        run.onReport = [&](const std::string&) {
+            if (--actions == 0 && !unwritable) throw std::runtime_error("interrupted");
+            if (actions == 0) MakeDirectories(PathJoin(batch.Root(), "_PPF.xml"));  // no record can be written
+        };
+        EXPECT_ANY_THROW(run.Apply());
+        trees[unwritable] = ReadTree(batch.Installation());
+    }
+    EXPECT_EQ(trees[1], trees[0]);
+    EXPECT_FALSE(trees[1] == kInstalled);
+}
+
 // Stage two in a process of its own, run whole once, then killed at seeded
 // moments (SIGKILL natively, TerminateProcess under Wine): the next start
 // finishes it to exactly the target, or it had not begun and nothing changed.
