@@ -2,6 +2,8 @@
 
 #include <memory>
 
+#include "app/failure_report.h"
+#include "app/language.h"
 #include "app/single_instance.h"
 #include "app/updater.h"
 #include "app/updater_arguments.h"
@@ -18,26 +20,9 @@ const char* const kLogFileName = "IronvaleUpdater.log";
 namespace {
 
 void ReportEscapedException(const Exception& error) {
-    std::wstring text;
-    switch (error.Code()) {
-        case ErrorCode::CorruptData:
-            LOG_AS("Main", Error) << "Corrupt data.";
-            text = Localize("INSTALLER_ERROR_CORRUPT_DATA") + L"\n\n" + Localize("INSTALLER_ERROR_REINSTALL");
-            break;
-        case ErrorCode::CorruptInstallation:
-            LOG_AS("Main", Error) << "Corrupt installation.";
-            text = Localize("INSTALLER_GAME_IS_NOT_INSTALLED");
-            break;
-        case ErrorCode::SteamIncompatible:
-            LOG_AS("Main", Error) << "Incompatible with Steam version.";
-            text = Localize("INSTALLER_INCOMPATIBLE_WITH_STEAM");
-            break;
-        default:
-            LOG_AS("Main", Error) << "Unknown exception type caught:" << error.message;
-            text = Localize("INSTALLER_ERROR_OCCURRED") + L"\n" + error.wideMessage;
-            break;
-    }
-    ShowTitledMessage(text, MessageIcon::Error);
+    const FailureReport report = DescribeFailure(error, FailureSite::EntryPoint);
+    LogEntry(report.level, "Main", __LINE__).Stream() << report.logLine;
+    ShowTitledMessage(report.text, MessageIcon::Error);
 }
 
 }  // namespace
@@ -63,8 +48,7 @@ int32_t RunUpdaterProcess(const std::string& commandLine, const std::string& upd
         configuration.SetDefaults();
         RegistryManager registry;
         registry.Locate(configuration.GetRegistryKey(), arguments->sid);
-        const std::string language = registry.GetLanguage();
-        if (!language.empty()) Localization::SetLanguage(language);
+        SelectStoredLanguage(registry.GetLanguage());
     }
     LOG_AS("Main", Info) << arguments->Describe();
 

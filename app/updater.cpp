@@ -1,8 +1,9 @@
 #include "app/updater.h"
 
+#include "app/failure_report.h"
+#include "app/language.h"
 #include "app/overall_progress.h"
 #include "app/publisher_key.h"
-#include "app/temporary_files.h"
 #include "base/encoding.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
@@ -20,7 +21,6 @@ const char* const kLogSource = "Updater";
 }  // namespace
 
 Updater::Updater(const std::string& updateLocation) : publisherKey(BuiltInPublisherKey()) {
-    applier.SetRetryQuestion(&retryBox);
     configuration.SetDefaults(updateLocation);
 }
 
@@ -34,21 +34,19 @@ int32_t Updater::Run(const UpdaterArguments& args) {
     return RunUpdateMode();
 }
 
-// The player chooses a language once; it is kept in the game's key.
+// The entry point selected a stored language; without one the player
+// chooses, once, and the choice is kept in the game's key.
 bool Updater::SelectLanguage() {
-    std::string name = registry.GetLanguage();
-    if (name.empty()) {
-        LanguageDialog dialog;
-        if (!dialog.Run(name)) return false;
-        if (!name.empty()) {
-            try {
-                registry.SetLanguage(name);
-            } catch (const Exception& error) {
-                LOG_AS(kLogSource, Error) << error.message;
-            }
-        }
+    if (!registry.GetLanguage().empty()) return true;
+    std::string name;
+    if (!LanguageDialog().Run(name)) return false;
+    if (name.empty()) return true;
+    try {
+        registry.SetLanguage(name);
+    } catch (const Exception& error) {
+        LOG_AS(kLogSource, Error) << error.message;
     }
-    if (!name.empty()) Localization::SetLanguage(name.substr(0, name.find(' ')));
+    SelectStoredLanguage(name);
     return true;
 }
 
@@ -82,63 +80,36 @@ int32_t Updater::RunUpdateMode() {
     downloader.RequestStop();
     if (!updateOk) {
         gui.Stop();
-        if (playOld && !cancelled && !configuration.GetGameExecutable().empty()) StartGame();
+        if (playOld && !quitRequested.IsCancelled() && !configuration.GetGameExecutable().empty()) StartGame();
         return 1;
     }
 
-    installationData.Save();
     bool startGame = true;
-    if (didWork && !cancelled) {
+    if (didWork && !quitRequested.IsCancelled()) {
         startGame = gui.AskYesNo(Localize("INSTALLER_SUCCESS_PATCH") + L"\n\n" + Localize("INSTALLER_START_GAME"));
     }
     gui.WaitWhileConfirming();
     gui.Stop();
-    if (startGame && !cancelled && !configuration.GetGameExecutable().empty()) StartGame();
+    if (startGame && !quitRequested.IsCancelled() && !configuration.GetGameExecutable().empty()) StartGame();
     return 1;
 }
 
 bool Updater::HandleUpdateFailure(const Exception& error) {
-    const auto question = [](const char* what) {
-        return Localize(what) + L"\n\n" + Localize("INSTALLER_ERROR_CONNECTION") + L"\n\n" +
-               Localize("INSTALLER_ERROR_PLAY_OLD_VERSION");
-    };
-    // Whatever ended the run, what it downloaded and prepared goes, so the
-    // installation is left as it was found (an archive may be gigabytes);
-    // an interrupted stage two keeps its files for the next start.
     downloader.RequestStop();
-    downloader.WaitForWorker();
-    if (installationData.currentVersion != "-1") {
-        if (!patchInfoPath.empty()) RemoveFile(patchInfoPath);
-        CleanTemporaryFiles(patchDir, patchedDir);
-    }
-    switch (error.Code()) {
-        case ErrorCode::UserCancelled:
-            LOG_AS(kLogSource, Info) << "User cancelled:" << error.message;
-            cancelled = true;
+    const FailureReport report = DescribeFailure(error, FailureSite::UpdateRun);
+    LogEntry(report.level, kLogSource, __LINE__).Stream() << report.logLine;
+    switch (report.notice) {
+        case FailureNotice::None:
+            // Whatever the player declined or cancelled, nothing more runs.
+            quitRequested.Cancel();
             return false;
-        case ErrorCode::PatchNotFound:
-            LOG_AS(kLogSource, Error) << "Patch not found.";
-            return gui.AskYesNo(question("INSTALLER_ERROR_NO_PATCH_FOUND"));
-        case ErrorCode::FileNotFound:
-            LOG_AS(kLogSource, Error) << "File not found.";
-            return gui.AskYesNo(question("INSTALLER_ERROR_FILE_NOT_FOUND"));
-        case ErrorCode::CorruptData:
-            LOG_AS(kLogSource, Error) << "Corrupt data.";
-            gui.ShowError(Localize("INSTALLER_ERROR_CORRUPT_DATA") + L"\n\n" + Localize("INSTALLER_ERROR_REINSTALL"));
-            return false;
-        case ErrorCode::CorruptInstallation:
-            LOG_AS(kLogSource, Error) << "Corrupt installation.";
-            gui.ShowError(Localize("INSTALLER_GAME_IS_NOT_INSTALLED"));
-            return false;
-        case ErrorCode::SteamIncompatible:
-            LOG_AS(kLogSource, Error) << "Incompatible with Steam version.";
-            gui.ShowError(Localize("INSTALLER_INCOMPATIBLE_WITH_STEAM"));
-            return false;
-        default:
-            LOG_AS(kLogSource, Fatal) << "Unknown exception type caught:" << error.message;
-            gui.ShowError(Localize("INSTALLER_ERROR_OCCURRED") + L"\n" + error.wideMessage);
+        case FailureNotice::PlayOldQuestion:
+            return gui.AskYesNo(report.text);
+        case FailureNotice::ErrorBox:
+            gui.ShowError(report.text);
             return false;
     }
+    return false;
 }
 
 void Updater::StartGame() {
@@ -160,7 +131,7 @@ void Updater::OnFileProgress(const std::string&, uint32_t bytesDone, uint32_t by
 void Updater::OnFileDone(const std::string&) { ++doneFiles; }
 
 void Updater::Cancel() {
-    cancelled = true;
-    applier.RequestCancel();
+    quitRequested.Cancel();
+    // Wakes a stage waiting for an archive at once.
     downloader.RequestStop();
 }

@@ -2,18 +2,14 @@
 
 #include <atomic>
 #include <cstdint>
-#include <list>
-#include <optional>
 #include <string>
 
+#include "app/update_plan.h"
 #include "app/updater_arguments.h"
+#include "base/cancellation.h"
 #include "base/status_interfaces.h"
-#include "net/download_entry.h"
 #include "net/http_downloader.h"
-#include "patch/patch_applier.h"
-#include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
-#include "patch/patch_stages.h"
 #include "state/configuration.h"
 #include "state/installation_data.h"
 #include "state/registry_manager.h"
@@ -22,11 +18,14 @@
 #include "ui/move_retry_box.h"
 
 class Exception;
+class PatchInfoFile;
 
 // The one object that carries a run: it owns every long-lived component
 // and carries out the mode the command line selects. It turns the workers'
 // reports into the window's status line and progress bar, and the window's
-// confirmed cancel into stop flags for the workers.
+// confirmed cancel into the run's one cancellation token. What one patch
+// or build needs travels as a PatchBatch from the run's plan; nothing of
+// it is kept here.
 class Updater : public IStatusView, public ICancelable {
 public:
     // updateLocation: where the publisher serves the patches (empty: beside
@@ -45,60 +44,77 @@ public:
     void Cancel() override;
 
 private:
+    // The modes (updater_modes.cpp, updater.cpp).
     int32_t RunComponentRemoval(const UpdaterArguments& args);
     int32_t RunSettingsRemoval();
     int32_t RunUninstallCleanup();
     int32_t RunUpdateMode();
+    // Shows what went wrong; true when the player chose to play the
+    // installed version.
+    bool HandleUpdateFailure(const Exception& error);
+    void StartGame();
+
+    // The checks before an update (updater_checks.cpp).
+    bool SelectLanguage();
     bool CheckOperatingSystem();
     bool CheckDirectX();
     bool EnsureRights(bool internallyElevated, int32_t& exitCode, bool needRights);
     bool UninstallNeedsAdministrator();
-    bool SelectLanguage();
-    // Shows what went wrong and cleans up; true when the player chose to
-    // play the installed version.
-    bool HandleUpdateFailure(const Exception& error);
 
+    // The update flow: what the installation is, the plan, and its roads
+    // (updater_flow.cpp).
     void RunUpdate();
-    bool InstallationNeedsUninstall();
-    void CheckLatestVersion(bool installed);
-    void DownloadPatchInfo(const std::string& location, const std::string& folder);
+    UpdateFacts ReadFacts();
+    void ConfirmPatch(const std::string& installedVersion, const std::string& latestVersion);
+    void InstallPatch(const UpdatePlan& plan);
+    // Asks whether to take the complete build instead of a patch that does
+    // not fit the installation; throws unless the player says Yes. Returns
+    // where the build's description was fetched (loaded into description).
+    std::string OfferCompleteBuild(const PatchBatch& build, PatchInfoFile& description, const Exception& failure);
+
+    // The version and the descriptions (updater_version_check.cpp).
+    std::string CheckLatestVersion();
+    // Fetches the batch's description into folder, checks it and loads it
+    // into description; returns its path. Nothing is left on a failure.
+    std::string FetchDescription(const PatchBatch& batch, const std::string& folder, PatchInfoFile& description);
+    // The build's description, fetched into the temporary folder before
+    // the work folders exist; a missing one is BuildNotFound.
+    std::string FetchBuildDescription(const PatchBatch& build, PatchInfoFile& description);
     // Through the run's downloader; false when the file did not arrive.
     bool FetchOne(const DownloadEntry& entry);
-    void CheckDescriptionSignature(const std::string& location);
-    void CheckDescriptionContent();
-    void FetchBuildDescription();
-    void PrepareReinstall();
-    // Asks whether to take the complete build instead of a patch that does
-    // not fit the installation; throws unless the player says Yes.
-    void OfferCompleteBuild(const Exception& failure);
-    void RunStageOne(bool installed);
-    void StageOne(bool installed);
-    void StageTwo(bool installed);
-    bool CheckDiskSpace(const std::string& folder, const std::wstring& message, bool quiet);
-    std::list<DownloadEntry> BuildDownloadList();
-    PatchBatch CurrentBatch() const;
-    void WriteUninstallRecord(bool installed);
-    void StartGame();
+    void CheckDescriptionSignature(const std::string& location, const std::string& path);
+    void CheckDescriptionContent(const PatchBatch& batch, PatchInfoFile& description);
+
+    // One batch's two stages (updater_stages.cpp).
+    // Runs both stages of batch. description is loaded from fetchedPath (in
+    // the temporary folder) when that is given, else fetched into the
+    // batch's work folder.
+    void InstallBatch(const PatchBatch& batch, PatchInfoFile& description, const std::string& fetchedPath);
+    void ResumeBatch(const PatchBatch& batch, const ResumePoint& resumeAt);
+    void StageOne(PatchStages& stages, const PatchBatch& batch, PatchInfoFile& description);
+    void StageTwo(PatchStages& stages, const std::optional<ResumePoint>& resumeAt);
+    // Stops the downloads and, unless the installation is in change (an
+    // interrupted stage two keeps its files for the next start), removes
+    // what the batch downloaded and prepared: an archive may be gigabytes.
+    void AbandonBatch(const PatchBatch& batch);
+    bool CheckDiskSpace(const std::string& folder, int64_t required, const std::wstring& message, bool quiet);
+    std::list<DownloadEntry> BuildDownloadList(const PatchBatch& batch, PatchInfoFile& description);
+    StageServices Services();
 
     Configuration configuration;
     RegistryManager registry;
     GuiManager gui;
-    std::string latestVersion;
     std::string installDir;
     InstallationData installationData;
     PatchProgressFile progressFile;
-    std::string patchDir;
-    std::string patchedDir;
-    std::string patchInfoPath;
-    std::string patchUrl;
-    PatchInfoFile patchInfo;
-    PatchApplier applier;
-    HttpDownloader downloader;
+    // The player's cancel, read by every worker; set by Cancel and kept for
+    // the rest of the run.
+    CancellationToken quitRequested;
+    HttpDownloader downloader{&quitRequested};
     OsInfo osInfo;
     int32_t totalFiles = 0;
     std::atomic<int32_t> doneFiles{0};
     bool didWork = false;
-    std::atomic<bool> cancelled{false};
     bool firstVersionCheck = true;
     std::string registryKeyPath;
     std::string productGuid;
@@ -107,10 +123,6 @@ private:
     UpdaterArguments arguments;
     // PEM; empty when descriptions need no signature.
     const std::string publisherKey;
-
-    // The two stages of the batch of the current pass (a new one each pass,
-    // so a resumed batch does not count as prepared).
-    std::optional<PatchStages> stages;
     // Asks the player to close files in the way of a move.
     MoveRetryBox retryBox;
 };

@@ -1,5 +1,6 @@
 // The checks before an update: operating system, Steam edition, rights
 // (with the elevated copy of this program) and DirectX.
+#include "app/update_plan.h"
 #include "app/updater.h"
 #include "base/exception.h"
 #include "base/log.h"
@@ -50,7 +51,12 @@ bool Updater::EnsureRights(bool internallyElevated, int32_t& exitCode, bool need
     SystemMachineFacts facts;
     const AdminRights rights = CheckAdminRights(facts);
     const bool found = registry.HasInstallDir();
-    const bool needsUninstall = found && InstallationNeedsUninstall();
+    bool needsUninstall = false;
+    if (found) {
+        InstallationData installed;
+        installed.Load(registry.GetInstallDir());
+        needsUninstall = InstallationNeedsUninstall(installed.patcherVersion);
+    }
     switch (DecideRights(rights, found, needsUninstall, needsUninstall && UninstallNeedsAdministrator(), needRights)) {
         case RightsOutcome::Granted:
             return true;

@@ -1,182 +1,118 @@
-// The update flow: which version is installed and which is the latest,
-// and which of three roads leads from one to the other (resume an
-// interrupted patch, patch, or reinstall the complete build), with the
-// complete build offered when the patch does not fit the installation.
+// The update flow: what the installation is, the plan that decides the
+// road (resume an interrupted patch, patch, reinstall the complete build,
+// or nothing), and carrying it out, with the complete build offered when
+// the patch does not fit the installation.
 #include <cstdint>
-#include <sstream>
 
 #include "app/temporary_files.h"
-#include "app/update_history.h"
 #include "app/updater.h"
-#include "app/version_text.h"
 #include "base/atomic_file.h"
 #include "base/encoding.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/log.h"
 #include "base/paths.h"
-#include "net/location.h"
+#include "patch/patch_info_file.h"
 #include "text/localization.h"
 #include "uninstall/uninstaller.h"
 
 void Updater::RunUpdate() {
     didWork = false;
-    bool reinstall = false;
     for (;;) {
-        patchInfoPath.clear();
-        patchUrl.clear();
-        bool resuming = false;
-        stages.emplace(patchInfo, progressFile, applier);
-
-        // This updater never installs into an empty place.
-        const bool installed = registry.HasInstallDir();
-        if (!installed) throw Exception("Corrupt installation.", ErrorCode::CorruptInstallation);
-        if (!arguments.latestVersion.empty()) {
-            latestVersion = arguments.latestVersion;
-        } else {
-            CheckLatestVersion(installed);
-        }
-        gui.SetStatusText(Localize("INSTALLER_CHECKING_INSTALLATION"));
-        installDir = registry.GetInstallDir();
-        try {
-            installationData.Load(installDir);
-        } catch (const Exception&) {
-            throw Exception("Corrupt installation.", ErrorCode::CorruptData);
-        }
-        if (InstallationNeedsUninstall()) throw Exception("Corrupt installation.", ErrorCode::CorruptData);
-
-        if (!reinstall) {
-            const std::string localVersion = installationData.currentVersion;
-            progressFile.SetDirectory(installDir);
-            switch (FindInterruptedBatch(localVersion, progressFile)) {
-                case InterruptedBatch::Resume:
-                    resuming = true;
-                    patchDir = progressFile.GetPatchPath();
-                    patchedDir = progressFile.GetPatchedFilesPath();
-                    patchUrl = progressFile.GetPatchUri();
-                    latestVersion = progressFile.GetVersion();
-                    gui.SetStatusText(Localize("INSTALLER_PATCHING_AND_DOWNLOADING_STATUS"));
-                    break;
-                case InterruptedBatch::Reinstall:
-                    reinstall = true;
-                    break;
-                case InterruptedBatch::None: {
-                    // Work folders of a run that ended before its stage two
-                    // began, or after it was done, hold nothing to resume.
-                    const std::string work = PathJoin(installDir, configuration.GetPatchInstallPath());
-                    CleanTemporaryFiles(work, PathJoin(work, configuration.GetPatchedFilesPath()));
-                    for (const char* record : {kInstallationDataFileName, kUninstallRecordName}) {
-                        RemoveLeftoverReplacement(PathJoin(installDir, record));
-                    }
-                    if (localVersion.empty()) {
-                        throw Exception("Could not establish local version.", ErrorCode::NoLocalVersion);
-                    }
-                    if (!IsOlderVersion(localVersion, latestVersion)) return;
-                    patchUrl = JoinLocation(configuration.GetPatchUrl(), PatchName(kPatchBaseVersion, latestVersion));
-                    gui.WaitWhileConfirming();
-                    if (gui.IsCancelled()) throw Exception("User declined update.", ErrorCode::UserCancelled);
-                    const std::wstring text =
-                        Localize("INSTALLER_PATCH_CURRENT_VERSION") + L" " + WidenFromCodePage(localVersion) + L"\n" +
-                        Localize("INSTALLER_PATCH_LATEST_VERSION") + L" " + WidenFromCodePage(latestVersion) + L"\n\n" +
-                        Localize("INSTALLER_PATCH_NEED_LATEST_VERSION") + L"\n" +
-                        Localize("INSTALLER_PATCH_CONFIRM_UPADATE") + L"\n";
-                    if (!gui.AskYesNo(text)) throw Exception("User declined update.", ErrorCode::UserCancelled);
-                    int32_t exitCode = -1;
-                    if (!EnsureRights(false, exitCode, true)) {
-                        throw Exception("User is not Administrator.", ErrorCode::UserCancelled);
-                    }
-                    patchDir = PathJoin(installDir, configuration.GetPatchInstallPath());
-                    patchedDir = PathJoin(patchDir, configuration.GetPatchedFilesPath());
-                    gui.SetStatusText(Localize("INSTALLER_PATCHING_AND_DOWNLOADING_STATUS"));
-                    break;
-                }
+        const UpdateFacts facts = ReadFacts();
+        const UpdateLayout layout = MakeUpdateLayout(configuration, installDir);
+        const UpdatePlan plan = PlanUpdate(facts, layout);
+        if (plan.road != Road::Resume) {
+            // Work folders of a run that ended before its stage two began,
+            // or after it was done, hold nothing to resume; nor do the
+            // records' half-written replacements.
+            CleanTemporaryFiles(layout.patchFolder, layout.patchedFilesFolder);
+            for (const char* record : {kInstallationDataFileName, kUninstallRecordName}) {
+                RemoveLeftoverReplacement(PathJoin(installDir, record));
             }
         }
-        if (reinstall && !resuming) {
-            gui.SetStatusText(Localize("INSTALLER_REINSTALLING_STATUS"));
-            FetchBuildDescription();
-            PrepareReinstall();
-        }
-
-        LOG_AS("Updater", Info) << "Patch URL:" << patchUrl;
-        if (resuming) {
-            patchInfoPath = PathJoin(patchDir, configuration.GetPatchInfoFilename());
-            patchInfo.Load(patchInfoPath);
-            StageTwo(installed);
-        } else {
-            try {
-                RunStageOne(installed);
-            } catch (const Exception& error) {
-                if (reinstall || error.Code() != ErrorCode::DeltaFailed) throw;
-                OfferCompleteBuild(error);
-                reinstall = true;
-                PrepareReinstall();
-                stages.emplace(patchInfo, progressFile, applier);
-                LOG_AS("Updater", Info) << "Patch URL:" << patchUrl;
-                RunStageOne(installed);
+        switch (plan.road) {
+            case Road::UpToDate:
+                return;
+            case Road::Resume:
+                gui.SetStatusText(Localize("INSTALLER_PATCHING_AND_DOWNLOADING_STATUS"));
+                ResumeBatch(plan.batch, plan.resumeAt);
+                break;
+            case Road::Patch:
+                ConfirmPatch(facts.installedVersion, facts.latestVersion);
+                gui.SetStatusText(Localize("INSTALLER_PATCHING_AND_DOWNLOADING_STATUS"));
+                InstallPatch(plan);
+                break;
+            case Road::Reinstall: {
+                gui.SetStatusText(Localize("INSTALLER_REINSTALLING_STATUS"));
+                PatchInfoFile description;
+                const std::string fetched = FetchBuildDescription(plan.batch, description);
+                // The build replaces every file, so no record of an earlier
+                // batch may be resumed over it.
+                RemoveFile(progressFile.GetRecordPath());
+                RemoveFile(progressFile.GetAlternativeRecordPath());
+                InstallBatch(plan.batch, description, fetched);
+                break;
             }
-            // A cancel confirmed while stage one finished must not let
-            // stage two begin.
-            if (cancelled)
-                throw Exception("User cancelled before the installation was changed.", ErrorCode::UserCancelled);
-            StageTwo(installed);
         }
-        AppendUpdateHistory(installDir, patchUrl);
         didWork = true;
         // A resumed patch may not have reached the newest version.
-        if (!resuming) return;
+        if (plan.road != Road::Resume) return;
     }
 }
 
-void Updater::FetchBuildDescription() {
-    patchUrl = JoinLocation(configuration.GetCompleteInstallUrl(), BuildName(latestVersion));
+UpdateFacts Updater::ReadFacts() {
+    // This updater never installs into an empty place.
+    if (!registry.HasInstallDir()) throw Exception("Corrupt installation.", ErrorCode::CorruptInstallation);
+    UpdateFacts facts;
+    facts.latestVersion = arguments.latestVersion.empty() ? CheckLatestVersion() : arguments.latestVersion;
+    gui.SetStatusText(Localize("INSTALLER_CHECKING_INSTALLATION"));
+    installDir = registry.GetInstallDir();
     try {
-        DownloadPatchInfo(patchUrl, "");
-    } catch (const Exception& error) {
-        if (error.Code() == ErrorCode::PatchNotFound)
-            throw Exception("Could not find build.", ErrorCode::BuildNotFound);
-        throw;
+        installationData.Load(installDir);
+    } catch (const Exception&) {
+        throw Exception("Corrupt installation.", ErrorCode::CorruptData);
     }
-}
-
-// The build replaces every file, so no record of an earlier batch may be
-// resumed over it.
-void Updater::PrepareReinstall() {
-    patchDir = PathJoin(installDir, configuration.GetPatchInstallPath());
-    patchedDir = PathJoin(patchDir, configuration.GetPatchedFilesPath());
+    facts.installedVersion = installationData.currentVersion;
+    facts.patcherVersion = installationData.patcherVersion;
     progressFile.SetDirectory(installDir);
-    RemoveFile(progressFile.GetRecordPath());
-    RemoveFile(progressFile.GetAlternativeRecordPath());
-    installationData.SetDirectory(installDir);
+    facts.interrupted = FindInterruptedBatch(facts.installedVersion, progressFile);
+    return facts;
 }
 
-void Updater::RunStageOne(bool installed) {
-    CleanTemporaryFiles(patchDir, patchedDir);
-    MakeDirectories(patchDir);
-    MakeDirectories(patchedDir);
-    if (patchInfoPath.empty()) {
-        DownloadPatchInfo(patchUrl, patchDir);
-    } else {
-        // The reinstall road fetched the description into the temporary
-        // folder, before the work folders existed.
-        const std::string moved = PathJoin(patchDir, configuration.GetPatchInfoFilename());
-        MoveFileReplacing(patchInfoPath, moved);
-        patchInfoPath = moved;
+void Updater::ConfirmPatch(const std::string& installedVersion, const std::string& latestVersion) {
+    gui.WaitWhileConfirming();
+    if (quitRequested.IsCancelled()) throw Exception("User declined update.", ErrorCode::UserCancelled);
+    const std::wstring text =
+        Localize("INSTALLER_PATCH_CURRENT_VERSION") + L" " + WidenFromCodePage(installedVersion) + L"\n" +
+        Localize("INSTALLER_PATCH_LATEST_VERSION") + L" " + WidenFromCodePage(latestVersion) + L"\n\n" +
+        Localize("INSTALLER_PATCH_NEED_LATEST_VERSION") + L"\n" + Localize("INSTALLER_PATCH_CONFIRM_UPADATE") + L"\n";
+    if (!gui.AskYesNo(text)) throw Exception("User declined update.", ErrorCode::UserCancelled);
+    int32_t exitCode = -1;
+    if (!EnsureRights(false, exitCode, true)) throw Exception("User is not Administrator.", ErrorCode::UserCancelled);
+}
+
+void Updater::InstallPatch(const UpdatePlan& plan) {
+    try {
+        PatchInfoFile description;
+        InstallBatch(plan.batch, description, "");
+    } catch (const Exception& error) {
+        if (error.Code() != ErrorCode::DeltaFailed) throw;
+        PatchInfoFile description;
+        const std::string fetched = OfferCompleteBuild(plan.completeBuild, description, error);
+        InstallBatch(plan.completeBuild, description, fetched);
     }
-    StageOne(installed);
 }
 
 // Stage one stopped at an installed file that no longer fits its delta (the
 // player or a tool changed it). Nothing is installed yet, and the complete
 // build still leads to the latest version without the player having to
 // reinstall by hand.
-void Updater::OfferCompleteBuild(const Exception& failure) {
+std::string Updater::OfferCompleteBuild(const PatchBatch& build, PatchInfoFile& description, const Exception& failure) {
     LOG_AS("Updater", Error) << failure.message;
-    downloader.RequestStop();
-    downloader.WaitForWorker();
-    CleanTemporaryFiles(patchDir, patchedDir);
+    std::string fetched;
     try {
-        FetchBuildDescription();
+        fetched = FetchBuildDescription(build, description);
     } catch (const Exception& error) {
         // Without a complete build there is nothing to offer.
         if (error.Code() == ErrorCode::BuildNotFound) throw failure;
@@ -184,7 +120,7 @@ void Updater::OfferCompleteBuild(const Exception& failure) {
     }
     // An unsigned description may declare any sizes: the sum saturates.
     int64_t size = 0;
-    for (const auto& archive : patchInfo.GetDeclaredArchives()) {
+    for (const auto& archive : description.GetDeclaredArchives()) {
         size = archive.second.size > INT64_MAX - size ? INT64_MAX : size + archive.second.size;
     }
     std::wstring text =
@@ -196,21 +132,9 @@ void Updater::OfferCompleteBuild(const Exception& failure) {
         text += L"\n" + line;
     }
     if (!gui.AskYesNo(text)) {
+        RemoveFile(fetched);
         throw Exception("The complete build was declined. " + failure.message, ErrorCode::CorruptData);
     }
     gui.SetStatusText(Localize("INSTALLER_REINSTALLING_STATUS"));
-}
-
-bool Updater::InstallationNeedsUninstall() {
-    if (!registry.HasInstallDir()) return false;
-    InstallationData other;
-    other.Load(registry.GetInstallDir());
-    std::istringstream in(other.patcherVersion);
-    float version = 1.0f;
-    if (!(in >> version)) version = 1.0f;
-    if (kUpdaterVersion < version) {
-        throw Exception("The installed game has used a newer installer than the current, running one.",
-                        ErrorCode::NewerInstaller);
-    }
-    return kUpdaterVersion > version;
+    return fetched;
 }

@@ -58,8 +58,8 @@ int32_t Updater::RunUninstallCleanup() {
     DeleteDirectory(PathJoin(folder, "pb"), true);
 
     installationData.Load(folder);
-    const std::string work = PathJoin(folder, configuration.GetPatchInstallPath());
-    CleanTemporaryFiles(work, PathJoin(work, configuration.GetPatchedFilesPath()));
+    const UpdateLayout layout = MakeUpdateLayout(configuration, folder);
+    CleanTemporaryFiles(layout.patchFolder, layout.patchedFilesFolder);
     Uninstaller(PathJoin(folder, kUninstallRecordName)).Remove(folder);
     progressFile.SetDirectory(folder);
     RemoveFile(progressFile.GetRecordPath());

@@ -1,29 +1,69 @@
-// The two stages of one patch or build, as the run drives them: the space
-// check, the downloads and the preparation, then the installation changed
-// behind its progress record, the uninstall record and the clean-up.
-#include <memory>
-
+// One batch's two stages as the run drives them: the work folders and the
+// description, the space check, the downloads and the preparation, then
+// the installation changed behind its progress record and the clean-up.
+#include "app/installation_records.h"
 #include "app/temporary_files.h"
 #include "app/updater.h"
-#include "app/version_text.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/log.h"
 #include "base/paths.h"
+#include "patch/patch_info_file.h"
+#include "patch/patch_stages.h"
 #include "text/localization.h"
-#include "uninstall/uninstaller.h"
 
-void Updater::StageOne(bool installed) {
+void Updater::InstallBatch(const PatchBatch& batch, PatchInfoFile& description, const std::string& fetchedPath) {
+    LOG_AS("Updater", Info) << "Patch URL:" << batch.location;
+    try {
+        CleanTemporaryFiles(batch.patchFolder, batch.patchedFilesFolder);
+        MakeDirectories(batch.patchFolder);
+        MakeDirectories(batch.patchedFilesFolder);
+        if (fetchedPath.empty()) {
+            FetchDescription(batch, batch.patchFolder, description);
+        } else {
+            // Fetched into the temporary folder before the work folders
+            // existed.
+            MoveFileReplacing(fetchedPath, PathJoin(batch.patchFolder, configuration.GetPatchInfoFilename()));
+        }
+        PatchStages stages(batch, description, progressFile, Services());
+        StageOne(stages, batch, description);
+        // A cancel confirmed while stage one finished must not let stage
+        // two begin.
+        quitRequested.ThrowIfCancelled("User cancelled before the installation was changed.");
+        StageTwo(stages, std::nullopt);
+    } catch (const Exception&) {
+        if (!fetchedPath.empty()) RemoveFile(fetchedPath);
+        AbandonBatch(batch);
+        throw;
+    }
+    CleanTemporaryFiles(batch.patchFolder, batch.patchedFilesFolder);
+}
+
+void Updater::ResumeBatch(const PatchBatch& batch, const ResumePoint& resumeAt) {
+    LOG_AS("Updater", Info) << "Patch URL:" << batch.location;
+    PatchInfoFile description;
+    description.Load(PathJoin(batch.patchFolder, configuration.GetPatchInfoFilename()));
+    PatchStages stages(batch, description, progressFile, Services());
+    StageTwo(stages, resumeAt);
+    CleanTemporaryFiles(batch.patchFolder, batch.patchedFilesFolder);
+}
+
+void Updater::AbandonBatch(const PatchBatch& batch) {
+    downloader.RequestStop();
+    downloader.WaitForWorker();
+    if (installationData.currentVersion != "-1") CleanTemporaryFiles(batch.patchFolder, batch.patchedFilesFolder);
+}
+
+StageServices Updater::Services() { return StageServices{this, &retryBox, &quitRequested}; }
+
+void Updater::StageOne(PatchStages& stages, const PatchBatch& batch, PatchInfoFile& description) {
     const std::wstring space = Localize("INSTALLER_ERROR_NOT_ENOUGH_SPACE") + L"\n%d " +
                                Localize("INSTALLER_REQUIRED_SPACE") + L"\n" +
                                Localize("INSTALLER_ERROR_FREE_UP_SPACE") + L"\n";
-    if (!CheckDiskSpace(installDir, space, false)) {
+    if (!CheckDiskSpace(batch.installationFolder, description.GetSpaceRequirement(), space, false)) {
         throw Exception("Space check failed in stage one. Exiting.", ErrorCode::UserCancelled);
     }
-    installationData.SetPatcherVersion(kUpdaterVersion);
-    if (installed) installationData.Save();
-
-    const std::list<DownloadEntry> list = BuildDownloadList();
+    const std::list<DownloadEntry> list = BuildDownloadList(batch, description);
     totalFiles = static_cast<int32_t>(list.size());
     doneFiles = 0;
     if (!list.empty()) {
@@ -32,26 +72,22 @@ void Updater::StageOne(bool installed) {
     } else {
         gui.SetOverallProgress(1000);
     }
-    stages->Prepare(CurrentBatch(), &downloader, this);
+    stages.Prepare(downloader);
 }
 
-void Updater::StageTwo(bool installed) {
-    stages->Apply(CurrentBatch(), this, [this](const std::string& version) {
-        installationData.currentVersion = version;
-        return installationData.Save();
-    });
-    WriteUninstallRecord(installed);
-    RemoveFile(patchInfoPath);
-    CleanTemporaryFiles(patchDir, patchedDir);
+void Updater::StageTwo(PatchStages& stages, const std::optional<ResumePoint>& resumeAt) {
+    const bool machineWide = registry.GetHive() == RegistryHive::LocalMachine;
+    InstallationRecords records(installationData, UninstallOwner{registryKeyPath, productGuid, machineWide,
+                                                                 arguments.internallyElevated ? arguments.sid : ""});
+    stages.Apply(&records, resumeAt);
 }
 
-bool Updater::CheckDiskSpace(const std::string& folder, const std::wstring& message, bool quiet) {
+bool Updater::CheckDiskSpace(const std::string& folder, int64_t required, const std::wstring& message, bool quiet) {
     int64_t available = 0;
     if (!GetFreeDiskSpace(folder, available)) {
         LOG_AS("Updater", Error) << "GetDiskFreeSpaceEx call failed.";
         return true;
     }
-    const int64_t required = patchInfo.GetSpaceRequirement();
     if (required <= 0 || required < available) return true;
     if (!quiet && !message.empty()) {
         std::wstring text = message;
@@ -62,48 +98,15 @@ bool Updater::CheckDiskSpace(const std::string& folder, const std::wstring& mess
 }
 
 // Each archive the description declares must arrive as declared.
-std::list<DownloadEntry> Updater::BuildDownloadList() {
-    const std::vector<std::string> names = ArchivesInFetchOrder(patchInfo);
-    std::list<DownloadEntry> list = MakeDownloadList(names, patchUrl, patchDir);
+std::list<DownloadEntry> Updater::BuildDownloadList(const PatchBatch& batch, PatchInfoFile& description) {
+    const std::vector<std::string> names = ArchivesInFetchOrder(description);
+    std::list<DownloadEntry> list = MakeDownloadList(names, batch.location, batch.patchFolder);
     auto name = names.begin();
     for (DownloadEntry& entry : list) {
-        const auto declared = patchInfo.GetDeclaredArchives().find(*name++);
-        if (declared == patchInfo.GetDeclaredArchives().end()) continue;
+        const auto declared = description.GetDeclaredArchives().find(*name++);
+        if (declared == description.GetDeclaredArchives().end()) continue;
         entry.declaredSize = declared->second.size;
         entry.declaredSha256 = declared->second.sha256;
     }
     return list;
-}
-
-PatchBatch Updater::CurrentBatch() const {
-    return PatchBatch{installDir, patchDir,      patchedDir,
-                      patchUrl,   latestVersion, {kInstallationDataFileName, kUninstallRecordName}};
-}
-
-// The record lists what every patch added; a missing one starts afresh
-// and an unreadable one is kept aside, so a finished update is never
-// reported as failed because of it.
-void Updater::WriteUninstallRecord(bool installed) {
-    const std::string recordPath = PathJoin(installDir, kUninstallRecordName);
-    const std::string sid = arguments.internallyElevated ? arguments.sid : "";
-    const bool machineWide = registry.GetHive() == RegistryHive::LocalMachine;
-    bool loadExisting = installed;
-    if (loadExisting && !FileExists(recordPath)) {
-        LOG_AS("Updater", Info) << "No uninstall record yet, starting " << recordPath;
-        loadExisting = false;
-    }
-    std::unique_ptr<Uninstaller> record;
-    try {
-        record = std::make_unique<Uninstaller>(installDir, registryKeyPath, recordPath, productGuid, machineWide, sid,
-                                               loadExisting);
-    } catch (const Exception& error) {
-        LOG_AS("Updater", Error) << "Unreadable uninstall record (" << error.message << "), kept as " << recordPath
-                                 << ".bad";
-        MoveFileReplacing(recordPath, recordPath + ".bad");
-        record = std::make_unique<Uninstaller>(installDir, registryKeyPath, recordPath, productGuid, machineWide, sid,
-                                               false);
-    }
-    record->AddChanges(patchInfoPath, true);
-    record->AddFile(PathJoin(installDir, "UpdateHistory.log"));
-    record->Save();
 }

@@ -12,6 +12,7 @@
 #include "base/paths.h"
 #include "net/location.h"
 #include "net/signature_check.h"
+#include "patch/patch_info_file.h"
 #include "patch/patch_stages.h"
 #include "text/localization.h"
 
@@ -37,63 +38,80 @@ bool ReadStart(const std::string& path, std::string& text) {
 
 // The transfers of the version check and the descriptions go through the
 // run's one downloader, so that the window's cancel reaches them as well.
-void Updater::CheckLatestVersion(bool installed) {
+std::string Updater::CheckLatestVersion() {
     gui.SetStatusText(Localize("INSTALLER_RETRIEVING_VERSION_STATUS"));
     const std::string temp = MakeTempFileName("ivl");
     downloader.SetStatusView(nullptr);
     downloader.Download(configuration.GetLatestVersionUrl(), temp, false);
-    if (firstVersionCheck && installed) {
+    if (firstVersionCheck) {
         // The first check shows the bar filling over three seconds while
         // the file arrives, and notices a cancel within 50 ms.
         gui.SetProgressTotal(0);
-        for (int step = 1; step <= 60 && !cancelled; ++step) {
+        for (int step = 1; step <= 60 && !quitRequested.IsCancelled(); ++step) {
             std::this_thread::sleep_for(std::chrono::milliseconds(50));
             gui.SetProgressTotal(std::min(step * 50 * 1000 / 3000, 1000));
         }
-        if (cancelled) throw Exception("User cancelled during version check.", ErrorCode::UserCancelled);
+        quitRequested.ThrowIfCancelled("User cancelled during version check.");
         firstVersionCheck = false;
     }
     if (!downloader.WaitForWorker() || downloader.Entries().front().status != DownloadStatus::Done) {
-        if (cancelled) throw Exception("User cancelled during version check.", ErrorCode::UserCancelled);
+        quitRequested.ThrowIfCancelled("User cancelled during version check.");
         throw Exception("Failed to download latest version file.", ErrorCode::FileNotFound);
     }
     gui.SetProgressTotal(1000);
     std::string text;
     if (!ReadStart(temp, text)) throw Exception("Failed to open latest version file.", ErrorCode::FileNotFound);
-    latestVersion = FirstWord(text);
+    const std::string latest = FirstWord(text);
     RemoveFile(temp);
-    if (latestVersion.empty()) throw Exception("Failed to read latest version file.", ErrorCode::FileNotFound);
+    if (latest.empty()) throw Exception("Failed to read latest version file.", ErrorCode::FileNotFound);
+    return latest;
 }
 
-void Updater::DownloadPatchInfo(const std::string& location, const std::string& folder) {
+std::string Updater::FetchDescription(const PatchBatch& batch, const std::string& folder, PatchInfoFile& description) {
     const std::string name = configuration.GetPatchInfoFilename();
-    patchInfoPath = PathJoin(folder.empty() ? GetTempDirectory() : folder, name);
-    if (!FetchOne(DownloadEntry(JoinLocation(location, name), patchInfoPath))) {
+    const std::string path = PathJoin(folder.empty() ? GetTempDirectory() : folder, name);
+    if (!FetchOne(DownloadEntry(JoinLocation(batch.location, name), path))) {
         throw Exception("Failed to download patch info file.", ErrorCode::PatchNotFound);
     }
-    // Not one element of an unsigned description is read when a signature
-    // is required.
-    if (!publisherKey.empty()) CheckDescriptionSignature(location);
-    patchInfo.Load(patchInfoPath);
-    CheckDescriptionContent();
+    try {
+        // Not one element of an unsigned description is read when a
+        // signature is required.
+        if (!publisherKey.empty()) CheckDescriptionSignature(batch.location, path);
+        description.Load(path);
+        CheckDescriptionContent(batch, description);
+    } catch (const Exception&) {
+        RemoveFile(path);
+        throw;
+    }
+    return path;
+}
+
+std::string Updater::FetchBuildDescription(const PatchBatch& build, PatchInfoFile& description) {
+    try {
+        return FetchDescription(build, "", description);
+    } catch (const Exception& error) {
+        if (error.Code() == ErrorCode::PatchNotFound)
+            throw Exception("Could not find build.", ErrorCode::BuildNotFound);
+        throw;
+    }
 }
 
 bool Updater::FetchOne(const DownloadEntry& entry) {
     downloader.SetStatusView(nullptr);
     downloader.Start({entry}, true);
     if (downloader.WaitForWorker() && downloader.Entries().front().status == DownloadStatus::Done) return true;
-    if (cancelled) throw Exception("User cancelled while fetching the patch description.", ErrorCode::UserCancelled);
+    quitRequested.ThrowIfCancelled("User cancelled while fetching the patch description.");
     return false;
 }
 
-void Updater::CheckDescriptionSignature(const std::string& location) {
+void Updater::CheckDescriptionSignature(const std::string& location, const std::string& path) {
     const std::string name = configuration.GetPatchInfoFilename() + ".sig";
-    const std::string signaturePath = patchInfoPath + ".sig";
+    const std::string signaturePath = path + ".sig";
     try {
         if (!FetchOne(DownloadEntry(JoinLocation(location, name), signaturePath))) {
             throw Exception("The patch description's signature could not be downloaded.", ErrorCode::CorruptData);
         }
-        CheckFileSignature(patchInfoPath, signaturePath, publisherKey);
+        CheckFileSignature(path, signaturePath, publisherKey);
     } catch (const Exception&) {
         RemoveFile(signaturePath);
         throw;
@@ -104,15 +122,15 @@ void Updater::CheckDescriptionSignature(const std::string& location) {
 // What a signature cannot say by itself: that the description is the one
 // asked for, not an older one replayed, and that it vouches for every
 // archive it names.
-void Updater::CheckDescriptionContent() {
-    const std::string& leadsTo = patchInfo.GetVersion();
-    if (leadsTo.empty() ? !publisherKey.empty() : leadsTo != latestVersion) {
-        throw Exception("The patch description leads to version \"" + leadsTo + "\", not to " + latestVersion + ".",
+void Updater::CheckDescriptionContent(const PatchBatch& batch, PatchInfoFile& description) {
+    const std::string& leadsTo = description.GetVersion();
+    if (leadsTo.empty() ? !publisherKey.empty() : leadsTo != batch.version) {
+        throw Exception("The patch description leads to version \"" + leadsTo + "\", not to " + batch.version + ".",
                         ErrorCode::CorruptData);
     }
     if (publisherKey.empty()) return;
-    for (const std::string& archive : ArchivesInFetchOrder(patchInfo)) {
-        if (patchInfo.GetDeclaredArchives().count(archive) == 0) {
+    for (const std::string& archive : ArchivesInFetchOrder(description)) {
+        if (description.GetDeclaredArchives().count(archive) == 0) {
             throw Exception("The signed patch description declares no size and SHA-256 for " + archive + ".",
                             ErrorCode::CorruptData);
         }

@@ -1,6 +1,5 @@
 #pragma once
 
-#include <atomic>
 #include <cstdint>
 #include <functional>
 #include <string>
@@ -8,11 +7,13 @@
 #include "base/status_interfaces.h"
 #include "net/download_entry.h"
 
+class CancellationToken;
+
 // Copies the file a file:// address, UNC path or resolved relative path
 // names to localPath, overwriting it, with progress to statusView (may be
 // null) and a stop that cancels the copy. Logs a failure that no stop caused.
-DownloadStatus FileCopyTransfer(const std::string& url, const std::string& localPath,
-                                const std::atomic<bool>& stopRequested, IStatusView* statusView);
+DownloadStatus FileCopyTransfer(const std::string& url, const std::string& localPath, const CancellationToken& stop,
+                                IStatusView* statusView);
 
 // Told the bytes copied so far and the source's size; returns false to
 // cancel the copy.

@@ -29,7 +29,7 @@ void HttpDownloader::Start(const std::list<DownloadEntry>& list, bool sign) {
     if (&list != &entries) entries = list;
     for (DownloadEntry& entry : entries) entry.status = DownloadStatus::Pending;
     signUrls = sign;
-    stopRequested = false;
+    stop.Reset();
     {
         std::lock_guard<std::mutex> lock(workerMutex);
         workerRunning = true;
@@ -42,7 +42,7 @@ void HttpDownloader::Download(const std::string& url, const std::string& localPa
 }
 
 void HttpDownloader::RequestStop() {
-    stopRequested = true;
+    stop.Cancel();
     wakeEvent.Signal();
 }
 
@@ -73,7 +73,7 @@ DownloadStatus HttpDownloader::WaitForFile(const std::string& fileName) {
         if (status != DownloadStatus::Pending) return status;
         // A file the worker never reached because of a stop was cancelled,
         // not failed: the caller must not report a download error.
-        if (stopRequested) return DownloadStatus::Cancelled;
+        if (stop.IsCancelled()) return DownloadStatus::Cancelled;
         if (WorkerEnded()) {
             // The entry may have been settled just before the worker ended.
             const DownloadStatus last = outcome();
@@ -100,7 +100,7 @@ ArchiveState HttpDownloader::WaitForArchive(const std::string& fileName) {
 
 void HttpDownloader::Run() {
     for (DownloadEntry& entry : entries) {
-        if (stopRequested) break;
+        if (stop.IsCancelled()) break;
         entry.status = FetchChecked(entry);
         wakeEvent.Signal();
         if (entry.status != DownloadStatus::Done) break;
@@ -132,13 +132,13 @@ DownloadStatus HttpDownloader::Fetch(DownloadEntry& entry) {
     LOG(Trace) << "Downloading file: " << entry.url;
     switch (ClassifyLocation(entry.url)) {
         case LocationKind::Http:
-            return HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry.localPath, entry.declaredSize,
-                                stopRequested, statusView);
+            return HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry.localPath, entry.declaredSize, stop,
+                                statusView);
         case LocationKind::Relative:
             entry.url = PathJoin(GetProgramFolder(), entry.url);
-            return FileCopyTransfer(entry.url, entry.localPath, stopRequested, statusView);
+            return FileCopyTransfer(entry.url, entry.localPath, stop, statusView);
         case LocationKind::FileCopy:
-            return FileCopyTransfer(entry.url, entry.localPath, stopRequested, statusView);
+            return FileCopyTransfer(entry.url, entry.localPath, stop, statusView);
         case LocationKind::Unsupported:
             break;
     }
@@ -150,9 +150,9 @@ DownloadStatus HttpDownloader::Check(const DownloadEntry& entry) {
     if (entry.declaredSize < 0 && entry.declaredSha256.empty()) return DownloadStatus::Done;
     Sha256Digest digest{};
     int64_t length = 0;
-    const bool hashed = Sha256OfFile(entry.localPath, stopRequested, digest, length);
+    const bool hashed = Sha256OfFile(entry.localPath, digest, length, &stop);
     DownloadStatus status = DownloadStatus::Corrupt;
-    if (stopRequested) {
+    if (stop.IsCancelled()) {
         status = DownloadStatus::Cancelled;
     } else if (!hashed) {
         LOG(Error) << "Cannot read " << entry.localPath << " to check it.";

@@ -8,6 +8,7 @@
 #include <thread>
 
 #include "base/archive_source.h"
+#include "base/cancellation.h"
 #include "base/status_interfaces.h"
 #include "net/auto_reset_event.h"
 #include "net/download_entry.h"
@@ -20,7 +21,9 @@
 // declares (size, SHA-256).
 class HttpDownloader : public IArchiveSource {
 public:
-    HttpDownloader() = default;
+    // A cancel of runCancel (may be null) stops the downloader too, and
+    // keeps it stopped for every later Start.
+    explicit HttpDownloader(const CancellationToken* runCancel = nullptr) : stop(runCancel) {}
     HttpDownloader(const HttpDownloader&) = delete;
     HttpDownloader& operator=(const HttpDownloader&) = delete;
     // Stops the worker and waits for it.
@@ -70,7 +73,7 @@ private:
     bool WorkerEnded();
 
     bool signUrls = false;
-    std::atomic<bool> stopRequested{false};
+    CancellationToken stop;
     std::thread worker;
     AutoResetEvent wakeEvent;
     std::list<DownloadEntry> entries;

@@ -2,6 +2,7 @@
 
 #include <cstdio>
 
+#include "base/cancellation.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
 #include "base/log.h"
@@ -14,7 +15,7 @@ const uint32_t kAssumedLength = 1048576;
 
 class FileSink final : public HttpResponseSink {
 public:
-    FileSink(const std::string& path, int64_t limit, const std::atomic<bool>& stop, IStatusView* view)
+    FileSink(const std::string& path, int64_t limit, const CancellationToken& stop, IStatusView* view)
         : localPath(path), sizeLimit(limit), stopRequested(stop), statusView(view) {}
 
     bool OnResponse(const std::string& statusText, bool lengthKnown, uint32_t contentLength) override {
@@ -36,7 +37,7 @@ public:
         return true;
     }
 
-    bool KeepReading() override { return !stopRequested; }
+    bool KeepReading() override { return !stopRequested.IsCancelled(); }
 
     bool OnData(const char* data, uint32_t size) override {
         // Not one byte past what the publisher declared reaches the disk.
@@ -72,7 +73,7 @@ private:
 
     const std::string& localPath;
     const int64_t sizeLimit;
-    const std::atomic<bool>& stopRequested;
+    const CancellationToken& stopRequested;
     IStatusView* statusView;
     FileStream file;
     bool hasLength = false;
@@ -84,8 +85,8 @@ private:
 }  // namespace
 
 DownloadStatus HttpTransfer(const std::string& address, const std::string& localPath, int64_t sizeLimit,
-                            const std::atomic<bool>& stopRequested, IStatusView* statusView) {
-    FileSink sink(localPath, sizeLimit, stopRequested, statusView);
+                            const CancellationToken& stop, IStatusView* statusView) {
+    FileSink sink(localPath, sizeLimit, stop, statusView);
     DownloadStatus status = DownloadStatus::Failed;
     switch (HttpGet(address, sink)) {
         case HttpOutcome::NoSession:

@@ -2,6 +2,7 @@
 
 #include <vector>
 
+#include "base/cancellation.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
 
@@ -23,7 +24,7 @@ std::string HexDigits(const uint8_t* bytes, size_t count) {
     return hex;
 }
 
-bool Sha256OfFile(const std::string& path, const std::atomic<bool>& stop, Sha256Digest& digest, int64_t& length) {
+bool Sha256OfFile(const std::string& path, Sha256Digest& digest, int64_t& length, const CancellationToken* stop) {
     try {
         FileStream file;
         file.Open(path);
@@ -31,7 +32,7 @@ bool Sha256OfFile(const std::string& path, const std::atomic<bool>& stop, Sha256
         std::vector<uint8_t> buffer(kReadPiece);
         length = 0;
         for (;;) {
-            if (stop) return false;
+            if (IsCancelled(stop)) return false;
             const uint32_t count = file.Read(buffer.data(), kReadPiece);
             if (count == 0) break;
             hash.Update(buffer.data(), count);

@@ -1,11 +1,12 @@
 #pragma once
 
 #include <array>
-#include <atomic>
 #include <cstddef>
 #include <cstdint>
 #include <memory>
 #include <string>
+
+class CancellationToken;
 
 using Sha256Digest = std::array<uint8_t, 32>;
 
@@ -33,6 +34,7 @@ private:
 std::string HexDigits(const uint8_t* bytes, size_t count);
 
 // Hashes the file at path and reports its length in bytes. False when the
-// file cannot be read, or when stop was set before the end (a large
-// archive takes seconds).
-bool Sha256OfFile(const std::string& path, const std::atomic<bool>& stop, Sha256Digest& digest, int64_t& length);
+// file cannot be read, or when stop (may be null) was cancelled before the
+// end (a large archive takes seconds).
+bool Sha256OfFile(const std::string& path, Sha256Digest& digest, int64_t& length,
+                  const CancellationToken* stop = nullptr);

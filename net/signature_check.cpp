@@ -32,8 +32,7 @@ void CheckFileSignature(const std::string& path, const std::string& signaturePat
 
     Sha256Digest digest{};
     int64_t length = 0;
-    const std::atomic<bool> never{false};
-    if (!Sha256OfFile(path, never, digest, length)) Refuse("The signed file " + path + " cannot be read.");
+    if (!Sha256OfFile(path, digest, length)) Refuse("The signed file " + path + " cannot be read.");
     if (!VerifyP256Signature(key, digest, signature)) {
         Refuse("The signature in " + signaturePath + " does not match " + path + " and the publisher key.");
     }

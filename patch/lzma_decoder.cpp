@@ -6,10 +6,9 @@
 #include <cstdlib>
 #include <memory>
 
+#include "base/cancellation.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
-
-std::atomic<bool> quitRequested{false};
 
 namespace {
 
@@ -79,7 +78,7 @@ const char* LzmaResultText(int result) {
     }
 }
 
-void DecodeLzma(FileStream& input, FileStream& output) {
+void DecodeLzma(FileStream& input, FileStream& output, const CancellationToken* cancel) {
     uint8_t header[kHeaderSize];
     // A stream too short to hold its own header is missing data, not a
     // header of zeros.
@@ -108,7 +107,7 @@ void DecodeLzma(FileStream& input, FileStream& output) {
     for (;;) {
         // A stopped extraction is a cancel, never a finished file: the
         // caller must not take the cut-off output for the member.
-        if (quitRequested.load(std::memory_order_relaxed)) throw Exception("", ErrorCode::UserCancelled);
+        if (IsCancelled(cancel)) throw Exception("", ErrorCode::UserCancelled);
         if (inPosition == inSize) {
             inSize = input.Read(inBuffer.get(), kBufferSize);
             inPosition = 0;

@@ -1,14 +1,9 @@
 #pragma once
 
-#include <atomic>
 #include <cstdint>
 
+class CancellationToken;
 class FileStream;
-
-// Set by the user-interface thread when the user confirmed quitting; the
-// decoding loop looks at it once per 64 KiB step and stops with a
-// UserCancelled Exception, leaving its output incomplete.
-extern std::atomic<bool> quitRequested;
 
 // The largest dictionary a stream may make us allocate: 1.5 GiB, the most
 // the xz tools write into a stand-alone LZMA header (the SDK encoder stops
@@ -23,8 +18,10 @@ constexpr uint32_t kMaximumLzmaDictionarySize = (1u << 30) + (1u << 29);
 // then the compressed data) from input's current position into output.
 // Works in fixed 64 KiB steps: memory is the two buffers plus the
 // dictionary, whatever the size of the data. Throws Exception on failure;
-// what was decoded before the failure stays written.
-void DecodeLzma(FileStream& input, FileStream& output);
+// what was decoded before the failure stays written. A cancel (cancel may
+// be null) is noticed at every step and ends with UserCancelled, leaving
+// the output incomplete.
+void DecodeLzma(FileStream& input, FileStream& output, const CancellationToken* cancel = nullptr);
 
 // The text shown for an LZMA SDK result code.
 const char* LzmaResultText(int result);

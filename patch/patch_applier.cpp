@@ -1,6 +1,7 @@
 #include "patch/patch_applier.h"
 
 #include "base/archive_source.h"
+#include "base/cancellation.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/file_stream.h"
@@ -44,35 +45,23 @@ void FlushToDisk(const std::string& path) {
 
 }  // namespace
 
-void PatchApplier::Init(PatchInfoFile* info, PatchProgressFile* progress, const std::string& installation,
-                        const std::string& patchedFiles, const std::string& patch, IStatusView* view,
-                        IArchiveSource* source) {
-    patchInfo = info;
-    progressFile = progress;
-    installationFolder = installation;
-    patchedFilesFolder = patchedFiles;
-    patchFolder = patch;
-    statusView = view;
-    archives = source;
-    cancelRequested = false;
-    filesDone = 0;
-    actionCounter = 0;
-    changedFolders.clear();
-    filesTotal = patchInfo->CountFileAndDirectoryChanges();
+PatchApplier::PatchApplier(const PatchBatch& work, PatchInfoFile& description, PatchProgressFile& progress,
+                           const StageServices& stageServices)
+    : batch(work), patchInfo(description), progressFile(progress), services(stageServices) {
+    filesTotal = patchInfo.CountFileAndDirectoryChanges();
 }
 
 void PatchApplier::CheckCancel() const {
-    if (cancelRequested) throw Exception("", ErrorCode::UserCancelled);
+    if (IsCancelled(services.cancel)) throw Exception("", ErrorCode::UserCancelled);
 }
 
 void PatchApplier::ReportProgress(const std::string& path) const {
-    if (statusView == nullptr || filesTotal <= 0) return;
-    statusView->OnApplyProgress(GetFileName(path), filesDone * 1000 / filesTotal);
+    if (services.statusView == nullptr || filesTotal <= 0) return;
+    services.statusView->OnApplyProgress(GetFileName(path), filesDone * 1000 / filesTotal);
 }
 
-void PatchApplier::WaitForArchive(const std::string& archiveName) const {
-    if (archives == nullptr) throw Exception("No downloader set.");
-    switch (archives->WaitForArchive(archiveName)) {
+void PatchApplier::WaitForArchive(IArchiveSource& archives, const std::string& archiveName) const {
+    switch (archives.WaitForArchive(archiveName)) {
         case ArchiveState::Arrived:
             return;
         case ArchiveState::Cancelled:
@@ -95,50 +84,50 @@ void PatchApplier::RequireSafe(const std::string& path, const std::vector<std::s
 // item may not reach the updater's own work folders and records: deleting
 // the prepared files or the progress record half-way would lose the batch.
 void PatchApplier::CheckItemPaths() {
-    std::vector<std::string> ownNames = protectedNames;
-    for (const std::string& folder : {patchFolder, patchedFilesFolder}) {
-        const std::string relative = PathBelow(folder, installationFolder);
+    std::vector<std::string> ownNames = batch.protectedNames;
+    for (const std::string& folder : {batch.patchFolder, batch.patchedFilesFolder}) {
+        const std::string relative = PathBelow(folder, batch.installationFolder);
         if (!relative.empty()) ownNames.push_back(relative);
     }
-    for (const std::string& record : {progressFile->GetRecordPath(), progressFile->GetAlternativeRecordPath()}) {
-        const std::string relative = PathBelow(record, installationFolder);
+    for (const std::string& record : {progressFile.GetRecordPath(), progressFile.GetAlternativeRecordPath()}) {
+        const std::string relative = PathBelow(record, batch.installationFolder);
         if (!relative.empty()) ownNames.push_back(relative);
     }
-    patchInfo->ResetIterators();
+    patchInfo.ResetIterators();
     std::string path;
     std::string archive;
-    while (patchInfo->NextDiffFile(path, archive)) {
+    while (patchInfo.NextDiffFile(path, archive)) {
         RequireSafe(path, ownNames);
         RequireSafe(archive, {});
     }
-    while (patchInfo->NextNewFile(path, archive)) {
+    while (patchInfo.NextNewFile(path, archive)) {
         RequireSafe(path, ownNames);
         RequireSafe(archive, {});
     }
-    while (patchInfo->NextDeletedFile(path)) RequireSafe(path, ownNames);
-    while (patchInfo->NextDeletedDirectory(path)) RequireSafe(path, ownNames);
-    while (patchInfo->NextNewDirectory(path)) RequireSafe(path, ownNames);
-    patchInfo->ResetIterators();
+    while (patchInfo.NextDeletedFile(path)) RequireSafe(path, ownNames);
+    while (patchInfo.NextDeletedDirectory(path)) RequireSafe(path, ownNames);
+    while (patchInfo.NextNewDirectory(path)) RequireSafe(path, ownNames);
+    patchInfo.ResetIterators();
 }
 
-void PatchApplier::PreparePatch() {
+void PatchApplier::PreparePatch(IArchiveSource& archives) {
     LogEntry(LogLevel::Trace, kLogSource, 55).Stream() << "PreparePatch Start";
     CheckItemPaths();
     LogEntry(LogLevel::Trace, kLogSource, 66).Stream() << "Applying diff files";
     std::string path;
     std::string archive;
-    while (patchInfo->NextDiffFile(path, archive)) {
+    while (patchInfo.NextDiffFile(path, archive)) {
         CheckCancel();
         ++filesDone;
         ReportProgress(path);
-        PrepareDiffFile(path, archive);
+        PrepareDiffFile(archives, path, archive);
     }
     LogEntry(LogLevel::Trace, kLogSource, 132).Stream() << "Adding new files";
-    while (patchInfo->NextNewFile(path, archive)) {
+    while (patchInfo.NextNewFile(path, archive)) {
         CheckCancel();
         ++filesDone;
         ReportProgress(path);
-        PrepareNewFile(path, archive);
+        PrepareNewFile(archives, path, archive);
     }
     // A cancel during the last extraction must not pass for a finished
     // stage: stage two would move a cut-off file in.
@@ -146,15 +135,15 @@ void PatchApplier::PreparePatch() {
     MakePreparedFilesDurable();
 }
 
-void PatchApplier::PrepareDiffFile(const std::string& path, const std::string& archive) {
-    WaitForArchive(archive);
-    const std::string deltaPath = PathJoin(patchFolder, kDeltaFileName);
-    PatchArchive(PathJoin(patchFolder, archive)).DecodeFile(path, deltaPath);
+void PatchApplier::PrepareDiffFile(IArchiveSource& archives, const std::string& path, const std::string& archive) {
+    WaitForArchive(archives, archive);
+    const std::string deltaPath = PathJoin(batch.patchFolder, kDeltaFileName);
+    PatchArchive(PathJoin(batch.patchFolder, archive)).DecodeFile(path, deltaPath, services.cancel);
     CheckCancel();
-    const std::string folder = PathJoin(patchedFilesFolder, GetParentDirectory(path));
+    const std::string folder = PathJoin(batch.patchedFilesFolder, GetParentDirectory(path));
     if (!FileExists(folder)) MakeDirectories(folder);
 
-    const std::string sourcePath = PathJoin(installationFolder, path);
+    const std::string sourcePath = PathJoin(batch.installationFolder, path);
     try {
         FileStream source;
         FileStream delta;
@@ -163,12 +152,13 @@ void PatchApplier::PrepareDiffFile(const std::string& path, const std::string& a
         delta.Open(deltaPath);
         // Created empty: a longer leftover of an earlier attempt must not
         // keep stale bytes at its end.
-        target.Create(PathJoin(patchedFilesFolder, path));
+        target.Create(PathJoin(batch.patchedFilesFolder, path));
         LogEntry(LogLevel::Trace, kLogSource, 107).Stream()
             << "Patching file " << path << ". Size: " << source.GetLength();
-        VcdiffDecoder::Decode(&source, &delta, &target);
+        VcdiffDecoder::Decode(&source, &delta, &target, services.cancel);
         target.Flush();
     } catch (const Exception& error) {
+        if (error.Code() == ErrorCode::UserCancelled) throw;
         throw Exception(
             "Failed to apply delta file " + deltaPath + " on " + sourcePath + ". Source message: " + error.message,
             ErrorCode::DeltaFailed);
@@ -176,12 +166,12 @@ void PatchApplier::PrepareDiffFile(const std::string& path, const std::string& a
     RemoveFile(deltaPath);
 }
 
-void PatchApplier::PrepareNewFile(const std::string& path, const std::string& archive) {
-    const std::string folder = PathJoin(patchedFilesFolder, GetParentDirectory(path));
+void PatchApplier::PrepareNewFile(IArchiveSource& archives, const std::string& path, const std::string& archive) {
+    const std::string folder = PathJoin(batch.patchedFilesFolder, GetParentDirectory(path));
     if (!FileExists(folder)) MakeDirectories(folder);
-    WaitForArchive(archive);
-    const std::string target = PathJoin(patchedFilesFolder, path);
-    PatchArchive(PathJoin(patchFolder, archive)).DecodeFile(path, target);
+    WaitForArchive(archives, archive);
+    const std::string target = PathJoin(batch.patchedFilesFolder, path);
+    PatchArchive(PathJoin(batch.patchFolder, archive)).DecodeFile(path, target, services.cancel);
     FlushToDisk(target);
 }
 
@@ -191,10 +181,11 @@ void PatchApplier::PrepareNewFile(const std::string& path, const std::string& ar
 // folder from the installation down to each prepared file.
 void PatchApplier::MakePreparedFilesDurable() {
     std::vector<std::string> prepared;
-    CollectFiles(patchedFilesFolder, prepared);
+    CollectFiles(batch.patchedFilesFolder, prepared);
     std::set<std::string> folders;
-    const std::string root =
-        PathBelow(patchedFilesFolder, installationFolder).empty() ? patchedFilesFolder : installationFolder;
+    const std::string root = PathBelow(batch.patchedFilesFolder, batch.installationFolder).empty()
+                                 ? batch.patchedFilesFolder
+                                 : batch.installationFolder;
     for (const std::string& file : prepared) {
         for (const std::string& folder : FoldersFromRootTo(file, root)) folders.insert(folder);
     }
@@ -202,18 +193,19 @@ void PatchApplier::MakePreparedFilesDurable() {
 }
 
 void PatchApplier::NoteChanged(const std::string& path) {
-    for (const std::string& folder : FoldersFromRootTo(path, installationFolder)) changedFolders.insert(folder);
+    for (const std::string& folder : FoldersFromRootTo(path, batch.installationFolder)) changedFolders.insert(folder);
 }
 
 // Each action is on the disk before the next one is recorded: a record
 // that outlived a power cut must never name an action after one the cut
 // undid, or the resumed run would skip the undone one.
-void PatchApplier::ApplyPatch() {
+void PatchApplier::ApplyPatch(const std::optional<ResumePoint>& recordedAction) {
     LogEntry(LogLevel::Trace, kLogSource, 161).Stream() << "ApplyPatch Start";
+    resumeAt = recordedAction;
     CheckItemPaths();
     std::string path;
-    while (patchInfo->NextDeletedFile(path)) {
-        const std::string target = PathJoin(installationFolder, path);
+    while (patchInfo.NextDeletedFile(path)) {
+        const std::string target = PathJoin(batch.installationFolder, path);
         if (ShouldApply(path)) {
             RemoveFile(target);
             SyncFolder(GetParentDirectory(target));
@@ -221,8 +213,8 @@ void PatchApplier::ApplyPatch() {
         ++filesDone;
         ReportProgress(path);
     }
-    while (patchInfo->NextDeletedDirectory(path)) {
-        const std::string target = PathJoin(installationFolder, path);
+    while (patchInfo.NextDeletedDirectory(path)) {
+        const std::string target = PathJoin(batch.installationFolder, path);
         if (ShouldApply(path)) {
             DeleteDirectory(target, true);
             SyncFolder(GetParentDirectory(target));
@@ -230,11 +222,11 @@ void PatchApplier::ApplyPatch() {
         ++filesDone;
         ReportProgress(path);
     }
-    while (patchInfo->NextNewDirectory(path)) {
-        const std::string target = PathJoin(installationFolder, path);
+    while (patchInfo.NextNewDirectory(path)) {
+        const std::string target = PathJoin(batch.installationFolder, path);
         if (ShouldApply(path)) {
             MakeDirectories(target);
-            for (const std::string& folder : FoldersFromRootTo(target, installationFolder)) SyncFolder(folder);
+            for (const std::string& folder : FoldersFromRootTo(target, batch.installationFolder)) SyncFolder(folder);
         }
         ++filesDone;
         ReportProgress(path);
@@ -245,10 +237,10 @@ void PatchApplier::ApplyPatch() {
     // a moved file of the same name (a file deleted and added anew, or a
     // folder that became a file). A record past the last action says so.
     Record(actionCounter, "");
-    progressFile->resuming = false;
+    resumeAt.reset();
 
     std::vector<std::string> prepared;
-    CollectFiles(patchedFilesFolder, prepared);
+    CollectFiles(batch.patchedFilesFolder, prepared);
     for (const std::string& file : prepared) {
         const std::string destination = DestinationOf(file);
         MoveWithRetry(file, destination);
@@ -266,35 +258,36 @@ void PatchApplier::ApplyPatch() {
 // then created anew), and repeating the deletion after the moves had begun
 // would throw away files already moved into it.
 bool PatchApplier::ShouldApply(const std::string& path) {
-    if (!progressFile->resuming) {
+    if (!resumeAt) {
         Record(actionCounter, path);
         ++actionCounter;
         return true;
     }
-    const int32_t recorded = progressFile->GetActionIndex();
-    const bool isRecorded = recorded == -1 || (recorded == actionCounter && path == progressFile->GetFile());
+    const int32_t recorded = resumeAt->actionIndex;
+    const bool isRecorded = recorded == -1 || (recorded == actionCounter && path == resumeAt->file);
     // Counting the repeated action too keeps later ordinals true.
     ++actionCounter;
     if (!isRecorded) return false;
-    progressFile->resuming = false;
+    resumeAt.reset();
     return true;
 }
 
 // An action that could not be recorded is not carried out: after a crash
 // the next run would not know it had begun.
 void PatchApplier::Record(int32_t action, const std::string& path) {
-    progressFile->SetActionIndex(action);
-    progressFile->SetFile(path);
-    if (!progressFile->WriteRecord()) {
-        throw Exception("Failed to write the progress record " + progressFile->GetRecordPath(), ErrorCode::StepFailed);
+    progressFile.SetActionIndex(action);
+    progressFile.SetFile(path);
+    if (!progressFile.WriteRecord()) {
+        throw Exception("Failed to write the progress record " + progressFile.GetRecordPath(), ErrorCode::StepFailed);
     }
 }
 
 std::string PatchApplier::DestinationOf(const std::string& preparedFile) const {
     // Every collected file lies below the patched-files folder; only that
     // leading part is exchanged for the installation folder.
-    if (preparedFile.compare(0, patchedFilesFolder.size(), patchedFilesFolder) != 0) return preparedFile;
-    return PathJoin(installationFolder, preparedFile.substr(patchedFilesFolder.size()));
+    const std::string& prepared = batch.patchedFilesFolder;
+    if (preparedFile.compare(0, prepared.size(), prepared) != 0) return preparedFile;
+    return PathJoin(batch.installationFolder, preparedFile.substr(prepared.size()));
 }
 
 void PatchApplier::MoveWithRetry(const std::string& source, const std::string& destination) {
@@ -304,7 +297,7 @@ void PatchApplier::MoveWithRetry(const std::string& source, const std::string& d
     const std::string folder = GetParentDirectory(destination);
     if (!folder.empty() && !FileExists(folder)) MakeDirectories(folder);
     while (!MoveFileReplacing(source, destination)) {
-        if (retryQuestion == nullptr || !retryQuestion->AskRetryMove(source, destination)) {
+        if (services.retryQuestion == nullptr || !services.retryQuestion->AskRetryMove(source, destination)) {
             throw Exception("Failed to move file from " + source + " to " + destination, ErrorCode::StepFailed);
         }
     }

@@ -1,11 +1,14 @@
 #pragma once
 
-#include <atomic>
 #include <cstdint>
+#include <optional>
 #include <set>
 #include <string>
 #include <vector>
 
+#include "patch/patch_batch.h"
+
+class CancellationToken;
 class IArchiveSource;
 class IStatusView;
 class PatchInfoFile;
@@ -25,6 +28,15 @@ protected:
     ~IMoveRetryQuestion() = default;
 };
 
+// Who the stages talk to while they work; none is owned, each may be null.
+struct StageServices {
+    IStatusView* statusView = nullptr;
+    // Without one, the first failed move ends stage two.
+    IMoveRetryQuestion* retryQuestion = nullptr;
+    // Stage one stops at its next check once it is cancelled.
+    const CancellationToken* cancel = nullptr;
+};
+
 // Carries out one patch in two stages, so the installation is touched only
 // once everything it needs is on disk. PreparePatch builds every patched
 // and new file in the patched-files folder while the archives arrive;
@@ -33,68 +45,53 @@ protected:
 // short at any moment is finished by the next one.
 class PatchApplier {
 public:
-    PatchApplier() = default;
+    // Keeps the batch; the description and the progress record are
+    // borrowed for the applier's lifetime.
+    PatchApplier(const PatchBatch& batch, PatchInfoFile& description, PatchProgressFile& progress,
+                 const StageServices& services);
     PatchApplier(const PatchApplier&) = delete;
     PatchApplier& operator=(const PatchApplier&) = delete;
     virtual ~PatchApplier() = default;
 
-    // Keeps the arguments (none owned), clears a cancel request and counts
-    // the batch's items. The archive source may be null for a resumed batch.
-    void Init(PatchInfoFile* patchInfo, PatchProgressFile* progressFile, const std::string& installationFolder,
-              const std::string& patchedFilesFolder, const std::string& patchFolder, IStatusView* statusView,
-              IArchiveSource* archives);
-    // Who is asked when a move fails; without one (null) the first failed
-    // move ends stage two. Not owned; kept across Init.
-    void SetRetryQuestion(IMoveRetryQuestion* question) { retryQuestion = question; }
-    // Names in the installation (relative) that belong to the program, such
-    // as its installation record: no item may name them or lie inside them.
-    // The work folders and the progress record are protected anyway. Kept
-    // across Init.
-    void ProtectNames(const std::vector<std::string>& names) { protectedNames = names; }
-
-    // Stage one. Throws Exception on every failure; the installation is
-    // not changed. When it returns, every prepared file is on the disk.
-    void PreparePatch();
-    // Stage two. Throws Exception when a prepared file cannot be moved and
-    // the user gives up, or when an action cannot be recorded. When it
-    // returns, every change is on the disk.
-    void ApplyPatch();
+    // Stage one, with the archives as archives delivers them (it may still
+    // be fetching them). Throws Exception on every failure; the
+    // installation is not changed. When it returns, every prepared file is
+    // on the disk.
+    void PreparePatch(IArchiveSource& archives);
+    // Stage two, from the recorded action when resumeAt is given. Throws
+    // Exception when a prepared file cannot be moved and the user gives up,
+    // or when an action cannot be recorded. When it returns, every change
+    // is on the disk.
+    void ApplyPatch(const std::optional<ResumePoint>& resumeAt);
 
     // Throws Exception when any name of the batch may not touch the disk.
     // Both stages begin with it; stage two's caller calls it before it
     // writes anything of its own.
     void CheckItemPaths();
 
-    // From the window's thread: stage one stops at its next check.
-    void RequestCancel() { cancelRequested = true; }
-
 private:
     void CheckCancel() const;
     void ReportProgress(const std::string& path) const;
-    void WaitForArchive(const std::string& archiveName) const;
+    void WaitForArchive(IArchiveSource& archives, const std::string& archiveName) const;
     bool ShouldApply(const std::string& path);
     void Record(int32_t action, const std::string& path);
     void MoveWithRetry(const std::string& source, const std::string& destination);
     void RequireSafe(const std::string& path, const std::vector<std::string>& ownNames) const;
     void MakePreparedFilesDurable();
     void NoteChanged(const std::string& path);
-    void PrepareDiffFile(const std::string& path, const std::string& archive);
-    void PrepareNewFile(const std::string& path, const std::string& archive);
+    void PrepareDiffFile(IArchiveSource& archives, const std::string& path, const std::string& archive);
+    void PrepareNewFile(IArchiveSource& archives, const std::string& path, const std::string& archive);
     std::string DestinationOf(const std::string& preparedFile) const;
 
-    PatchInfoFile* patchInfo = nullptr;
-    PatchProgressFile* progressFile = nullptr;
-    std::string installationFolder;
-    std::string patchedFilesFolder;
-    std::string patchFolder;
-    IStatusView* statusView = nullptr;
-    IArchiveSource* archives = nullptr;
-    IMoveRetryQuestion* retryQuestion = nullptr;
-    std::vector<std::string> protectedNames;
+    const PatchBatch batch;
+    PatchInfoFile& patchInfo;
+    PatchProgressFile& progressFile;
+    const StageServices services;
+    // The recorded action a resumed stage two has yet to reach.
+    std::optional<ResumePoint> resumeAt;
     // Folders the moves changed, synced before stage two returns.
     std::set<std::string> changedFolders;
     int32_t filesDone = 0;
     int32_t filesTotal = 0;
-    std::atomic<bool> cancelRequested{false};
     int32_t actionCounter = 0;
 };

@@ -5,6 +5,8 @@
 
 #include "base/file_stream.h"
 
+class CancellationToken;
+
 // One member of a patch archive as its header describes it. An archive is
 // nothing but members back to back: a name length byte, the name, the data
 // size as 40 bits least significant byte first, and the LZMA data.
@@ -29,9 +31,11 @@ public:
     virtual ~PatchArchive() = default;
 
     // Creates (or empties) destinationPath, then decodes the first member
-    // named memberName into it. Throws Exception on every failure; a
-    // member that is not found leaves the destination empty.
-    void DecodeFile(const std::string& memberName, const std::string& destinationPath);
+    // named memberName into it. Throws Exception on every failure (a
+    // cancel, when cancel is given, is one); a member that is not found
+    // leaves the destination empty.
+    void DecodeFile(const std::string& memberName, const std::string& destinationPath,
+                    const CancellationToken* cancel = nullptr);
 
     // Scans the open archive from its start for the first member named
     // memberName (byte for byte, case counts) and leaves the stream at its

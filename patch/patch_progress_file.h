@@ -31,10 +31,6 @@ public:
     // A failure is logged at Error level and returns false.
     bool WriteRecord();
 
-    // Set from Recover's result by the updater; cleared by the applier once
-    // it reaches the recorded action.
-    bool resuming = false;
-
     std::string GetRecordPath() const { return recordPath; }
     std::string GetAlternativeRecordPath() const { return alternativeRecordPath; }
 

@@ -30,53 +30,38 @@ std::vector<std::string> ArchivesInFetchOrder(PatchInfoFile& info) {
     return names;
 }
 
-void PatchStages::Prepare(const PatchBatch& batch, IArchiveSource* source, IStatusView* view) {
-    applier.ProtectNames(batch.protectedNames);
-    applier.Init(&info, &progress, batch.installationFolder, batch.patchedFilesFolder, batch.patchFolder, view, source);
-    prepared = true;
-    applier.PreparePatch();
-}
+void PatchStages::Prepare(IArchiveSource& archives) { applier.PreparePatch(archives); }
 
-void PatchStages::Apply(const PatchBatch& batch, IStatusView* view, const VersionStore& storeVersion) {
-    // A resumed batch did not run stage one in this process.
-    if (!prepared) {
-        applier.ProtectNames(batch.protectedNames);
-        applier.Init(&info, &progress, batch.installationFolder, batch.patchedFilesFolder, batch.patchFolder, view,
-                     nullptr);
-    }
+void PatchStages::Apply(IInstallationRecords* records, const std::optional<ResumePoint>& resumeAt) {
     // A description changed since stage one must fail before the record.
     applier.CheckItemPaths();
-    progress.SetPatchPath(batch.patchFolder);
-    progress.SetPatchedFilesPath(batch.patchedFilesFolder);
-    progress.SetPatchUri(batch.patchUri);
-    progress.SetVersion(batch.version);
+    progressFile.SetPatchPath(work.patchFolder);
+    progressFile.SetPatchedFilesPath(work.patchedFilesFolder);
+    progressFile.SetPatchUri(work.location);
+    progressFile.SetVersion(work.version);
     // The record comes before the mark "-1": interrupted between the two,
     // the installation still carries its old version, so the next start
     // drops the record and the old installation stands. The other way
     // round it would find "-1" without a record and reinstall everything.
-    if (!progress.resuming) {
-        progress.SetActionIndex(-1);
-        progress.SetFile("");
-        if (!progress.WriteRecord()) {
-            throw Exception("Failed to write the progress record " + progress.GetRecordPath(), ErrorCode::StepFailed);
+    if (!resumeAt) {
+        progressFile.SetActionIndex(-1);
+        progressFile.SetFile("");
+        if (!progressFile.WriteRecord()) {
+            throw Exception("Failed to write the progress record " + progressFile.GetRecordPath(),
+                            ErrorCode::StepFailed);
         }
     }
-    Store(storeVersion, "-1");
-    applier.ApplyPatch();
-    Store(storeVersion, batch.version);
+    if (records != nullptr) records->StoreVersion("-1");
+    applier.ApplyPatch(resumeAt);
+    if (records != nullptr) records->StoreVersion(work.version);
     // The spare copy first: found alone, it would be taken for the record.
-    RemoveFile(progress.GetAlternativeRecordPath());
-    RemoveFile(progress.GetRecordPath());
-}
-
-void PatchStages::Store(const VersionStore& storeVersion, const std::string& version) {
-    if (storeVersion && !storeVersion(version)) {
-        throw Exception("Failed to store the installed version " + version, ErrorCode::StepFailed);
-    }
+    RemoveFile(progressFile.GetAlternativeRecordPath());
+    RemoveFile(progressFile.GetRecordPath());
+    if (records != nullptr) records->RecordInstalledBatch(work, info);
 }
 
 InterruptedBatch FindInterruptedBatch(const std::string& installedVersion, PatchProgressFile& progress) {
-    progress.resuming = false;
+    InterruptedBatch found;
     if (installedVersion != "-1") {
         // Stage two writes its first record before it marks the
         // installation as in change and removes the record only after it
@@ -88,12 +73,20 @@ InterruptedBatch FindInterruptedBatch(const std::string& installedVersion, Patch
                 RemoveFile(record);
             }
         }
-        return InterruptedBatch::None;
+        return found;
     }
+    found.kind = InterruptedBatch::Kind::Reinstall;
     try {
-        progress.resuming = progress.Recover();
+        if (!progress.Recover()) return found;
     } catch (const Exception& error) {
         LOG(Error) << error.message;
+        return found;
     }
-    return progress.resuming ? InterruptedBatch::Resume : InterruptedBatch::Reinstall;
+    found.kind = InterruptedBatch::Kind::Resume;
+    found.batch.patchFolder = progress.GetPatchPath();
+    found.batch.patchedFilesFolder = progress.GetPatchedFilesPath();
+    found.batch.location = progress.GetPatchUri();
+    found.batch.version = progress.GetVersion();
+    found.resumeAt = ResumePoint{progress.GetActionIndex(), progress.GetFile()};
+    return found;
 }

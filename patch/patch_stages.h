@@ -1,26 +1,15 @@
 #pragma once
 
-#include <functional>
+#include <optional>
 #include <string>
 #include <vector>
 
+#include "patch/patch_applier.h"
+#include "patch/patch_batch.h"
+
 class IArchiveSource;
-class IStatusView;
-class PatchApplier;
 class PatchInfoFile;
 class PatchProgressFile;
-
-// One patch or complete build as its two stages see it.
-struct PatchBatch {
-    std::string installationFolder;
-    std::string patchFolder;         // the archives arrive here
-    std::string patchedFilesFolder;  // stage one builds the new files here
-    std::string patchUri;            // where the archives come from, kept for a resume
-    std::string version;             // the version the batch leads to
-    // Names of the program's own in the installation (relative) that no
-    // item may touch, besides the work folders and the progress record.
-    std::vector<std::string> protectedNames;
-};
 
 // The archive names of a description in the order they are fetched: those
 // of "diff" items first, then those of "new" items, each name once (exact
@@ -28,42 +17,71 @@ struct PatchBatch {
 std::vector<std::string> ArchivesInFetchOrder(PatchInfoFile& info);
 
 // What an interrupted stage two left for the next start to do.
-enum class InterruptedBatch {
-    None,       // nothing (a leftover record beside a settled version is removed)
-    Resume,     // the record is loaded into the progress file: run stage two again
-    Reinstall,  // the installation is in change but its record is lost
+struct InterruptedBatch {
+    enum class Kind {
+        None,       // nothing (a leftover record beside a settled version is removed)
+        Resume,     // run stage two again from the record
+        Reinstall,  // the installation is in change but its record is lost
+    };
+    Kind kind = Kind::None;
+    // Resume: the batch as its record names it (folders, location, version;
+    // the installation folder and protected names are the caller's).
+    PatchBatch batch;
+    ResumePoint resumeAt;
 };
-// Decides from the installed version and the records in the progress
-// file's folder (set by the caller).
+// Reads the records in the progress file's folder (set by the caller)
+// beside the installed version.
 InterruptedBatch FindInterruptedBatch(const std::string& installedVersion, PatchProgressFile& progress);
 
-// The one place that knows the order of the two stages. The updater, the
-// publisher's tool and the tests all run a batch through it.
-class PatchStages {
+// What stage two keeps besides its progress record.
+class IInstallationRecords {
 public:
     // Stores the installed version ("-1" while stage two works) durably;
-    // false when it cannot. May be empty where no version is kept.
-    using VersionStore = std::function<bool(const std::string& version)>;
+    // throws Exception when it cannot.
+    virtual void StoreVersion(const std::string& version) = 0;
+    // The batch is installed and its new version stored: what it added is
+    // recorded. A failure here does not undo the batch.
+    virtual void RecordInstalledBatch(const PatchBatch& batch, PatchInfoFile& description) = 0;
 
-    PatchStages(PatchInfoFile& patchInfo, PatchProgressFile& progressFile, PatchApplier& patchApplier)
-        : info(patchInfo), progress(progressFile), applier(patchApplier) {}
+protected:
+    IInstallationRecords() = default;
+    IInstallationRecords(const IInstallationRecords&) = default;
+    IInstallationRecords& operator=(const IInstallationRecords&) = default;
+    ~IInstallationRecords() = default;
+};
+
+// The one place that knows the order of the two stages and of the records
+// they write. The updater, the publisher's tool and the tests all run a
+// batch through it.
+class PatchStages {
+public:
+    // The description and the progress record are borrowed.
+    PatchStages(const PatchBatch& batch, PatchInfoFile& description, PatchProgressFile& progress,
+                const StageServices& services)
+        : work(batch), info(description), progressFile(progress), applier(batch, description, progress, services) {}
 
     // Stage one: builds every changed and new file in the patched-files
-    // folder from the archives that source delivers (it may still be
+    // folder from the archives that archives delivers (it may still be
     // fetching them). The installation is not touched.
-    void Prepare(const PatchBatch& batch, IArchiveSource* source, IStatusView* view);
+    void Prepare(IArchiveSource& archives);
 
-    // Stage two: records the batch (unless a recovered record is being
-    // resumed), marks the installation as in change, applies the batch,
-    // stores the new version and removes the record. An interruption at
-    // any moment is finished by the next start (see FindInterruptedBatch).
-    void Apply(const PatchBatch& batch, IStatusView* view, const VersionStore& storeVersion);
+    // Stage two, writing the installation's records in this order:
+    //   1. the progress record of the batch (unless resumeAt continues a
+    //      recovered one),
+    //   2. the installed version "-1" (records may be null where no
+    //      version is kept),
+    //   3. each deletion and folder action behind its own progress record,
+    //      then the moves,
+    //   4. the new version,
+    //   5. the progress record removed,
+    //   6. what the batch installed (the uninstall record, the history).
+    // An interruption at any moment is finished by the next start (see
+    // FindInterruptedBatch).
+    void Apply(IInstallationRecords* records, const std::optional<ResumePoint>& resumeAt = std::nullopt);
 
 private:
-    static void Store(const VersionStore& storeVersion, const std::string& version);
-
+    const PatchBatch work;
     PatchInfoFile& info;
-    PatchProgressFile& progress;
-    PatchApplier& applier;
-    bool prepared = false;
+    PatchProgressFile& progressFile;
+    PatchApplier applier;
 };

@@ -5,6 +5,7 @@
 #include <new>
 #include <string>
 
+#include "base/cancellation.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
 #include "base/memory_stream.h"
@@ -76,12 +77,13 @@ VcdiffDecoder::VcdiffDecoder(FileStream* sourceStream, FileStream* deltaStream, 
 
 VcdiffDecoder::~VcdiffDecoder() = default;
 
-void VcdiffDecoder::Decode(FileStream* source, FileStream* delta, FileStream* target) {
+void VcdiffDecoder::Decode(FileStream* source, FileStream* delta, FileStream* target, const CancellationToken* cancel) {
     if (source == nullptr || delta == nullptr || target == nullptr) return;
     VcdiffDecoder decoder(source, delta, target);
     decoder.ReadHeader();
-    while (decoder.DecodeWindow()) {
-    }
+    do {
+        if (IsCancelled(cancel)) throw Exception("", ErrorCode::UserCancelled);
+    } while (decoder.DecodeWindow());
 }
 
 void VcdiffDecoder::ReadHeader() {

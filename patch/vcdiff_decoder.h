@@ -6,6 +6,7 @@
 #include "patch/address_cache.h"
 #include "patch/code_table.h"
 
+class CancellationToken;
 class FileStream;
 class MemoryStream;
 
@@ -43,8 +44,10 @@ public:
     virtual ~VcdiffDecoder();
 
     // Decodes the whole delta; does nothing if any stream is missing. Every
-    // failure is an Exception; windows written before it stay written.
-    static void Decode(FileStream* source, FileStream* delta, FileStream* target);
+    // failure is an Exception; windows written before it stay written. A
+    // cancel (cancel may be null) is noticed before each window.
+    static void Decode(FileStream* source, FileStream* delta, FileStream* target,
+                       const CancellationToken* cancel = nullptr);
 
     void ReadHeader();
     void ReadCodeTable();

@@ -4,7 +4,6 @@
 #include <thread>
 
 #include "base/encoding.h"
-#include "patch/lzma_decoder.h"
 #include "text/localization.h"
 
 void GuiManager::WaitWhileConfirming() {
@@ -39,13 +38,7 @@ bool GuiManager::ConfirmCancel(HitArea area) {
     confirming = true;
     const bool confirmed = ShowBox(Localize(ConfirmationTextKey(area)), MessageButtons::YesNo, MessageIcon::Question) ==
                            MessageAnswer::Yes;
-    if (confirmed) {
-        // Stops an LZMA member being unpacked now, which looks at no
-        // other flag.
-        quitRequested = true;
-        cancelled = true;
-        if (cancelable != nullptr) cancelable->Cancel();
-    }
+    if (confirmed && cancelable != nullptr) cancelable->Cancel();
     confirming = false;
     return confirmed;
 }

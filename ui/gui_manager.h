@@ -39,7 +39,7 @@ public:
 
     // Starts the UI thread and returns once its window exists (or the
     // thread has ended). cancelable, which may be null, is told when the
-    // player confirms a cancel. Throws Exception when the previous UI
+    // player confirms a cancel (and nothing else keeps that news). Throws Exception when the previous UI
     // thread still runs.
     void Start(ICancelable* cancelable);
     // Ends the UI thread and waits for it; nothing when none runs.
@@ -58,8 +58,6 @@ public:
     // Returns once the player has answered a confirmation the window put
     // up, if one is open; the bar is repainted meanwhile.
     void WaitWhileConfirming();
-    // True once the player confirmed a cancel.
-    bool IsCancelled() const { return cancelled; }
     // The main window; null while there is none (always on POSIX).
     WindowHandle GetWindowHandle() const;
 
@@ -88,6 +86,5 @@ private:
     mutable std::mutex statusMutex;  // the status text is read by the painting thread
     std::wstring statusText;
     std::atomic<bool> confirming{false};
-    std::atomic<bool> cancelled{false};
     ICancelable* cancelable = nullptr;
 };

@@ -61,6 +61,10 @@ void Uninstaller::AddFile(const std::string& path) { files.Add(path); }
 void Uninstaller::AddChanges(const std::string& patchInfoPath, bool qualify) {
     PatchInfoFile description;
     description.Load(patchInfoPath);
+    AddChanges(description, qualify);
+}
+
+void Uninstaller::AddChanges(PatchInfoFile& description, bool qualify) {
     if (hive == RegistryHive::None) hive = description.GetHive();
     if (registryPath.empty()) registryPath = description.GetRegistryPath();
     description.ResetIterators();

@@ -6,6 +6,8 @@
 
 #include "base/registry_hive.h"
 
+class PatchInfoFile;
+
 // The uninstall record ("Uninstall.xml"): everything the installer and the
 // patches put into the installation and no later patch took away - files,
 // directories, registry keys and groups - plus the hive and key of the
@@ -37,6 +39,7 @@ public:
     // registry names to the registry path; names that would leave the
     // installation folder are not recorded.
     void AddChanges(const std::string& patchInfoPath, bool qualify);
+    void AddChanges(PatchInfoFile& description, bool qualify);
     // Lists one full path unless it is already listed.
     void AddFile(const std::string& path);
     // Writes the record. Throws "Hive not supported" while the hive is not

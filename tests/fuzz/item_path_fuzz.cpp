@@ -4,6 +4,7 @@
 #include <filesystem>
 #include <vector>
 
+#include "base/archive_source.h"
 #include "base/item_path.h"
 #include "patch/patch_applier.h"
 #include "patch/patch_info_file.h"
@@ -48,13 +49,14 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
         info.Load(path);
         PatchProgressFile progress;
         progress.SetDirectory(install.string());
-        PatchApplier applier;
-        PatchStages stages(info, progress, applier);
         const std::string work = (install / "tempPatch").string();
-        const PatchBatch batch{install.string(), work, PathJoin(work, "patched"), "", "2", {}};
+        PatchStages stages({install.string(), work, PathJoin(work, "patched"), "", "2", {}}, info, progress, {});
         // No archive comes: stage two runs on what was prepared.
-        ExpectNoCrash([&] { stages.Prepare(batch, nullptr, nullptr); });
-        stages.Apply(batch, nullptr, nullptr);
+        struct : IArchiveSource {
+            ArchiveState WaitForArchive(const std::string&) override { return ArchiveState::Failed; }
+        } none;
+        ExpectNoCrash([&] { stages.Prepare(none); });
+        stages.Apply(nullptr);
     });
     // Only the installation and the file beside it may be in the folder.
     for (const auto& entry : fs::directory_iterator(root)) {

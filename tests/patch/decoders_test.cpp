@@ -10,6 +10,7 @@
 #include <utility>
 #include <vector>
 
+#include "base/cancellation.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
 #include "base/memory_stream.h"
@@ -25,6 +26,8 @@
 
 namespace {
 
+CancellationToken quit;
+
 // A memory stream over its own bytes, with room for at least capacity. Its
 // failingRead-th read throws, as a file does that cannot be read (negative:
 // the player asks to quit at that read), and it takes writes of nothing.
@@ -35,7 +38,7 @@ struct Bytes : MemoryStream {
     }
     uint32_t Read(void* destination, uint32_t count) override {
         if (++reads == failingRead) throw Exception("Failed to read data from file.");
-        if (reads == -failingRead) quitRequested = true;
+        if (reads == -failingRead) quit.Cancel();
         return MemoryStream::Read(destination, count);
     }
     uint32_t Write(const void* source, uint32_t count) override {
@@ -54,9 +57,9 @@ std::string Decode(const std::string& lzma, int failingRead = 0) {
     Bytes output("", 1 << 18);
     input.failingRead = failingRead;
     try {
-        DecodeLzma(input, output);
+        DecodeLzma(input, output, &quit);
     } catch (const Exception& error) {
-        quitRequested = false;
+        quit.Reset();
         return (error.Code() == ErrorCode::UserCancelled ? "cancelled: " : "error: ") + error.message;
     }
     return output.Written();

@@ -37,7 +37,7 @@ const Tree kTarget =
 
 TEST(StageOne, EndsEarlyWithAClearErrorAndTheInstallationUntouched) {
     const std::tuple<std::function<void(BatchRun&)>, ErrorCode, std::string> cases[] = {
-        {[](BatchRun& run) { run.onReport = [&run](const std::string&) { run.applier.RequestCancel(); }; },
+        {[](BatchRun& run) { run.onReport = [&run](const std::string&) { run.cancel.Cancel(); }; },
          ErrorCode::UserCancelled, ""},
         {[](BatchRun& run) { run.state = ArchiveState::Cancelled; }, ErrorCode::UserCancelled, ""},
         {[](BatchRun& run) { run.state = ArchiveState::Failed; }, ErrorCode::FileNotFound,

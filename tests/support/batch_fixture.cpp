@@ -195,14 +195,18 @@ BatchRun::BatchRun(const std::string& root)
     progress.SetDirectory(root);
 }
 
-void BatchRun::Apply() {
-    stages.Apply(work, this,
-                 [this](const std::string& version) { return ReplaceFileAtomically(versionFile, version); });
+PatchStages& BatchRun::Stages() {
+    if (!stages) stages.emplace(work, info, progress, StageServices{this, retryQuestion, &cancel});
+    return *stages;
+}
+
+void BatchRun::StoreVersion(const std::string& version) {
+    if (!ReplaceFileAtomically(versionFile, version)) throw std::runtime_error("cannot store the version");
 }
 
 void BatchRun::Resume() {
     const InterruptedBatch next = FindInterruptedBatch(ReadTextFile(versionFile), progress);
-    if (next == InterruptedBatch::Reinstall)
+    if (next.kind == InterruptedBatch::Kind::Reinstall)
         throw std::runtime_error("the next start would reinstall the complete build");
-    if (next == InterruptedBatch::Resume) Apply();
+    if (next.kind == InterruptedBatch::Kind::Resume) Apply(next.resumeAt);
 }

@@ -3,11 +3,13 @@
 #include <functional>
 #include <iosfwd>
 #include <map>
+#include <optional>
 #include <set>
 #include <string>
 #include <vector>
 
 #include "base/archive_source.h"
+#include "base/cancellation.h"
 #include "base/status_interfaces.h"
 #include "patch/patch_applier.h"
 #include "patch/patch_info_file.h"
@@ -56,8 +58,9 @@ private:
 
 // One run of the updater over a batch, its parts open to the test: the
 // archives are in place (state makes every wait end otherwise), the
-// applier's reports are kept and handed to onReport (a cancel, a crash).
-class BatchRun final : public IArchiveSource, public IStatusView {
+// applier's reports are kept and handed to onReport (a cancel, a crash),
+// the installed version is kept in the batch's version file.
+class BatchRun final : public IArchiveSource, public IStatusView, public IInstallationRecords {
 public:
     // The batch a TestBatch laid out below root (perhaps in another process).
     explicit BatchRun(const std::string& root);
@@ -69,19 +72,25 @@ public:
     }
     void OnFileProgress(const std::string&, uint32_t, uint32_t) override {}
     void OnFileDone(const std::string&) override {}
-    void Prepare() { stages.Prepare(work, this, this); }
-    void Apply();  // stage two, storing the version in the batch's file
+    void StoreVersion(const std::string& version) override;
+    void RecordInstalledBatch(const PatchBatch&, PatchInfoFile&) override {}
+    void Prepare() { Stages().Prepare(*this); }
+    void Apply(const std::optional<ResumePoint>& resumeAt = std::nullopt) { Stages().Apply(this, resumeAt); }
     // The next start after an interruption, by the updater's own decision:
     // stage two resumed from its record, or nothing; a reinstall throws.
     void Resume();
 
     const std::string versionFile;
-    PatchBatch work;
+    PatchBatch work;  // as it is when the run first prepares or applies
     PatchInfoFile info;
     PatchProgressFile progress;
-    PatchApplier applier;
-    PatchStages stages{info, progress, applier};
+    CancellationToken cancel;
+    IMoveRetryQuestion* retryQuestion = nullptr;
     ArchiveState state = ArchiveState::Arrived;
     std::function<void(const std::string& fileName)> onReport;
     std::vector<std::pair<std::string, int32_t>> reports;
+
+private:
+    PatchStages& Stages();
+    std::optional<PatchStages> stages;
 };

@@ -29,14 +29,13 @@ int Run(const std::vector<std::string>& args) {
     PatchInfoFile info;
     info.Load(description);
     int wrong = 0;
-    const std::atomic<bool> never{false};
     for (const std::string& name : ArchivesInFetchOrder(info)) {
         const auto declared = info.GetDeclaredArchives().find(name);
         Sha256Digest digest{};
         int64_t length = 0;
         if (declared == info.GetDeclaredArchives().end()) {
             std::printf("%s: not declared\n", name.c_str());
-        } else if (!Sha256OfFile(PathJoin(args[0], name), never, digest, length)) {
+        } else if (!Sha256OfFile(PathJoin(args[0], name), digest, length)) {
             std::printf("%s: cannot be read\n", name.c_str());
         } else if (length != declared->second.size ||
                    HexDigits(digest.data(), digest.size()) != declared->second.sha256) {

@@ -7,7 +7,6 @@
 #include "base/paths.h"
 #include "net/download_entry.h"
 #include "net/http_downloader.h"
-#include "patch/patch_applier.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
 #include "patch/patch_stages.h"
@@ -18,20 +17,19 @@ void ApplyPatchFolder(const std::string& patchDir, const std::string& installDir
     batch.installationFolder = installDir;
     batch.patchFolder = PathJoin(installDir, "tempPatch");
     batch.patchedFilesFolder = PathJoin(batch.patchFolder, "patched");
-    batch.patchUri = "file://" + NarrowEntryName(std::filesystem::absolute(ToFileSystemPath(patchDir)), patchDir);
+    batch.location = "file://" + NarrowEntryName(std::filesystem::absolute(ToFileSystemPath(patchDir)), patchDir);
     if (!MakeDirectories(batch.patchedFilesFolder)) throw Exception("Cannot create " + batch.patchedFilesFolder);
 
     PatchInfoFile info;
     info.Load(PathJoin(patchDir, "patchinfo.xml"));
     PatchProgressFile progress;
     progress.SetDirectory(installDir);
-    PatchApplier applier;
-    PatchStages stages(info, progress, applier);
+    PatchStages stages(batch, info, progress, StageServices{});
 
     HttpDownloader downloader;
-    const auto list = MakeDownloadList(ArchivesInFetchOrder(info), batch.patchUri, batch.patchFolder);
+    const auto list = MakeDownloadList(ArchivesInFetchOrder(info), batch.location, batch.patchFolder);
     if (!list.empty()) downloader.Start(list, false);
-    stages.Prepare(batch, &downloader, nullptr);
-    stages.Apply(batch, nullptr, nullptr);
+    stages.Prepare(downloader);
+    stages.Apply(nullptr);
     DeleteDirectory(batch.patchFolder, true);
 }

@@ -93,8 +93,7 @@ ArchiveRecord DescribeArchive(const std::string& folder, const std::string& name
     ArchiveRecord record;
     record.file = name;
     Sha256Digest digest{};
-    const std::atomic<bool> never{false};
-    if (!Sha256OfFile(PathJoin(folder, name), never, digest, record.size)) {
+    if (!Sha256OfFile(PathJoin(folder, name), digest, record.size)) {
         throw Exception("Cannot read back " + PathJoin(folder, name));
     }
     record.sha256 = HexDigits(digest.data(), digest.size());

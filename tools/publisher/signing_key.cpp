@@ -87,8 +87,7 @@ void SignPatchDescription(const std::string& folder, const P256PrivateKey& key) 
     const std::string description = PathJoin(folder, "patchinfo.xml");
     Sha256Digest digest{};
     int64_t length = 0;
-    const std::atomic<bool> never{false};
-    if (!Sha256OfFile(description, never, digest, length)) throw Exception("Cannot read " + description);
+    if (!Sha256OfFile(description, digest, length)) throw Exception("Cannot read " + description);
     const P256Signature signature = SignDigest(key, digest);
     // A key file whose two halves do not belong together would sign what
     // no updater accepts.

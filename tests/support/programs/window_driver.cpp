@@ -21,7 +21,6 @@
 
 #include "base/encoding.h"
 #include "base/log.h"
-#include "patch/lzma_decoder.h"
 #include "resources/resource_ids.h"
 #include "state/configuration.h"
 #include "state/registry_manager.h"
@@ -143,10 +142,9 @@ int main() {
             const std::string seen = Answer(number, L"");
             gui.WaitWhileConfirming();
             // After Yes the window's thread ends and takes the window.
-            for (int waited = 0; gui.IsCancelled() && IsWindow(window()) && waited < 5000; waited += 20) Sleep(20);
-            reply = "cancelled=" + std::to_string(gui.IsCancelled()) + " cancels=" + std::to_string(cancelable.calls) +
-                    " quit=" + std::to_string(quitRequested) + " window=" + std::to_string(IsWindow(window())) + " |" +
-                    seen;
+            for (int waited = 0; cancelable.calls > 0 && IsWindow(window()) && waited < 5000; waited += 20) Sleep(20);
+            reply = "cancels=" + std::to_string(cancelable.calls) + " window=" + std::to_string(IsWindow(window())) +
+                    " |" + seen;
         } else if (command == "ask") {
             reply = Answered(number, L"", [&] { return gui.AskYesNo(WidenFromCodePage(text)) ? "yes" : "no"; });
         } else if (command == "retry") {
