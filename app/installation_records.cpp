@@ -8,6 +8,7 @@
 #include "base/file_operations.h"
 #include "base/log.h"
 #include "base/paths.h"
+#include "base/record_names.h"
 #include "state/installation_data.h"
 #include "uninstall/uninstaller.h"
 

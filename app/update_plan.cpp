@@ -4,7 +4,9 @@
 
 #include "app/version_text.h"
 #include "base/exception.h"
+#include "base/log.h"
 #include "base/paths.h"
+#include "base/record_names.h"
 #include "net/location.h"
 #include "state/configuration.h"
 #include "state/installation_data.h"
@@ -34,12 +36,7 @@ bool InstallationNeedsUninstall(const std::string& patcherVersion) {
 namespace {
 
 PatchBatch BatchIn(const UpdateLayout& layout, const std::string& location, const std::string& version) {
-    return PatchBatch{layout.installationFolder,
-                      layout.patchFolder,
-                      layout.patchedFilesFolder,
-                      location,
-                      version,
-                      {kInstallationDataFileName, kUninstallRecordName}};
+    return PatchBatch{layout.installationFolder, layout.patchFolder, layout.patchedFilesFolder, location, version};
 }
 
 }  // namespace
@@ -54,11 +51,20 @@ UpdatePlan PlanUpdate(const UpdateFacts& facts, const UpdateLayout& layout) {
     switch (facts.interrupted.kind) {
         case InterruptedBatch::Kind::Resume: {
             const PatchBatch& recorded = facts.interrupted.batch;
-            plan.road = Road::Resume;
-            plan.batch = BatchIn(layout, recorded.location, recorded.version);
-            plan.batch.patchFolder = recorded.patchFolder;
-            plan.batch.patchedFilesFolder = recorded.patchedFilesFolder;
-            plan.resumeAt = facts.interrupted.resumeAt;
+            if (recorded.patchFolder != layout.patchFolder ||
+                recorded.patchedFilesFolder != layout.patchedFilesFolder) {
+                LOG(Error) << "The progress record names work folders that are not the program's: "
+                           << recorded.patchFolder << ", " << recorded.patchedFilesFolder;
+            } else if (!facts.recordedDescriptionFits) {
+                LOG(Error) << "The progress record's description cannot be resumed.";
+            } else {
+                plan.road = Road::Resume;
+                plan.batch = BatchIn(layout, recorded.location, recorded.version);
+                plan.resumeAt = facts.interrupted.resumeAt;
+                return plan;
+            }
+            plan.road = Road::Reinstall;
+            plan.batch = plan.completeBuild;
             return plan;
         }
         case InterruptedBatch::Kind::Reinstall:

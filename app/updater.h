@@ -68,31 +68,33 @@ private:
     void ConfirmPatch(const std::string& installedVersion, const std::string& latestVersion);
     void InstallPatch(const UpdatePlan& plan);
     // Asks whether to take the complete build instead of a patch that does
-    // not fit the installation; throws unless the player says Yes. Returns
-    // where the build's description was fetched (loaded into description).
-    std::string OfferCompleteBuild(const PatchBatch& build, PatchInfoFile& description, const Exception& failure);
+    // not fit the installation; throws unless the player says Yes. The
+    // build's description is fetched and checked for the question.
+    void OfferCompleteBuild(const PatchBatch& build, CheckedDescription& fetched, PatchInfoFile& description,
+                            const Exception& failure);
 
     // The version and the descriptions (updater_version_check.cpp).
     std::string CheckLatestVersion();
-    // Fetches the batch's description into folder, checks it and loads it
-    // into description; returns its path. Nothing is left on a failure.
-    std::string FetchDescription(const PatchBatch& batch, const std::string& folder, PatchInfoFile& description);
-    // The build's description, fetched into the temporary folder before
-    // the work folders exist; a missing one is BuildNotFound.
-    std::string FetchBuildDescription(const PatchBatch& build, PatchInfoFile& description);
-    // Through the run's downloader; false when the file did not arrive.
-    bool FetchOne(const DownloadEntry& entry);
-    void CheckDescriptionSignature(const std::string& location, const std::string& path);
-    void CheckDescriptionContent(const PatchBatch& batch, PatchInfoFile& description);
+    // Fetches the batch's description (and its signature in a program with
+    // a key), checks it and parses it into description.
+    void FetchDescription(const PatchBatch& batch, CheckedDescription& fetched, PatchInfoFile& description);
+    // The same for a complete build; a missing one is BuildNotFound.
+    void FetchBuildDescription(const PatchBatch& build, CheckedDescription& fetched, PatchInfoFile& description);
+    // The bytes at url, at most limit of them, through the run's downloader
+    // and a temporary file of its own; false when they did not arrive.
+    bool FetchBytes(const std::string& url, int64_t limit, bool signUrl, std::string& bytes);
+    // Throws CorruptData unless checked is what the program takes for a
+    // batch leading to version: signed by its key (when it has one) and
+    // saying so; parses it into description.
+    void CheckDescription(const CheckedDescription& checked, const std::string& version, PatchInfoFile& description);
 
     // One batch's two stages (updater_stages.cpp).
-    // Runs both stages of batch. description is loaded from fetchedPath (in
-    // the temporary folder) when that is given, else fetched into the
-    // batch's work folder.
-    void InstallBatch(const PatchBatch& batch, PatchInfoFile& description, const std::string& fetchedPath);
-    void ResumeBatch(const PatchBatch& batch, const ResumePoint& resumeAt);
+    // Runs both stages of batch, with its description as it was checked.
+    void InstallBatch(const PatchBatch& batch, const CheckedDescription& checked, PatchInfoFile& description);
+    void ResumeBatch(const PatchBatch& batch, const ResumePoint& resumeAt, const CheckedDescription& checked);
     void StageOne(PatchStages& stages, const PatchBatch& batch, PatchInfoFile& description);
-    void StageTwo(PatchStages& stages, const std::optional<ResumePoint>& resumeAt);
+    // Stage two, then the work folders go.
+    void StageTwo(PatchStages& stages, const PatchBatch& batch, const std::optional<ResumePoint>& resumeAt);
     // Stops the downloads and, unless the installation is in change (an
     // interrupted stage two keeps its files for the next start), removes
     // what the batch downloaded and prepared: an archive may be gigabytes.

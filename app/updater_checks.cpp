@@ -5,6 +5,7 @@
 #include "base/exception.h"
 #include "base/log.h"
 #include "base/paths.h"
+#include "base/record_names.h"
 #include "state/environment_checks.h"
 #include "state/processes.h"
 #include "text/localization.h"

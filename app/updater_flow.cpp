@@ -10,8 +10,11 @@
 #include "base/encoding.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
+#include "base/file_stream.h"
 #include "base/log.h"
 #include "base/paths.h"
+#include "base/record_names.h"
+#include "net/signature_check.h"
 #include "patch/patch_info_file.h"
 #include "text/localization.h"
 #include "uninstall/uninstaller.h"
@@ -36,7 +39,7 @@ void Updater::RunUpdate() {
                 return;
             case Road::Resume:
                 gui.SetStatusText(Localize("INSTALLER_PATCHING_AND_DOWNLOADING_STATUS"));
-                ResumeBatch(plan.batch, plan.resumeAt);
+                ResumeBatch(plan.batch, plan.resumeAt, facts.recordedDescription);
                 break;
             case Road::Patch:
                 ConfirmPatch(facts.installedVersion, facts.latestVersion);
@@ -45,13 +48,14 @@ void Updater::RunUpdate() {
                 break;
             case Road::Reinstall: {
                 gui.SetStatusText(Localize("INSTALLER_REINSTALLING_STATUS"));
+                CheckedDescription fetched;
                 PatchInfoFile description;
-                const std::string fetched = FetchBuildDescription(plan.batch, description);
+                FetchBuildDescription(plan.batch, fetched, description);
                 // The build replaces every file, so no record of an earlier
                 // batch may be resumed over it.
                 RemoveFile(progressFile.GetRecordPath());
                 RemoveFile(progressFile.GetAlternativeRecordPath());
-                InstallBatch(plan.batch, description, fetched);
+                InstallBatch(plan.batch, fetched, description);
                 break;
             }
         }
@@ -77,6 +81,25 @@ UpdateFacts Updater::ReadFacts() {
     facts.patcherVersion = installationData.patcherVersion;
     progressFile.SetDirectory(installDir);
     facts.interrupted = FindInterruptedBatch(facts.installedVersion, progressFile);
+    if (facts.interrupted.kind == InterruptedBatch::Kind::Resume) {
+        // Read from the program's own work folder and checked as a fetched
+        // one is, whatever folder the record names.
+        const std::string path =
+            PathJoin(MakeUpdateLayout(configuration, installDir).patchFolder, configuration.GetPatchInfoFilename());
+        CheckedDescription& recorded = facts.recordedDescription;
+        try {
+            if (!ReadFileBytes(path, kMaximumSignedFileSize, recorded.text) ||
+                (!publisherKey.empty() &&
+                 !ReadFileBytes(path + ".sig", kMaximumSignatureFileSize, recorded.signature))) {
+                throw Exception("The description of the interrupted patch cannot be read: " + path);
+            }
+            PatchInfoFile description;
+            CheckDescription(recorded, facts.interrupted.batch.version, description);
+            facts.recordedDescriptionFits = true;
+        } catch (const Exception& error) {
+            LOG_AS("Updater", Error) << error.message;
+        }
+    }
     return facts;
 }
 
@@ -94,13 +117,16 @@ void Updater::ConfirmPatch(const std::string& installedVersion, const std::strin
 
 void Updater::InstallPatch(const UpdatePlan& plan) {
     try {
+        CheckedDescription fetched;
         PatchInfoFile description;
-        InstallBatch(plan.batch, description, "");
+        FetchDescription(plan.batch, fetched, description);
+        InstallBatch(plan.batch, fetched, description);
     } catch (const Exception& error) {
         if (error.Code() != ErrorCode::DeltaFailed) throw;
+        CheckedDescription fetched;
         PatchInfoFile description;
-        const std::string fetched = OfferCompleteBuild(plan.completeBuild, description, error);
-        InstallBatch(plan.completeBuild, description, fetched);
+        OfferCompleteBuild(plan.completeBuild, fetched, description, error);
+        InstallBatch(plan.completeBuild, fetched, description);
     }
 }
 
@@ -108,11 +134,11 @@ void Updater::InstallPatch(const UpdatePlan& plan) {
 // player or a tool changed it). Nothing is installed yet, and the complete
 // build still leads to the latest version without the player having to
 // reinstall by hand.
-std::string Updater::OfferCompleteBuild(const PatchBatch& build, PatchInfoFile& description, const Exception& failure) {
+void Updater::OfferCompleteBuild(const PatchBatch& build, CheckedDescription& fetched, PatchInfoFile& description,
+                                 const Exception& failure) {
     LOG_AS("Updater", Error) << failure.message;
-    std::string fetched;
     try {
-        fetched = FetchBuildDescription(build, description);
+        FetchBuildDescription(build, fetched, description);
     } catch (const Exception& error) {
         // Without a complete build there is nothing to offer.
         if (error.Code() == ErrorCode::BuildNotFound) throw failure;
@@ -132,9 +158,7 @@ std::string Updater::OfferCompleteBuild(const PatchBatch& build, PatchInfoFile& 
         text += L"\n" + line;
     }
     if (!gui.AskYesNo(text)) {
-        RemoveFile(fetched);
         throw Exception("The complete build was declined. " + failure.message, ErrorCode::CorruptData);
     }
     gui.SetStatusText(Localize("INSTALLER_REINSTALLING_STATUS"));
-    return fetched;
 }

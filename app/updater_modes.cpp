@@ -6,6 +6,7 @@
 #include "base/file_operations.h"
 #include "base/log.h"
 #include "base/paths.h"
+#include "base/record_names.h"
 #include "state/processes.h"
 #include "text/localization.h"
 #include "ui/message_box.h"

@@ -4,6 +4,7 @@
 #include "app/installation_records.h"
 #include "app/temporary_files.h"
 #include "app/updater.h"
+#include "base/atomic_file.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/log.h"
@@ -12,40 +13,36 @@
 #include "patch/patch_stages.h"
 #include "text/localization.h"
 
-void Updater::InstallBatch(const PatchBatch& batch, PatchInfoFile& description, const std::string& fetchedPath) {
+void Updater::InstallBatch(const PatchBatch& batch, const CheckedDescription& checked, PatchInfoFile& description) {
     LOG_AS("Updater", Info) << "Patch URL:" << batch.location;
     try {
-        CleanTemporaryFiles(batch.patchFolder, batch.patchedFilesFolder);
         MakeDirectories(batch.patchFolder);
         MakeDirectories(batch.patchedFilesFolder);
-        if (fetchedPath.empty()) {
-            FetchDescription(batch, batch.patchFolder, description);
-        } else {
-            // Fetched into the temporary folder before the work folders
-            // existed.
-            MoveFileReplacing(fetchedPath, PathJoin(batch.patchFolder, configuration.GetPatchInfoFilename()));
+        // The checked bytes, durable before stage two's first record: a
+        // resume reads them back and checks them again.
+        const std::string path = PathJoin(batch.patchFolder, configuration.GetPatchInfoFilename());
+        if (!ReplaceFileAtomically(path, checked.text) ||
+            (!checked.signature.empty() && !ReplaceFileAtomically(path + ".sig", checked.signature))) {
+            throw Exception("Failed to write the patch description " + path, ErrorCode::StepFailed);
         }
         PatchStages stages(batch, description, progressFile, Services());
         StageOne(stages, batch, description);
         // A cancel confirmed while stage one finished must not let stage
         // two begin.
         quitRequested.ThrowIfCancelled("User cancelled before the installation was changed.");
-        StageTwo(stages, std::nullopt);
+        StageTwo(stages, batch, std::nullopt);
     } catch (const Exception&) {
-        if (!fetchedPath.empty()) RemoveFile(fetchedPath);
         AbandonBatch(batch);
         throw;
     }
-    CleanTemporaryFiles(batch.patchFolder, batch.patchedFilesFolder);
 }
 
-void Updater::ResumeBatch(const PatchBatch& batch, const ResumePoint& resumeAt) {
+void Updater::ResumeBatch(const PatchBatch& batch, const ResumePoint& resumeAt, const CheckedDescription& checked) {
     LOG_AS("Updater", Info) << "Patch URL:" << batch.location;
     PatchInfoFile description;
-    description.Load(PathJoin(batch.patchFolder, configuration.GetPatchInfoFilename()));
+    description.Parse(checked.text);
     PatchStages stages(batch, description, progressFile, Services());
-    StageTwo(stages, resumeAt);
-    CleanTemporaryFiles(batch.patchFolder, batch.patchedFilesFolder);
+    StageTwo(stages, batch, resumeAt);
 }
 
 void Updater::AbandonBatch(const PatchBatch& batch) {
@@ -75,11 +72,12 @@ void Updater::StageOne(PatchStages& stages, const PatchBatch& batch, PatchInfoFi
     stages.Prepare(downloader);
 }
 
-void Updater::StageTwo(PatchStages& stages, const std::optional<ResumePoint>& resumeAt) {
+void Updater::StageTwo(PatchStages& stages, const PatchBatch& batch, const std::optional<ResumePoint>& resumeAt) {
     const bool machineWide = registry.GetHive() == RegistryHive::LocalMachine;
     InstallationRecords records(installationData, UninstallOwner{registryKeyPath, productGuid, machineWide,
                                                                  arguments.internallyElevated ? arguments.sid : ""});
     stages.Apply(&records, resumeAt);
+    CleanTemporaryFiles(batch.patchFolder, batch.patchedFilesFolder);
 }
 
 bool Updater::CheckDiskSpace(const std::string& folder, int64_t required, const std::wstring& message, bool quiet) {

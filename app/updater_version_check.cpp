@@ -1,5 +1,6 @@
 // Which version is the latest, and fetching the description of the patch
-// or build that leads to it, checked before anything of it is used.
+// or build that leads to it: read once, checked, and parsed from the very
+// bytes that were checked.
 #include <algorithm>
 #include <chrono>
 #include <thread>
@@ -18,21 +19,9 @@
 
 namespace {
 
-// The file is downloaded; its first word is all that counts, so a few
-// kilobytes are plenty and a hostile file cannot make us read gigabytes.
-constexpr uint32_t kLatestVersionReadLimit = 64 * 1024;
-
-bool ReadStart(const std::string& path, std::string& text) {
-    try {
-        FileStream file;
-        file.Open(path);
-        text.resize(kLatestVersionReadLimit);
-        text.resize(file.Read(text.data(), kLatestVersionReadLimit));
-        return true;
-    } catch (const Exception&) {
-        return false;
-    }
-}
+// Its first word is all that counts: a hostile file cannot make us read
+// more.
+constexpr int64_t kLatestVersionFileLimit = 1024;
 
 }  // namespace
 
@@ -41,8 +30,10 @@ bool ReadStart(const std::string& path, std::string& text) {
 std::string Updater::CheckLatestVersion() {
     gui.SetStatusText(Localize("INSTALLER_RETRIEVING_VERSION_STATUS"));
     const std::string temp = MakeTempFileName("ivl");
+    DownloadEntry entry(configuration.GetLatestVersionUrl(), temp);
+    entry.sizeLimit = kLatestVersionFileLimit;
     downloader.SetStatusView(nullptr);
-    downloader.Download(configuration.GetLatestVersionUrl(), temp, false);
+    downloader.Start({entry}, false);
     if (firstVersionCheck) {
         // The first check shows the bar filling over three seconds while
         // the file arrives, and notices a cancel within 50 ms.
@@ -55,40 +46,37 @@ std::string Updater::CheckLatestVersion() {
         firstVersionCheck = false;
     }
     if (!downloader.WaitForWorker() || downloader.Entries().front().status != DownloadStatus::Done) {
+        RemoveFile(temp);
         quitRequested.ThrowIfCancelled("User cancelled during version check.");
         throw Exception("Failed to download latest version file.", ErrorCode::FileNotFound);
     }
     gui.SetProgressTotal(1000);
     std::string text;
-    if (!ReadStart(temp, text)) throw Exception("Failed to open latest version file.", ErrorCode::FileNotFound);
-    const std::string latest = FirstWord(text);
+    const bool read = ReadFileBytes(temp, kLatestVersionFileLimit, text);
     RemoveFile(temp);
+    if (!read) throw Exception("Failed to open latest version file.", ErrorCode::FileNotFound);
+    const std::string latest = FirstWord(text);
     if (latest.empty()) throw Exception("Failed to read latest version file.", ErrorCode::FileNotFound);
     return latest;
 }
 
-std::string Updater::FetchDescription(const PatchBatch& batch, const std::string& folder, PatchInfoFile& description) {
+void Updater::FetchDescription(const PatchBatch& batch, CheckedDescription& fetched, PatchInfoFile& description) {
     const std::string name = configuration.GetPatchInfoFilename();
-    const std::string path = PathJoin(folder.empty() ? GetTempDirectory() : folder, name);
-    if (!FetchOne(DownloadEntry(JoinLocation(batch.location, name), path))) {
+    if (!FetchBytes(JoinLocation(batch.location, name), kMaximumSignedFileSize, true, fetched.text)) {
         throw Exception("Failed to download patch info file.", ErrorCode::PatchNotFound);
     }
-    try {
-        // Not one element of an unsigned description is read when a
-        // signature is required.
-        if (!publisherKey.empty()) CheckDescriptionSignature(batch.location, path);
-        description.Load(path);
-        CheckDescriptionContent(batch, description);
-    } catch (const Exception&) {
-        RemoveFile(path);
-        throw;
+    // Not one element of an unsigned description is read when a signature
+    // is required.
+    if (!publisherKey.empty() &&
+        !FetchBytes(JoinLocation(batch.location, name + ".sig"), kMaximumSignatureFileSize, true, fetched.signature)) {
+        throw Exception("The patch description's signature could not be downloaded.", ErrorCode::CorruptData);
     }
-    return path;
+    CheckDescription(fetched, batch.version, description);
 }
 
-std::string Updater::FetchBuildDescription(const PatchBatch& build, PatchInfoFile& description) {
+void Updater::FetchBuildDescription(const PatchBatch& build, CheckedDescription& fetched, PatchInfoFile& description) {
     try {
-        return FetchDescription(build, "", description);
+        FetchDescription(build, fetched, description);
     } catch (const Exception& error) {
         if (error.Code() == ErrorCode::PatchNotFound)
             throw Exception("Could not find build.", ErrorCode::BuildNotFound);
@@ -96,36 +84,30 @@ std::string Updater::FetchBuildDescription(const PatchBatch& build, PatchInfoFil
     }
 }
 
-bool Updater::FetchOne(const DownloadEntry& entry) {
+bool Updater::FetchBytes(const std::string& url, int64_t limit, bool signUrl, std::string& bytes) {
+    const std::string temp = MakeTempFileName("ivl");
+    DownloadEntry entry(url, temp);
+    entry.sizeLimit = limit;
     downloader.SetStatusView(nullptr);
-    downloader.Start({entry}, true);
-    if (downloader.WaitForWorker() && downloader.Entries().front().status == DownloadStatus::Done) return true;
+    downloader.Start({entry}, signUrl);
+    const bool arrived = downloader.WaitForWorker() && downloader.Entries().front().status == DownloadStatus::Done &&
+                         ReadFileBytes(temp, limit, bytes);
+    RemoveFile(temp);
     quitRequested.ThrowIfCancelled("User cancelled while fetching the patch description.");
-    return false;
-}
-
-void Updater::CheckDescriptionSignature(const std::string& location, const std::string& path) {
-    const std::string name = configuration.GetPatchInfoFilename() + ".sig";
-    const std::string signaturePath = path + ".sig";
-    try {
-        if (!FetchOne(DownloadEntry(JoinLocation(location, name), signaturePath))) {
-            throw Exception("The patch description's signature could not be downloaded.", ErrorCode::CorruptData);
-        }
-        CheckFileSignature(path, signaturePath, publisherKey);
-    } catch (const Exception&) {
-        RemoveFile(signaturePath);
-        throw;
-    }
-    RemoveFile(signaturePath);
+    return arrived;
 }
 
 // What a signature cannot say by itself: that the description is the one
 // asked for, not an older one replayed, and that it vouches for every
 // archive it names.
-void Updater::CheckDescriptionContent(const PatchBatch& batch, PatchInfoFile& description) {
+void Updater::CheckDescription(const CheckedDescription& checked, const std::string& version,
+                               PatchInfoFile& description) {
+    const std::string name = configuration.GetPatchInfoFilename();
+    if (!publisherKey.empty()) CheckSignature(checked.text, checked.signature, publisherKey, name);
+    description.Parse(checked.text);
     const std::string& leadsTo = description.GetVersion();
-    if (leadsTo.empty() ? !publisherKey.empty() : leadsTo != batch.version) {
-        throw Exception("The patch description leads to version \"" + leadsTo + "\", not to " + batch.version + ".",
+    if (leadsTo.empty() ? !publisherKey.empty() : leadsTo != version) {
+        throw Exception("The patch description leads to version \"" + leadsTo + "\", not to " + version + ".",
                         ErrorCode::CorruptData);
     }
     if (publisherKey.empty()) return;

@@ -9,8 +9,11 @@ std::string PatchName(const std::string& baseVersion, const std::string& latestV
 std::string BuildName(const std::string& latestVersion) { return "build_" + latestVersion; }
 
 std::string FirstWord(const std::string& text) {
+    // An editor's byte-order mark would otherwise become part of every
+    // patch name asked for, and no such patch ever exists.
+    const size_t mark = text.compare(0, 3, "\xEF\xBB\xBF") == 0 ? 3 : 0;
     const char* const blanks = " \t\r\n";
-    const size_t start = text.find_first_not_of(blanks);
+    const size_t start = text.find_first_not_of(blanks, mark);
     if (start == std::string::npos) return "";
     return text.substr(start, text.find_first_of(blanks, start) - start);
 }

@@ -15,9 +15,9 @@ extern const char* const kPatchBaseVersion;
 std::string PatchName(const std::string& baseVersion, const std::string& latestVersion);
 std::string BuildName(const std::string& latestVersion);
 
-// The first word of the latest-version file: blanks, tabs and line breaks
-// before it are skipped, and it ends at the next one. Empty when the text
-// holds no word.
+// The first word of the latest-version file: a UTF-8 byte-order mark, then
+// blanks, tabs and line breaks before it are skipped, and it ends at the
+// next one. Empty when the text holds no word.
 std::string FirstWord(const std::string& text);
 
 // Whether the installed version is older than the latest. Versions are

@@ -76,3 +76,23 @@ void FileStream::Flush() {
     if (!handle.Flush()) throw Exception("Failed to flush file: " + name);
     if (IFileJournal* journal = GetFileJournal()) journal->Flushed(name);
 }
+
+bool ReadFileBytes(const std::string& path, int64_t limit, std::string& bytes) {
+    bytes.clear();
+    try {
+        FileStream file;
+        file.Open(path);
+        const int64_t length = file.GetLength();
+        if (length < 0 || length > limit) return false;
+        bytes.resize(static_cast<size_t>(length));
+        size_t done = 0;
+        while (done < bytes.size()) {
+            const uint32_t count = file.Read(&bytes[done], static_cast<uint32_t>(bytes.size() - done));
+            if (count == 0) return false;
+            done += count;
+        }
+        return true;
+    } catch (const Exception&) {
+        return false;
+    }
+}

@@ -50,3 +50,8 @@ private:
     int64_t filePointer = 0;
     std::string name;
 };
+
+// Reads the whole file at path into bytes, once: what is read is what the
+// caller checks and uses. False when it cannot be read or holds more than
+// limit bytes (then nothing of it is read).
+bool ReadFileBytes(const std::string& path, int64_t limit, std::string& bytes);

@@ -17,15 +17,27 @@ std::vector<std::string> SplitComponents(const std::string& path) {
     }
 }
 
+// The port numbers Windows takes after COM and LPT: 0-9 and the
+// superscripts one to three, as the system code page writes them (one
+// byte) and as UTF-8 does (two).
+bool IsPortNumber(const std::string& text) {
+    if (text.size() == 1) {
+        const auto byte = static_cast<unsigned char>(text[0]);
+        return (byte >= '0' && byte <= '9') || byte == 0xB9 || byte == 0xB2 || byte == 0xB3;
+    }
+    return text == "\xC2\xB9" || text == "\xC2\xB2" || text == "\xC2\xB3";
+}
+
 bool IsDeviceName(const std::string& component) {
-    // "CON.txt" opens the console just as "CON" does.
-    const std::string stem = ToLowerAscii(component.substr(0, component.find('.')));
-    static const char* const kDevices[] = {"con", "prn", "aux", "nul"};
+    // "CON.txt" opens the console just as "CON" does, and so do "CON .txt"
+    // and "CON..txt": Windows drops the blanks and dots that end the stem.
+    std::string stem = ToLowerAscii(component.substr(0, component.find('.')));
+    stem.erase(stem.find_last_not_of(' ') + 1);
+    static const char* const kDevices[] = {"con", "prn", "aux", "nul", "conin$", "conout$"};
     for (const char* device : kDevices) {
         if (stem == device) return true;
     }
-    return stem.size() == 4 && (stem.compare(0, 3, "com") == 0 || stem.compare(0, 3, "lpt") == 0) && stem[3] >= '1' &&
-           stem[3] <= '9';
+    return (stem.compare(0, 3, "com") == 0 || stem.compare(0, 3, "lpt") == 0) && IsPortNumber(stem.substr(3));
 }
 
 bool IsSafeComponent(const std::string& component) {

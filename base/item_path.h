@@ -13,8 +13,9 @@
 // - no root, drive letter, colon or UNC prefix;
 // - no wildcard or other character Windows forbids in names (* ? < > | "
 //   and control characters);
-// - no component that is a device name (CON, PRN, AUX, NUL, COM1-COM9,
-//   LPT1-LPT9, in any case, with or without an extension).
+// - no component that is a device name (CON, PRN, AUX, NUL, CONIN$,
+//   CONOUT$, COM and LPT with 0-9 or a superscript 1-3, in any case, with
+//   or without an extension, blanks before the extension included).
 // ownNames are relative paths the updater keeps for itself (its work
 // folders and records): the item may neither name one nor lie inside one
 // (compared by components, ignoring ASCII case as Windows does).

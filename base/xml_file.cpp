@@ -41,22 +41,7 @@ bool ParseXml(std::string text, TiXmlDocument& document) {
 bool LoadXmlFile(const std::string& path, TiXmlDocument& document) {
     document.Clear();
     std::string text;
-    try {
-        FileStream file;
-        file.Open(path);
-        const int64_t length = file.GetLength();
-        if (length > kMaximumXmlFileSize) return false;
-        text.resize(static_cast<size_t>(length));
-        size_t done = 0;
-        while (done < text.size()) {
-            const uint32_t n = file.Read(&text[done], static_cast<uint32_t>(text.size() - done));
-            if (n == 0) return false;
-            done += n;
-        }
-    } catch (const Exception&) {
-        return false;
-    }
-    return ParseXml(std::move(text), document);
+    return ReadFileBytes(path, kMaximumXmlFileSize, text) && ParseXml(std::move(text), document);
 }
 
 std::string PrintXml(const TiXmlDocument& document) {

@@ -28,12 +28,14 @@ struct DownloadEntry {
           localPath(other.localPath),
           declaredSize(other.declaredSize),
           declaredSha256(other.declaredSha256),
+          sizeLimit(other.sizeLimit),
           status(other.status.load()) {}
     DownloadEntry& operator=(const DownloadEntry& other) {
         url = other.url;
         localPath = other.localPath;
         declaredSize = other.declaredSize;
         declaredSha256 = other.declaredSha256;
+        sizeLimit = other.sizeLimit;
         status = other.status.load();
         return *this;
     }
@@ -45,6 +47,12 @@ struct DownloadEntry {
     // another size or SHA-256 is fetched once more, then given up (Corrupt).
     int64_t declaredSize = -1;   // -1: not declared
     std::string declaredSha256;  // 64 lower-case hexadecimal digits; empty: not declared
+    // The most bytes the caller will take from a file nobody declared: a
+    // larger one ends as Failed on every transport, and none of it stays.
+    int64_t sizeLimit = -1;  // -1: no limit
+    // The limit a transfer of this entry stops at: the declared size, else
+    // sizeLimit (-1: none).
+    int64_t TransferLimit() const { return declaredSize >= 0 ? declaredSize : sizeLimit; }
     std::atomic<DownloadStatus> status{DownloadStatus::Pending};
 };
 

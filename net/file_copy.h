@@ -11,9 +11,11 @@ class CancellationToken;
 
 // Copies the file a file:// address, UNC path or resolved relative path
 // names to localPath, overwriting it, with progress to statusView (may be
-// null) and a stop that cancels the copy. Logs a failure that no stop caused.
-DownloadStatus FileCopyTransfer(const std::string& url, const std::string& localPath, const CancellationToken& stop,
-                                IStatusView* statusView);
+// null) and a stop that cancels the copy. A source larger than sizeLimit
+// bytes (unless it is -1) is Failed and leaves nothing. Logs a failure
+// that no stop caused.
+DownloadStatus FileCopyTransfer(const std::string& url, const std::string& localPath, int64_t sizeLimit,
+                                const CancellationToken& stop, IStatusView* statusView);
 
 // Told the bytes copied so far and the source's size; returns false to
 // cancel the copy.

@@ -132,13 +132,13 @@ DownloadStatus HttpDownloader::Fetch(DownloadEntry& entry) {
     LOG(Trace) << "Downloading file: " << entry.url;
     switch (ClassifyLocation(entry.url)) {
         case LocationKind::Http:
-            return HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry.localPath, entry.declaredSize, stop,
+            return HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry.localPath, entry.TransferLimit(), stop,
                                 statusView);
         case LocationKind::Relative:
             entry.url = PathJoin(GetProgramFolder(), entry.url);
-            return FileCopyTransfer(entry.url, entry.localPath, stop, statusView);
+            return FileCopyTransfer(entry.url, entry.localPath, entry.TransferLimit(), stop, statusView);
         case LocationKind::FileCopy:
-            return FileCopyTransfer(entry.url, entry.localPath, stop, statusView);
+            return FileCopyTransfer(entry.url, entry.localPath, entry.TransferLimit(), stop, statusView);
         case LocationKind::Unsupported:
             break;
     }

@@ -13,28 +13,28 @@ namespace {
 
 }  // namespace
 
-void CheckFileSignature(const std::string& path, const std::string& signaturePath, const std::string& publicKeyPem) {
+void CheckSignature(const std::string& data, const std::string& signatureDer, const std::string& publicKeyPem,
+                    const std::string& name) {
     P256PublicKey key{};
     if (!ParsePublicKeyPem(publicKeyPem, key)) Refuse("The publisher key built into the program cannot be read.");
+    P256Signature signature{};
+    if (signatureDer.size() > kMaximumSignatureFileSize || !ParseSignatureDer(signatureDer, signature)) {
+        Refuse("The signature of " + name + " is not an ECDSA P-256 signature.");
+    }
+    Sha256 hash;
+    hash.Update(data.data(), data.size());
+    if (!VerifyP256Signature(key, hash.Finish(), signature)) {
+        Refuse("The signature of " + name + " does not match it and the publisher key.");
+    }
+    LOG(Info) << "Signature verified: " << name;
+}
 
-    std::string der(kMaximumSignatureFileSize + 1, '\0');
-    try {
-        FileStream file;
-        file.Open(signaturePath);
-        der.resize(file.Read(der.data(), static_cast<uint32_t>(der.size())));
-    } catch (const Exception&) {
+void CheckFileSignature(const std::string& path, const std::string& signaturePath, const std::string& publicKeyPem) {
+    std::string data;
+    std::string signature;
+    if (!ReadFileBytes(path, kMaximumSignedFileSize, data)) Refuse("The signed file " + path + " cannot be read.");
+    if (!ReadFileBytes(signaturePath, kMaximumSignatureFileSize, signature)) {
         Refuse("The signature file " + signaturePath + " cannot be read.");
     }
-    P256Signature signature{};
-    if (der.size() > kMaximumSignatureFileSize || !ParseSignatureDer(der, signature)) {
-        Refuse("The signature file " + signaturePath + " does not hold an ECDSA P-256 signature.");
-    }
-
-    Sha256Digest digest{};
-    int64_t length = 0;
-    if (!Sha256OfFile(path, digest, length)) Refuse("The signed file " + path + " cannot be read.");
-    if (!VerifyP256Signature(key, digest, signature)) {
-        Refuse("The signature in " + signaturePath + " does not match " + path + " and the publisher key.");
-    }
-    LOG(Info) << "Signature verified: " << path;
+    CheckSignature(data, signature, publicKeyPem, path);
 }

@@ -9,10 +9,17 @@
 // much larger is refused unread.
 constexpr int64_t kMaximumSignatureFileSize = 1024;
 
-// Throws Exception with CorruptData unless signaturePath holds a valid
-// ECDSA P-256 signature, by the key in publicKeyPem, over the SHA-256 of
-// the bytes of the file at path. The messages say which part failed: the
-// key, the signature file, or the match.
+// A signed file is a description: a file larger than the largest
+// description is refused unread.
+constexpr int64_t kMaximumSignedFileSize = 16 * 1024 * 1024;
+
+// Throws Exception with CorruptData unless signatureDer is a valid ECDSA
+// P-256 signature, by the key in publicKeyPem, over the SHA-256 of data
+// (called name in the messages). The messages say which part failed: the
+// key, the signature, or the match.
+void CheckSignature(const std::string& data, const std::string& signatureDer, const std::string& publicKeyPem,
+                    const std::string& name);
+// CheckSignature on the bytes of the files at path and signaturePath.
 void CheckFileSignature(const std::string& path, const std::string& signaturePath, const std::string& publicKeyPem);
 
 // The platform's ECDSA verification (CNG on Windows, OpenSSL elsewhere) of

@@ -8,6 +8,7 @@
 #include "base/item_path.h"
 #include "base/log.h"
 #include "base/paths.h"
+#include "base/record_names.h"
 #include "base/status_interfaces.h"
 #include "patch/patch_archive.h"
 #include "patch/patch_info_file.h"
@@ -82,9 +83,10 @@ void PatchApplier::RequireSafe(const std::string& path, const std::vector<std::s
 // Every name of the batch is checked before the first file is written or
 // deleted, so a hostile description fails without touching anything. An
 // item may not reach the updater's own work folders and records: deleting
-// the prepared files or the progress record half-way would lose the batch.
+// the prepared files or the progress record half-way would lose the batch,
+// and the installation data or the uninstall record the installation.
 void PatchApplier::CheckItemPaths() {
-    std::vector<std::string> ownNames = batch.protectedNames;
+    std::vector<std::string> ownNames = InstallationRecordNames();
     for (const std::string& folder : {batch.patchFolder, batch.patchedFilesFolder}) {
         const std::string relative = PathBelow(folder, batch.installationFolder);
         if (!relative.empty()) ownNames.push_back(relative);

@@ -2,7 +2,6 @@
 
 #include <cstdint>
 #include <string>
-#include <vector>
 
 // One patch or complete build, everything its two stages need to know:
 // made once when the run decides what to install, then passed by value.
@@ -12,15 +11,6 @@ struct PatchBatch {
     std::string patchedFilesFolder;  // stage one builds the new files here
     std::string location;            // where the archives come from, kept in the record for a resume
     std::string version;             // the version the batch leads to
-    // Names of the program's own in the installation (relative) that no
-    // item may touch, besides the work folders and the progress record.
-    std::vector<std::string> protectedNames;
-
-    bool operator==(const PatchBatch& other) const {
-        return installationFolder == other.installationFolder && patchFolder == other.patchFolder &&
-               patchedFilesFolder == other.patchedFilesFolder && location == other.location &&
-               version == other.version && protectedNames == other.protectedNames;
-    }
 };
 
 // Where an interrupted stage two starts again: the action its progress

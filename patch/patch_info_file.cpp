@@ -3,6 +3,7 @@
 #include <sstream>
 
 #include "base/exception.h"
+#include "base/file_stream.h"
 #include "base/xml_file.h"
 
 namespace {
@@ -66,6 +67,12 @@ void AppendList(TiXmlElement& root, const char* name, const std::vector<std::str
 }  // namespace
 
 void PatchInfoFile::Load(const std::string& path) {
+    std::string text;
+    if (!ReadFileBytes(path, kMaximumXmlFileSize, text)) throw Exception("Failed to load patch info file.");
+    Parse(std::move(text));
+}
+
+void PatchInfoFile::Parse(std::string text) {
     root = nullptr;
     for (const TiXmlElement*& cursor : cursors) cursor = nullptr;
     hive = RegistryHive::LocalMachine;
@@ -74,10 +81,9 @@ void PatchInfoFile::Load(const std::string& path) {
     version.clear();
     declaredArchives.clear();
 
-    if (!LoadXmlFile(path, document)) throw Exception("Failed to load patch info file.");
+    if (!ParseXml(std::move(text), document)) throw Exception("Failed to load patch info file.");
     root = document.RootElement();
 
-    std::string text;
     if (ReadElementText(root, "RegistryHive", text)) hive = ParseHive(text);
     if (ReadElementText(root, "RegistryPath", text)) registryPath = text;
     if (ReadElementText(root, "SpaceRequirement", text)) {

@@ -36,6 +36,9 @@ public:
     // is not well formed. The cursors are left at their ends until
     // ResetIterators.
     void Load(const std::string& path);
+    // Load from the text of a description (the very bytes that were
+    // checked), with the same outcomes.
+    void Parse(std::string text);
     // Puts every cursor on the first item of its list.
     void ResetIterators();
     // Items of FileChanges plus items of DirectoryChanges, of every kind.

@@ -8,6 +8,7 @@
 #include "base/file_operations.h"
 #include "base/log.h"
 #include "base/paths.h"
+#include "base/record_names.h"
 #include "base/xml_file.h"
 
 namespace {
@@ -38,8 +39,8 @@ std::string TextOrEmpty(const TiXmlElement* root, const char* name) {
 
 void PatchProgressFile::SetDirectory(const std::string& directory) {
     folder = directory;
-    recordPath = PathJoin(folder, "PPF.xml");
-    alternativeRecordPath = PathJoin(folder, "_PPF.xml");
+    recordPath = PathJoin(folder, kProgressRecordName);
+    alternativeRecordPath = PathJoin(folder, kSpareProgressRecordName);
 }
 
 void PatchProgressFile::LoadRecord(const std::string& path) {

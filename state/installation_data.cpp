@@ -5,9 +5,9 @@
 
 #include "base/exception.h"
 #include "base/paths.h"
+#include "base/record_names.h"
 #include "base/xml_file.h"
 
-const char* const kInstallationDataFileName = "InstallationData.xml";
 
 namespace {
 

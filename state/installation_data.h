@@ -8,8 +8,6 @@
 // applied), the version of the updater that wrote it, the licence versions
 // the user accepted, an edition label and a map of file digests. The flow
 // reads and assigns the members directly.
-// "InstallationData.xml", the record's name in the installation folder.
-extern const char* const kInstallationDataFileName;
 
 class InstallationData {
 public:

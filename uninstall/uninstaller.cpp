@@ -8,7 +8,6 @@
 #include "base/paths.h"
 #include "patch/patch_info_file.h"
 
-const char* const kUninstallRecordName = "Uninstall.xml";
 
 namespace {
 

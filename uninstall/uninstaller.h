@@ -12,8 +12,6 @@ class PatchInfoFile;
 // patches put into the installation and no later patch took away - files,
 // directories, registry keys and groups - plus the hive and key of the
 // game's settings. Written in the patch description's schema.
-// "Uninstall.xml", the record's name in the installation folder.
-extern const char* const kUninstallRecordName;
 
 class Uninstaller {
 public:

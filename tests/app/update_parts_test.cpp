@@ -17,6 +17,7 @@ namespace {
 TEST(VersionText, FirstWord) {
     EXPECT_EQ(FirstWord("  \t\r\n12 and more"), "12");
     EXPECT_EQ(FirstWord(" \n"), "");
+    EXPECT_EQ(FirstWord("\xEF\xBB\xBF 3\r\n"), "3");
 }
 
 TEST(OverallProgress, CompleteArchivesFillTheirSharesAndTheCurrentOneItsPart) {

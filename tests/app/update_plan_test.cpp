@@ -3,10 +3,11 @@
 
 #include "app/update_plan.h"
 #include "base/exception.h"
+#include "base/paths.h"
 
 namespace {
 
-const UpdateLayout kLayout{"C:\\Game", "C:\\Game\\tempPatch", "C:\\Game\\tempPatch\\patched", "http://host",
+const UpdateLayout kLayout{"Game", PathJoin("Game", "tempPatch"), PathJoin("Game", "tempPatch/patched"), "http://host",
                            "http://builds"};
 
 struct Case {
@@ -14,9 +15,11 @@ struct Case {
     const char* patcher;
     const char* latest;
     InterruptedBatch::Kind interrupted;
-    Road road;             // when it does not throw
-    const char* location;  // of the batch
-    ErrorCode error;       // None: no throw
+    Road road;                    // when it does not throw
+    const char* location;         // of the batch
+    ErrorCode error;              // None: no throw
+    bool foreignFolders = false;  // the record names work folders beside the program's
+    bool descriptionFits = true;
 };
 
 TEST(UpdatePlan, DecidesTheRoadAndItsBatch) {
@@ -35,9 +38,12 @@ TEST(UpdatePlan, DecidesTheRoadAndItsBatch) {
         {"beta", "3", "gamma", Kind::None, Road::Patch, "http://host/patch_515195_gamma", ErrorCode::None},
         {"10", "3", "9a", Kind::None, Road::Patch, "http://host/patch_515195_9a", ErrorCode::None},
         {"", "3", "2", Kind::None, Road::UpToDate, "", ErrorCode::NoLocalVersion},
-        // An interrupted stage two: its record, or the complete build when the record is lost.
+        // An interrupted stage two: its record, or the complete build when the record is lost, names work folders
+        // other than the program's, or its description does not fit it.
         {"-1", "3", "3", Kind::Resume, Road::Resume, "http://host/patch_515195_2", ErrorCode::None},
         {"-1", "3", "2", Kind::Reinstall, Road::Reinstall, build2, ErrorCode::None},
+        {"-1", "3", "2", Kind::Resume, Road::Reinstall, build2, ErrorCode::None, true},
+        {"-1", "3", "2", Kind::Resume, Road::Reinstall, build2, ErrorCode::None, false, false},
         // The updater that recorded the installation: older or unreadable (1.0), newer.
         {"1", "3.0", "2", Kind::None, Road::Patch, patch2, ErrorCode::None},
         {"1", "2.5", "2", Kind::None, Road::UpToDate, "", ErrorCode::CorruptData},
@@ -46,10 +52,15 @@ TEST(UpdatePlan, DecidesTheRoadAndItsBatch) {
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(std::string(c.installed) + " -> " + c.latest);
-        UpdateFacts facts{c.installed, c.patcher, c.latest, {}};
+        UpdateFacts facts;
+        facts.installedVersion = c.installed;
+        facts.patcherVersion = c.patcher;
+        facts.latestVersion = c.latest;
         facts.interrupted.kind = c.interrupted;
-        facts.interrupted.batch = {"", "D:\\recorded", "D:\\recorded\\patched", "http://host/patch_515195_2", "2", {}};
+        const std::string work = c.foreignFolders ? PathJoin("Documents", "tempPatch") : kLayout.patchFolder;
+        facts.interrupted.batch = {"", work, PathJoin(work, "patched"), "http://host/patch_515195_2", "2"};
         facts.interrupted.resumeAt = {4, "data\\old.pak"};
+        facts.recordedDescriptionFits = c.descriptionFits;
         try {
             const UpdatePlan plan = PlanUpdate(facts, kLayout);
             EXPECT_EQ(c.error, ErrorCode::None);
@@ -58,17 +69,16 @@ TEST(UpdatePlan, DecidesTheRoadAndItsBatch) {
             EXPECT_EQ(plan.completeBuild.location, std::string("http://builds/build_") + c.latest);
             if (c.road == Road::UpToDate) continue;
             EXPECT_EQ(plan.batch.installationFolder, kLayout.installationFolder);
-            EXPECT_EQ(plan.batch.protectedNames, (std::vector<std::string>{"InstallationData.xml", "Uninstall.xml"}));
             if (c.road == Road::Resume) {
                 EXPECT_EQ(plan.batch.version, "2");  // the record's, not the server's
-                EXPECT_EQ(plan.batch.patchFolder, "D:\\recorded");
                 EXPECT_EQ(plan.resumeAt.actionIndex, 4);
                 EXPECT_EQ(plan.resumeAt.file, "data\\old.pak");
             } else {
                 EXPECT_EQ(plan.batch.version, c.latest);
-                EXPECT_EQ(plan.batch.patchFolder, kLayout.patchFolder);
-                EXPECT_EQ(plan.batch.patchedFilesFolder, kLayout.patchedFilesFolder);
             }
+            // Whatever a record names, the work happens in the program's own folders.
+            EXPECT_EQ(plan.batch.patchFolder, kLayout.patchFolder);
+            EXPECT_EQ(plan.batch.patchedFilesFolder, kLayout.patchedFilesFolder);
         } catch (const Exception& error) {
             EXPECT_EQ(error.Code(), c.error) << error.message;
         }

@@ -50,7 +50,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
         PatchProgressFile progress;
         progress.SetDirectory(install.string());
         const std::string work = (install / "tempPatch").string();
-        PatchStages stages({install.string(), work, PathJoin(work, "patched"), "", "2", {}}, info, progress, {});
+        PatchStages stages({install.string(), work, PathJoin(work, "patched"), "", "2"}, info, progress, {});
         // No archive comes: stage two runs on what was prepared.
         struct : IArchiveSource {
             ArchiveState WaitForArchive(const std::string&) override { return ArchiveState::Failed; }

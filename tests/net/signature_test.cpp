@@ -68,7 +68,7 @@ TEST(FileSignature, PassesOnlyTheKeysOwnSignatureOverTheseBytes) {
         {"checked with another key", [&](Signed& s) { s.keyPem = PublicKeyPem(other.publicKey); }, "does not match"},
         {"no signature file", [](Signed& s) { s.signature = "missing"; }, "cannot be read"},
         {"a needless zero", [](Signed& s) { s.signature = Unhex("3007020200010201") + std::string(1, '\x01'); },
-         "does not hold"},
+         "is not an ECDSA"},
         {"no public key built in", [](Signed& s) { s.keyPem = "-----BEGIN PUBLIC KEY-----\n-----END PUBLIC KEY-----"; },
          "The publisher key built into the program cannot be read."},
     };

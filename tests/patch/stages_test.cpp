@@ -144,12 +144,14 @@ TEST(Kill, StageTwoKilledAtSeededMomentsIsFinishedByTheNextStart) {
 const char* const kHostileNames[] = {
     "", ".", ".\\", "./.", "a\\..\\b", "..", "\\rooted", "/rooted", "C:\\x", "C:x", "\\\\host\\share\\x",
     "a\\\\b", "*", "dat?", "*.*", "a<b", "a>b", "a|b", "a&#34;b", "a&#9;b", "trailing.", "trailing ", "dir.\\x",
-    "CON", "con.txt", "Aux\\x", "nul", "COM1", "lpt9.dat", "prn",
+    "CON", "con.txt", "Aux\\x", "nul", "COM1", "lpt9.dat", "prn", "NUL .txt", "aux  .log", "con..x", "CONIN$",
+    "conout$.txt", "COM0", "com\xB9", "LPT\xC2\xB3.txt",
 };
 // clang-format on
 
 // The updater's own work folder and records, which items may not reach.
-const char* const kOwnNames[] = {"tempPatch", "TEMPPATCH\\patched\\x", "PPF.xml", "_ppf.xml", "InstallationData.xml"};
+const char* const kOwnNames[] = {"tempPatch", "TEMPPATCH\\patched\\x", "PPF.xml",
+                                 "_ppf.xml",  "InstallationData.xml",    "uninstall.XML"};
 
 // Where the hostile name goes: each item kind's path, or a file's archive.
 const char* const kItems[] = {
@@ -184,8 +186,7 @@ protected:
                                                   Replace(items, "VICTIM", R"(<delete Path="victim.txt" />)") +
                                                   "</IronvaleWestPatch>");
         BatchRun run(temp.Path());
-        run.work = {install, PathJoin(install, "tempPatch"), PathJoin(install, "tempPatch/patched"), "served",
-                    "2",     {"InstallationData.xml"}};
+        run.work = {install, PathJoin(install, "tempPatch"), PathJoin(install, "tempPatch/patched"), "served", "2"};
         run.progress.SetDirectory(install);
         stageOne ? run.Prepare() : run.Apply();
     }

@@ -190,7 +190,7 @@ void TestBatch::WriteInfo() const { WritePatchDescription(description, root / "p
 
 BatchRun::BatchRun(const std::string& root)
     : versionFile(PathJoin(root, "version")),
-      work{PathJoin(root, "install"), PathJoin(root, "patch"), PathJoin(root, "patched"), "", "2", {}} {
+      work{PathJoin(root, "install"), PathJoin(root, "patch"), PathJoin(root, "patched"), "", "2"} {
     info.Load(PathJoin(root, "patchinfo.xml"));
     progress.SetDirectory(root);
 }

@@ -8,6 +8,7 @@
 #include "base/file_stream.h"
 #include "base/item_path.h"
 #include "base/paths.h"
+#include "base/record_names.h"
 
 namespace {
 
@@ -16,8 +17,11 @@ constexpr size_t kMaximumPathLength = 255;
 
 // What the updater keeps for itself in an installation: its work folder
 // and its records. The updater refuses a patch that names them.
-const std::vector<std::string> kUpdaterOwnNames = {"tempPatch", "PPF.xml", "_PPF.xml", "InstallationData.xml",
-                                                   "Uninstall.xml"};
+std::vector<std::string> UpdaterOwnNames() {
+    std::vector<std::string> names = InstallationRecordNames();
+    names.push_back("tempPatch");
+    return names;
+}
 
 void CheckRelativePath(const std::string& relative, const std::string& name) {
     if (name.find_first_of("\\:") != std::string::npos) {
@@ -26,7 +30,7 @@ void CheckRelativePath(const std::string& relative, const std::string& name) {
     if (relative.size() > kMaximumPathLength) {
         throw Exception("A patch cannot carry a path longer than 255 bytes: " + relative);
     }
-    if (!IsSafeItemPath(relative, kUpdaterOwnNames)) {
+    if (!IsSafeItemPath(relative, UpdaterOwnNames())) {
         throw Exception("A patch cannot carry this name (the updater would refuse it): " + relative);
     }
 }
