@@ -23,10 +23,12 @@ ProgramCall ElevatedCall(const std::string& parameters, const std::string& progr
 
 std::string GameParameters(const std::string& configured, const std::string& sessionId, const std::string& dataCenters,
                            const std::string& hostName) {
+    // The values come from the command line: each stays one argument,
+    // whatever it holds.
     std::string parameters = configured;
-    if (!sessionId.empty()) parameters += " +sessionId " + sessionId;
-    if (!dataCenters.empty()) parameters += " +dataCenters " + dataCenters;
-    if (!hostName.empty()) parameters += " +webSiteHostName " + hostName;
+    if (!sessionId.empty()) parameters += " +sessionId " + QuoteArgument(sessionId);
+    if (!dataCenters.empty()) parameters += " +dataCenters " + QuoteArgument(dataCenters);
+    if (!hostName.empty()) parameters += " +webSiteHostName " + QuoteArgument(hostName);
     return parameters;
 }
 

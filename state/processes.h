@@ -32,7 +32,7 @@ ProgramCall ElevatedCall(const std::string& parameters, const std::string& progr
 
 // The game's command line: the configured parameters, then " +sessionId ",
 // " +dataCenters " and " +webSiteHostName " each with its value, for each
-// value that is not empty.
+// value that is not empty, quoted as one argument (QuoteArgument).
 std::string GameParameters(const std::string& configured, const std::string& sessionId, const std::string& dataCenters,
                            const std::string& hostName);
 

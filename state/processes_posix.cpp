@@ -12,7 +12,8 @@
 extern char** environ;
 
 int32_t RunProcess(const std::string& programPath, const std::string& parameters, bool wait) {
-    std::vector<std::string> words = SplitCommandLine(parameters);
+    // The words the program's C runtime would read on Windows.
+    std::vector<std::string> words = SplitArguments(parameters);
     std::string program = programPath;
     if (program.empty()) {
         if (words.empty()) return -1;

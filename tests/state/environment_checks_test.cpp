@@ -4,6 +4,7 @@
 
 #include <gtest/gtest.h>
 
+#include "base/command_line.h"
 #include "state/processes.h"
 
 namespace {
@@ -75,6 +76,10 @@ TEST(Processes, CommandLinesOfTheElevatedCopyAndTheGame) {
     EXPECT_EQ(ElevatedCall("-x", "p.exe").parameters, "-x");
     EXPECT_EQ(GameParameters("-windowed", "s1", "", "host"), "-windowed +sessionId s1 +webSiteHostName host");
     EXPECT_EQ(GameParameters("", "", "eu,us", ""), " +dataCenters eu,us");
+    // A value never becomes two arguments, whatever it holds.
+    const std::string injected = "example.com +sessionId stolen", tricky = "a\\\" \\";
+    EXPECT_EQ(SplitArguments(GameParameters("-windowed", tricky, "", injected)),
+              (std::vector<std::string>{"-windowed", "+sessionId", tricky, "+webSiteHostName", injected}));
 }
 
 }  // namespace
