@@ -271,6 +271,65 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
     }
 }
 
+// What an interrupted stage two left is data, not instructions: a record naming folders beside the installation, a
+// version its description does not lead to, or a description the keyed program cannot verify is never followed; the
+// next start installs the complete build, and nothing outside the installation changes.
+TEST_F(UpdateRun, ResumesAnInterruptedPatchOnlyFromItsOwnCheckedState) {
+    const P256PrivateKey signer = LoadSigningKey(IRONVALE_BINARY_DIR "/test-key/private.pem");
+    const auto record = [&](const char* element, const std::string& value) {
+        return [=] {
+            Edit(PathJoin(install, "PPF.xml"), [&](std::string& text) {
+                text = std::regex_replace(text, std::regex("<" + std::string(element) + ">[^<]*<"),
+                                          "<" + std::string(element) + ">" + value + "<");
+            });
+        };
+    };
+    const std::string documents = temp / "documents";
+    const struct {
+        const char* what;
+        std::function<void()> tamper;
+        const char* program;
+        bool resumed;
+    } cases[] = {
+        {"as it was left", nullptr, "keyed_updater", true},
+        {"prepared files beside the game", record("PatchedFilesPath", documents), "served_updater", false},
+        {"both work folders beside the game",
+         [&] {
+             record("PatchPath", documents)();
+             record("PatchedFilesPath", documents)();
+         },
+         "served_updater", false},
+        {"a version its description does not lead to", record("Version", "3"), "served_updater", false},
+        {"the description changed since it was checked",
+         [&] { Edit(PathJoin(install, "tempPatch/patchinfo.xml"), [](std::string& t) { t += "<!-- -->"; }); },
+         "keyed_updater", false},
+        {"an unsigned description", [&] { RemoveFile(PathJoin(install, "tempPatch/patchinfo.xml.sig")); },
+         "keyed_updater", false},
+    };
+    Publish(Version(1), Version(2), "2", &signer);
+    std::string added;  // a file the patch adds: a folder in its way stops the moves
+    for (const auto& file : Version(2).files) {
+        if (Version(1).files.count(file.first) == 0) added = PathJoin(install, file.first);
+    }
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        Install(Version(1), "1");
+        WriteTree(added, TreeOf("in the way.txt=x"));
+        Run("y\nc\n", {"-latestVersion", "2"}, c.program);  // Cancel at the retry question
+        ASSERT_EQ(InstalledVersion(), "-1");
+        DeleteDirectory(added, true);
+        WriteTree(documents, TreeOf("letter.txt=mine|saves/slot1.sav=progress"));
+        if (c.tamper) c.tamper();
+        const size_t requests = server.Requests().size();
+        Run("n\n", {"-latestVersion", "2"}, c.program);
+        EXPECT_EQ(InstalledVersion(), "2");
+        EXPECT_EQ(Game(), Version(2));
+        EXPECT_EQ(ReadTree(documents), TreeOf("letter.txt=mine|saves/slot1.sav=progress"));
+        EXPECT_EQ(ArchiveRequests(requests) == 0, c.resumed);  // the complete build fetches its archives
+        ExpectNoLeftovers();
+    }
+}
+
 // The updater killed at seeded moments of a whole run, then started again: the new version, nothing left.
 TEST_F(UpdateRun, KilledAtAnyMomentTheNextStartsFinishTheUpdate) {
     Publish(Version(1), Version(2), "2", nullptr);
