@@ -17,6 +17,7 @@ void AppendUpdateHistory(const std::string& installDir, const std::string& locat
         history.Seek(0, 2);
         const std::string line = FormatHistoryLine(GetLocalTimeNow(), location);
         history.Write(line.data(), static_cast<uint32_t>(line.size()));
+        history.Flush();
     } catch (const Exception&) {
         // The history is a courtesy; the update stands without it.
     }

@@ -6,6 +6,7 @@
 #include "base/exception.h"
 #include "base/log.h"
 #include "base/paths.h"
+#include "base/version_order.h"
 #include "base/record_names.h"
 #include "net/location.h"
 #include "state/configuration.h"

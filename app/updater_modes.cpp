@@ -3,6 +3,7 @@
 // clean-up that removes what the uninstall record lists.
 #include "app/temporary_files.h"
 #include "app/updater.h"
+#include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/log.h"
 #include "base/paths.h"
@@ -58,7 +59,13 @@ int32_t Updater::RunUninstallCleanup() {
     RemoveFile(PathJoin(folder, "GL.ini"));
     DeleteDirectory(PathJoin(folder, "pb"), true);
 
-    installationData.Load(folder);
+    // Nothing below needs the installation data: without it, the game's
+    // uninstaller must still get every recorded file removed.
+    try {
+        installationData.Load(folder);
+    } catch (const Exception& error) {
+        LOG(Error) << error.message << " Removing what the uninstall record lists all the same.";
+    }
     const UpdateLayout layout = MakeUpdateLayout(configuration, folder);
     CleanTemporaryFiles(layout.patchFolder, layout.patchedFilesFolder);
     Uninstaller(PathJoin(folder, kUninstallRecordName)).Remove(folder);

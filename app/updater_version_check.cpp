@@ -7,6 +7,7 @@
 
 #include "app/updater.h"
 #include "app/version_text.h"
+#include "base/version_order.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/file_stream.h"

@@ -14,14 +14,3 @@ extern const char* const kPatchBaseVersion;
 // server keeps a patch and a complete build in.
 std::string PatchName(const std::string& baseVersion, const std::string& latestVersion);
 std::string BuildName(const std::string& latestVersion);
-
-// The first word of the latest-version file: a UTF-8 byte-order mark, then
-// blanks, tabs and line breaks before it are skipped, and it ends at the
-// next one. Empty when the text holds no word.
-std::string FirstWord(const std::string& text);
-
-// Whether the installed version is older than the latest. Versions are
-// opaque text compared byte-wise, except when both are whole decimal
-// numbers (what patch and build names use): those compare as numbers, so
-// 9 is older than 10 and 1000 is not older than 999.
-bool IsOlderVersion(const std::string& installed, const std::string& latest);

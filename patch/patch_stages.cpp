@@ -53,11 +53,14 @@ void PatchStages::Apply(IInstallationRecords* records, const std::optional<Resum
     }
     if (records != nullptr) records->StoreVersion("-1");
     applier.ApplyPatch(resumeAt);
+    // While the installation is still in change: interrupted here, the next
+    // start resumes and records the batch once more, which changes nothing.
+    // Recorded after the new version, a cut in between would lose it.
+    if (records != nullptr) records->RecordInstalledBatch(work, info);
     if (records != nullptr) records->StoreVersion(work.version);
     // The spare copy first: found alone, it would be taken for the record.
     RemoveFile(progressFile.GetAlternativeRecordPath());
     RemoveFile(progressFile.GetRecordPath());
-    if (records != nullptr) records->RecordInstalledBatch(work, info);
 }
 
 InterruptedBatch FindInterruptedBatch(const std::string& installedVersion, PatchProgressFile& progress) {

@@ -39,8 +39,9 @@ public:
     // Stores the installed version ("-1" while stage two works) durably;
     // throws Exception when it cannot.
     virtual void StoreVersion(const std::string& version) = 0;
-    // The batch is installed and its new version stored: what it added is
-    // recorded. A failure here does not undo the batch.
+    // The batch's changes are in place: what it added is recorded, durably,
+    // before its new version is stored. It may run again for the same
+    // batch after an interruption. A failure here does not undo the batch.
     virtual void RecordInstalledBatch(const PatchBatch& batch, PatchInfoFile& description) = 0;
 
 protected:
@@ -72,9 +73,9 @@ public:
     //      version is kept),
     //   3. each deletion and folder action behind its own progress record,
     //      then the moves,
-    //   4. the new version,
-    //   5. the progress record removed,
-    //   6. what the batch installed (the uninstall record, the history).
+    //   4. what the batch installed (the uninstall record, the history),
+    //   5. the new version,
+    //   6. the progress record removed.
     // An interruption at any moment is finished by the next start (see
     // FindInterruptedBatch).
     void Apply(IInstallationRecords* records, const std::optional<ResumePoint>& resumeAt = std::nullopt);

@@ -29,12 +29,15 @@ TEST(UpdatePlan, DecidesTheRoadAndItsBatch) {
     const Case cases[] = {
         {"1", "3", "2", Kind::None, Road::Patch, patch2, ErrorCode::None},
         {"2", "3", "2", Kind::None, Road::UpToDate, "", ErrorCode::None},
-        // Whole numbers compare as numbers, everything else byte-wise.
+        // Whole numbers and dotted whole numbers compare number by number, everything else byte-wise.
         {"9", "3", "10", Kind::None, Road::Patch, "http://host/patch_515195_10", ErrorCode::None},
         {"10", "3", "9", Kind::None, Road::UpToDate, "", ErrorCode::None},
         {"1000", "3", "999", Kind::None, Road::UpToDate, "", ErrorCode::None},
         {"007", "3", "7", Kind::None, Road::UpToDate, "", ErrorCode::None},
-        {"1.9", "3", "1.10", Kind::None, Road::UpToDate, "", ErrorCode::None},
+        {"1.9", "3", "1.10", Kind::None, Road::Patch, "http://host/patch_515195_1.10", ErrorCode::None},
+        {"1.10", "3", "1.9", Kind::None, Road::UpToDate, "", ErrorCode::None},
+        {"1.10", "3", "2", Kind::None, Road::Patch, "http://host/patch_515195_2", ErrorCode::None},
+        {"2.0", "3", "2", Kind::None, Road::UpToDate, "", ErrorCode::None},
         {"beta", "3", "gamma", Kind::None, Road::Patch, "http://host/patch_515195_gamma", ErrorCode::None},
         {"10", "3", "9a", Kind::None, Road::Patch, "http://host/patch_515195_9a", ErrorCode::None},
         {"", "3", "2", Kind::None, Road::UpToDate, "", ErrorCode::NoLocalVersion},

@@ -385,6 +385,7 @@ TEST_F(UpdateRun, UninstallerModesStayInsideTheInstallationAndTheDocuments) {
                       temp / "beside.txt" + "\" /></FileChanges><DirectoryChanges><new Path=\"" + install +
                       "\" /></DirectoryChanges><RegistryHive>HKEY_LOCAL_MACHINE</RegistryHive></IronvaleWestPatch>");
     WriteTextFile(PathJoin(install, "GL.ini"), "settings");
+    RemoveFile(PathJoin(install, "InstallationData.xml"));  // the removal goes on without it
     Run("", {"-doUninstallCleanup", "true"});
     EXPECT_FALSE(PathExists(PathJoin(install, recorded)));
     EXPECT_FALSE(PathExists(PathJoin(install, "GL.ini")));

@@ -104,6 +104,10 @@ TEST(BuildErrors, UnusableInputsFailClearlyAndLeaveNothing) {
         EXPECT_TRUE(!PathExists(temp / "out") || std::filesystem::is_empty(temp / "out")) << expected;
         if (!entry.empty()) std::filesystem::remove_all(tree + "/" + entry.substr(0, entry.find('/')));
     }
+    // A version the updater would order before the one the site publishes.
+    WriteTextFile(temp / "out/version.txt", "1.10\n");
+    EXPECT_THROW(BuildPatch({tree, tree, "1.9", temp / "out"}), Exception);
+    EXPECT_EQ(std::filesystem::directory_iterator(temp / "out")->path().filename(), "version.txt");
 }
 
 }  // namespace

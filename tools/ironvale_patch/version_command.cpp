@@ -16,6 +16,7 @@ const char kUsage[] = "version --out DIR V";
 int Run(const std::vector<std::string>& args) {
     if (args.size() != 3 || args[0] != "--out") return UsageError(kUsage);
     CheckVersionText(args[2]);
+    CheckVersionFollows(args[1], args[2]);
     if (!MakeDirectories(args[1])) throw Exception("Cannot create " + args[1]);
     const std::string path = PathJoin(args[1], "version.txt");
     if (!ReplaceFileAtomically(path, args[2] + "\n")) throw Exception("Failed to write " + path);

@@ -10,6 +10,7 @@
 #include "base/file_operations.h"
 #include "base/file_stream.h"
 #include "base/paths.h"
+#include "base/version_order.h"
 #include "net/sha256.h"
 #include "tools/publisher/archive_writer.h"
 #include "tools/publisher/delta_maker.h"
@@ -212,8 +213,19 @@ void CheckVersionText(const std::string& version) {
     }
 }
 
+void CheckVersionFollows(const std::string& site, const std::string& version) {
+    std::string text;
+    if (!ReadFileBytes(PathJoin(site, "version.txt"), 1024, text)) return;
+    const std::string published = FirstWord(text);
+    if (IsOlderVersion(version, published)) {
+        throw Exception("The updater would not take version " + version + " for newer than the published " +
+                        published + ".");
+    }
+}
+
 std::string BuildPatch(const BuildOptions& options) {
     CheckVersionText(options.version);
+    CheckVersionFollows(options.outDir, options.version);
     if (options.maxArchiveSize <= 0) throw Exception("The maximum archive size must be positive.");
     CheckOutsideTree(options.outDir, options.fromDir);
     CheckOutsideTree(options.outDir, options.toDir);

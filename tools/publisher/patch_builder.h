@@ -39,3 +39,7 @@ std::string BuildPatch(const BuildOptions& options);
 // Throws Exception unless version can name a folder and be read back as
 // the first word of version.txt.
 void CheckVersionText(const std::string& version);
+// Throws unless the updater orders version at or after the one site's
+// "version.txt" names (when there is one): a player must never be offered
+// a version that counts as older than theirs.
+void CheckVersionFollows(const std::string& site, const std::string& version);
