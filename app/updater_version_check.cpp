@@ -7,11 +7,11 @@
 
 #include "app/updater.h"
 #include "app/version_text.h"
-#include "base/version_order.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/file_stream.h"
 #include "base/paths.h"
+#include "base/version_order.h"
 #include "net/location.h"
 #include "net/signature_check.h"
 #include "patch/patch_info_file.h"

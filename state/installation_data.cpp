@@ -8,7 +8,6 @@
 #include "base/record_names.h"
 #include "base/xml_file.h"
 
-
 namespace {
 
 const char kReadFailure[] = "Failed to read InstallationData file.";

@@ -8,7 +8,6 @@
 #include "base/paths.h"
 #include "patch/patch_info_file.h"
 
-
 namespace {
 
 // Registry key paths are backslash-separated on every platform.

@@ -8,9 +8,9 @@
 #include "app/temporary_files.h"
 #include "app/update_history.h"
 #include "app/version_text.h"
-#include "base/version_order.h"
 #include "base/file_operations.h"
 #include "base/paths.h"
+#include "base/version_order.h"
 #include "tests/support/batch_fixture.h"
 
 namespace {

@@ -151,7 +151,7 @@ const char* const kHostileNames[] = {
 
 // The updater's own work folder and records, which items may not reach.
 const char* const kOwnNames[] = {"tempPatch", "TEMPPATCH\\patched\\x", "PPF.xml",
-                                 "_ppf.xml",  "InstallationData.xml",    "uninstall.XML"};
+                                 "_ppf.xml",  "InstallationData.xml",  "uninstall.XML"};
 
 // Where the hostile name goes: each item kind's path, or a file's archive.
 const char* const kItems[] = {

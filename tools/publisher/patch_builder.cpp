@@ -218,8 +218,8 @@ void CheckVersionFollows(const std::string& site, const std::string& version) {
     if (!ReadFileBytes(PathJoin(site, "version.txt"), 1024, text)) return;
     const std::string published = FirstWord(text);
     if (IsOlderVersion(version, published)) {
-        throw Exception("The updater would not take version " + version + " for newer than the published " +
-                        published + ".");
+        throw Exception("The updater would not take version " + version + " for newer than the published " + published +
+                        ".");
     }
 }
 
