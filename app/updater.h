@@ -15,7 +15,7 @@
 #include "state/registry_manager.h"
 #include "state/system_facts.h"
 #include "ui/gui_manager.h"
-#include "ui/move_retry_box.h"
+#include "ui/retry_box.h"
 
 class Exception;
 class PatchInfoFile;
@@ -126,5 +126,5 @@ private:
     // PEM; empty when descriptions need no signature.
     const std::string publisherKey;
     // Asks the player to close files in the way of a move.
-    MoveRetryBox retryBox;
+    RetryBox retryBox;
 };

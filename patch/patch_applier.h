@@ -17,22 +17,24 @@ class PatchProgressFile;
 // Asked when a prepared file cannot be moved into the installation (the
 // game or another program holds the old file open): true to try again.
 // The program answers with a box in the player's language.
-class IMoveRetryQuestion {
+class IRetryQuestion {
 public:
     virtual bool AskRetryMove(const std::string& source, const std::string& destination) = 0;
+    // The same when a file or folder of the game cannot be deleted.
+    virtual bool AskRetryDelete(const std::string& path) = 0;
 
 protected:
-    IMoveRetryQuestion() = default;
-    IMoveRetryQuestion(const IMoveRetryQuestion&) = default;
-    IMoveRetryQuestion& operator=(const IMoveRetryQuestion&) = default;
-    ~IMoveRetryQuestion() = default;
+    IRetryQuestion() = default;
+    IRetryQuestion(const IRetryQuestion&) = default;
+    IRetryQuestion& operator=(const IRetryQuestion&) = default;
+    ~IRetryQuestion() = default;
 };
 
 // Who the stages talk to while they work; none is owned, each may be null.
 struct StageServices {
     IStatusView* statusView = nullptr;
     // Without one, the first failed move ends stage two.
-    IMoveRetryQuestion* retryQuestion = nullptr;
+    IRetryQuestion* retryQuestion = nullptr;
     // Stage one stops at its next check once it is cancelled.
     const CancellationToken* cancel = nullptr;
 };

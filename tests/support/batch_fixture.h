@@ -85,7 +85,7 @@ public:
     PatchInfoFile info;
     PatchProgressFile progress;
     CancellationToken cancel;
-    IMoveRetryQuestion* retryQuestion = nullptr;
+    IRetryQuestion* retryQuestion = nullptr;
     ArchiveState state = ArchiveState::Arrived;
     std::function<void(const std::string& fileName)> onReport;
     std::vector<std::pair<std::string, int32_t>> reports;

@@ -21,7 +21,7 @@
 #include "text/localization.h"
 #include "ui/gui_manager.h"
 #include "ui/language_dialog.h"
-#include "ui/move_retry_box.h"
+#include "ui/retry_box.h"
 
 namespace {
 
@@ -152,7 +152,7 @@ TEST(ConsoleFrontEnd, MoveRetryAsksAgainUntilCancelled) {
     Console console(false, "r\nc\n");
     TestBatch batch(Tree(), TreeOf("blocked.bin=new content"));
     BatchRun run(batch);
-    MoveRetryBox retryBox;
+    RetryBox retryBox;
     run.retryQuestion = &retryBox;
     run.Prepare();
     WriteTree(batch.Installation(), TreeOf("blocked.bin/inside.txt=a folder that a move cannot replace"));

@@ -28,7 +28,7 @@
 #include "ui/fonts_win.h"
 #include "ui/gui_manager.h"
 #include "ui/language_dialog.h"
-#include "ui/move_retry_box.h"
+#include "ui/retry_box.h"
 #include "ui/ui_services.h"
 
 namespace {
@@ -149,7 +149,7 @@ int main() {
             reply = Answered(number, L"", [&] { return gui.AskYesNo(WidenFromCodePage(text)) ? "yes" : "no"; });
         } else if (command == "retry") {
             reply = Answered(number, L"", [] {
-                return MoveRetryBox().AskRetryMove("C:\\Patched\\a.pak", "C:\\Games\\a.pak") ? "retry" : "cancel";
+                return RetryBox().AskRetryMove("C:\\Patched\\a.pak", "C:\\Games\\a.pak") ? "retry" : "cancel";
             });
         } else if (command == "language") {
             reply = Answered(number, WidenFromCodePage(text), [&] {
