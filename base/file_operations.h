@@ -20,7 +20,9 @@ bool MoveFileReplacing(const std::string& from, const std::string& to);
 // Makes the entries of a folder (renames, new files) durable. Nothing to do
 // on Windows, where moves are written through.
 void SyncFolder(const std::string& folder);
-// Removes a folder: only an empty one, or with everything in it.
+// Removes a folder: only an empty one, or with everything in it. A link
+// (a symbolic link, a junction) is removed itself and never entered, at
+// path or anywhere below it.
 bool DeleteDirectory(const std::string& path, bool recursive);
 // Creates a folder with every missing parent; true when it exists afterwards.
 bool MakeDirectories(const std::string& path);

@@ -4,6 +4,7 @@
 #include <sys/statvfs.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <cstdio>
 #include <filesystem>
 #include <system_error>
@@ -30,8 +31,36 @@ bool RenameFile(const std::string& from, const std::string& to) {
     return MoveFileReplacing(from, to);
 }
 
+namespace {
+
+// A move to another volume: a copy beside the destination, flushed, then
+// renamed over it inside its own volume, then the source removed. The
+// destination is never seen half written.
+bool MoveAcrossVolumes(const std::string& from, const std::string& to) {
+    const std::string copy = to + ".moving";
+    const int in = ::open(from.c_str(), O_RDONLY | O_CLOEXEC | O_NOFOLLOW);
+    if (in < 0) return false;
+    const int out = ::open(copy.c_str(), O_WRONLY | O_CREAT | O_TRUNC | O_CLOEXEC | O_NOFOLLOW, 0644);
+    bool copied = out >= 0;
+    char buffer[65536];
+    for (ssize_t count; copied && (count = ::read(in, buffer, sizeof buffer)) != 0;) {
+        copied = count > 0 && ::write(out, buffer, static_cast<size_t>(count)) == count;
+    }
+    copied = copied && ::fsync(out) == 0;
+    if (out >= 0) ::close(out);
+    ::close(in);
+    if (!copied || std::rename(copy.c_str(), to.c_str()) != 0) {
+        ::unlink(copy.c_str());
+        return false;
+    }
+    ::unlink(from.c_str());
+    return true;
+}
+
+}  // namespace
+
 bool MoveFileReplacing(const std::string& from, const std::string& to) {
-    if (std::rename(from.c_str(), to.c_str()) != 0) return false;
+    if (std::rename(from.c_str(), to.c_str()) != 0 && (errno != EXDEV || !MoveAcrossVolumes(from, to))) return false;
     if (IFileJournal* journal = GetFileJournal()) journal->Moved(from, to);
     return true;
 }

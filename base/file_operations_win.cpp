@@ -1,6 +1,5 @@
 #include <windows.h>
 
-#include <shellapi.h>
 #include <shlobj.h>
 #include <shlwapi.h>
 
@@ -23,7 +22,8 @@ bool RenameFile(const std::string& from, const std::string& to) {
 }
 
 bool MoveFileReplacing(const std::string& from, const std::string& to) {
-    if (MoveFileExA(from.c_str(), to.c_str(), MOVEFILE_REPLACE_EXISTING | MOVEFILE_WRITE_THROUGH) == FALSE) {
+    if (MoveFileExA(from.c_str(), to.c_str(),
+                    MOVEFILE_REPLACE_EXISTING | MOVEFILE_WRITE_THROUGH | MOVEFILE_COPY_ALLOWED) == FALSE) {
         return false;
     }
     // Written through: the move is on the disk when the call returns.
@@ -39,22 +39,38 @@ bool MoveFileReplacing(const std::string& from, const std::string& to) {
 // entries itself.
 void SyncFolder(const std::string&) {}
 
+namespace {
+
+// Removes what is at path with everything below it, but never what a link
+// (a junction, a symbolic link, any reparse point) leads to: the link
+// itself goes. The shell's delete follows them, and would empty a folder
+// outside the installation that a link inside it names.
+bool RemoveTree(const std::string& path) {
+    const DWORD attributes = GetFileAttributesA(path.c_str());
+    if (attributes == INVALID_FILE_ATTRIBUTES) return false;
+    if (attributes & FILE_ATTRIBUTE_READONLY) {
+        SetFileAttributesA(path.c_str(), attributes & ~static_cast<DWORD>(FILE_ATTRIBUTE_READONLY));
+    }
+    if ((attributes & FILE_ATTRIBUTE_DIRECTORY) == 0) return DeleteFileA(path.c_str()) != FALSE;
+    if ((attributes & FILE_ATTRIBUTE_REPARSE_POINT) == 0) {
+        WIN32_FIND_DATAA entry;
+        HANDLE search = FindFirstFileA((path + "\\*").c_str(), &entry);
+        if (search != INVALID_HANDLE_VALUE) {
+            do {
+                const std::string name = entry.cFileName;
+                if (name != "." && name != "..") RemoveTree(path + "\\" + name);
+            } while (FindNextFileA(search, &entry));
+            FindClose(search);
+        }
+    }
+    return RemoveDirectoryA(path.c_str()) != FALSE;
+}
+
+}  // namespace
+
 bool DeleteDirectory(const std::string& path, bool recursive) {
     if (path.empty()) return false;
-    bool removed;
-    if (!recursive) {
-        removed = RemoveDirectoryA(path.c_str()) != FALSE;
-    } else {
-        std::string from = path;
-        from.push_back('\0');  // the list ends with two NULs
-        SHFILEOPSTRUCTA operation = {};
-        operation.hwnd = nullptr;
-        operation.wFunc = FO_DELETE;
-        operation.pFrom = from.c_str();
-        operation.pTo = nullptr;
-        operation.fFlags = FOF_SILENT | FOF_NOCONFIRMATION | FOF_NOERRORUI;
-        removed = SHFileOperationA(&operation) == 0;
-    }
+    const bool removed = recursive ? RemoveTree(path) : RemoveDirectoryA(path.c_str()) != FALSE;
     if (IFileJournal* journal = GetFileJournal(); journal != nullptr && removed) journal->RemovedDirectory(path);
     return removed;
 }

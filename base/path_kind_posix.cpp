@@ -1,0 +1,14 @@
+#include <sys/stat.h>
+
+#include "base/path_kind.h"
+
+PathKind KindOf(const std::string& path) {
+    struct stat info;
+    if (::lstat(path.c_str(), &info) != 0) return PathKind::Missing;
+    if (S_ISLNK(info.st_mode)) return PathKind::Link;
+    return S_ISDIR(info.st_mode) ? PathKind::Directory : PathKind::File;
+}
+
+std::string LongPathName(const std::string& path) { return path; }
+
+void ClearReadOnly(const std::string&) {}
