@@ -3,7 +3,7 @@
 # them, and the script checks what the X server shows.
 if(WIN32)
   add_executable(window_driver "${PROJECT_SOURCE_DIR}/tests/support/programs/window_driver.cpp")
-  target_link_libraries(window_driver PRIVATE ironvale_ui)
+  target_link_libraries(window_driver PRIVATE ironvale_ui ironvale_state)
   ironvale_link_resources(window_driver)
   ironvale_warnings(window_driver)
   add_test(NAME ui_window_wine COMMAND bash "${CMAKE_CURRENT_SOURCE_DIR}/ui/window_wine.sh" $<TARGET_FILE:IronvaleUpdater>
