@@ -105,8 +105,9 @@ def main():
                 violations.append(f"{cmake}: {folder} links {linked}, which is not below it ({order}; "
                                   f"tools/ use {', '.join(sorted(TOOLS_MAY_NAME))})")
     allowed = {folder: {folder, *rules[folder][2]} for folder in rules}
-    tested_by = {"tests/" + folder: folder for folder in rules if not folder.startswith(("tests/", "tools/"))}
-    for test_folder, tested in {**tested_by, **TESTED}.items():
+    tests = {"tests/" + folder: folder for folder in rules if not folder.startswith(("tests/", "tools/"))}
+    tests.update(TESTED)
+    for test_folder, tested in tests.items():
         allowed[test_folder] = {test_folder, tested, *TEST_EXTRAS} | closure(rules, tested)
     known = set(allowed) | {"tests/e2e"}
 
@@ -129,8 +130,13 @@ def main():
                 continue
             if folder in used:
                 used[folder].add(target)
-            if target not in allowed[folder]:
+            if target in allowed[folder]:
+                continue
+            if folder in rules:
                 violations.append(f"{name}: includes {header}, but {folder} does not name {target}")
+            else:
+                violations.append(f"{name}: includes {header}, but {folder} reaches only what {tests[folder]} "
+                                  f"reaches, {tests[folder]} and the test helpers")
     for folder, (cmake, _, named) in rules.items():
         for linked in named:
             if linked not in used[folder]:
