@@ -8,16 +8,12 @@
 
 const char* const kInstanceName = "IronvaleUpdater";
 
+void SingleInstance::Traits::Close(intptr_t value) { ::close(static_cast<int>(value)); }
+
 bool SingleInstance::Acquire() {
     const std::string path = PathJoin(GetTempDirectory(), std::string(kInstanceName) + ".lock");
     const int fd = ::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0644);
     if (fd < 0) return false;
-    handle = fd;
+    guard.Reset(fd);
     return flock(fd, LOCK_EX | LOCK_NB) == 0;
-}
-
-void SingleInstance::Release() {
-    if (handle == -1) return;
-    ::close(static_cast<int>(handle));
-    handle = -1;
 }

@@ -4,17 +4,16 @@
 
 const char* const kInstanceName = "IronvaleUpdater";
 
+// Releasing a mutex the wait did not get fails, and changes nothing.
+void SingleInstance::Traits::Close(intptr_t value) {
+    HANDLE mutex = reinterpret_cast<HANDLE>(value);
+    ReleaseMutex(mutex);
+    CloseHandle(mutex);
+}
+
 bool SingleInstance::Acquire() {
     HANDLE mutex = CreateMutexA(nullptr, FALSE, kInstanceName);
     if (mutex == nullptr) return false;
-    handle = reinterpret_cast<long long>(mutex);
+    guard.Reset(reinterpret_cast<intptr_t>(mutex));
     return WaitForSingleObject(mutex, 2) == WAIT_OBJECT_0;
-}
-
-void SingleInstance::Release() {
-    if (handle == -1) return;
-    HANDLE mutex = reinterpret_cast<HANDLE>(handle);
-    ReleaseMutex(mutex);
-    CloseHandle(mutex);
-    handle = -1;
 }

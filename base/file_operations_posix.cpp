@@ -11,6 +11,7 @@
 
 #include "base/file_journal.h"
 #include "base/file_operations.h"
+#include "base/unique_handle_posix.h"
 
 bool FileExists(const std::string& path) {
     struct stat info;
@@ -66,10 +67,10 @@ bool MoveFileReplacing(const std::string& from, const std::string& to) {
 }
 
 void SyncFolder(const std::string& folder) {
-    const int fd = ::open(folder.empty() ? "." : folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-    if (fd < 0) return;
-    const bool synced = fsync(fd) == 0;
-    ::close(fd);
+    const UniqueFileDescriptor opened(
+        ::open(folder.empty() ? "." : folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    if (!opened) return;
+    const bool synced = fsync(opened.Get()) == 0;
     if (IFileJournal* journal = GetFileJournal(); journal != nullptr && synced) journal->SyncedFolder(folder);
 }
 
@@ -95,10 +96,10 @@ bool MakeDirectories(const std::string& path) {
 }
 
 void CollectFiles(const std::string& folder, std::vector<std::string>& list) {
-    DIR* listing = ::opendir(folder.c_str());
-    if (listing == nullptr) return;
+    UniqueDirectoryStream listing(::opendir(folder.c_str()));
+    if (!listing) return;
     std::vector<std::string> subfolders;
-    while (const dirent* entry = ::readdir(listing)) {
+    while (const dirent* entry = ::readdir(listing.Get())) {
         const std::string name = entry->d_name;
         if (name == "." || name == "..") continue;
         const std::string path = folder + "/" + name;
@@ -111,7 +112,7 @@ void CollectFiles(const std::string& folder, std::vector<std::string>& list) {
             list.push_back(path);
         }
     }
-    ::closedir(listing);
+    listing.Reset();
     for (const std::string& subfolder : subfolders) CollectFiles(subfolder, list);
 }
 
@@ -124,13 +125,12 @@ bool GetFreeDiskSpace(const std::string& folder, int64_t& bytes) {
 
 std::vector<std::string> ListFileNames(const std::string& folder) {
     std::vector<std::string> names;
-    DIR* listing = ::opendir(folder.c_str());
-    if (listing == nullptr) return names;
-    while (const dirent* entry = ::readdir(listing)) {
+    const UniqueDirectoryStream listing(::opendir(folder.c_str()));
+    if (!listing) return names;
+    while (const dirent* entry = ::readdir(listing.Get())) {
         struct stat info;
         const std::string name = entry->d_name;
         if (::lstat((folder + "/" + name).c_str(), &info) == 0 && S_ISREG(info.st_mode)) names.push_back(name);
     }
-    ::closedir(listing);
     return names;
 }

@@ -6,6 +6,7 @@
 #include "base/file_journal.h"
 #include "base/file_operations.h"
 #include "base/paths.h"
+#include "base/unique_handle_win.h"
 
 bool FileExists(const std::string& path) { return PathFileExistsA(path.c_str()) == TRUE; }
 
@@ -84,8 +85,8 @@ bool MakeDirectories(const std::string& path) {
 
 void CollectFiles(const std::string& folder, std::vector<std::string>& list) {
     WIN32_FIND_DATAA entry;
-    HANDLE search = FindFirstFileA((folder + "\\*").c_str(), &entry);
-    if (search == INVALID_HANDLE_VALUE) return;
+    UniqueFindHandle search(FindFirstFileA((folder + "\\*").c_str(), &entry));
+    if (!search) return;
     std::vector<std::string> subfolders;
     do {
         const std::string name = entry.cFileName;
@@ -96,8 +97,8 @@ void CollectFiles(const std::string& folder, std::vector<std::string>& list) {
         } else {
             list.push_back(path);
         }
-    } while (FindNextFileA(search, &entry));
-    FindClose(search);
+    } while (FindNextFileA(search.Get(), &entry));
+    search.Reset();
     for (const std::string& subfolder : subfolders) CollectFiles(subfolder, list);
 }
 
@@ -111,11 +112,10 @@ bool GetFreeDiskSpace(const std::string& folder, int64_t& bytes) {
 std::vector<std::string> ListFileNames(const std::string& folder) {
     std::vector<std::string> names;
     WIN32_FIND_DATAA entry;
-    HANDLE search = FindFirstFileA((folder + "\\*").c_str(), &entry);
-    if (search == INVALID_HANDLE_VALUE) return names;
+    const UniqueFindHandle search(FindFirstFileA((folder + "\\*").c_str(), &entry));
+    if (!search) return names;
     do {
         if ((entry.dwFileAttributes & FILE_ATTRIBUTE_DIRECTORY) == 0) names.push_back(entry.cFileName);
-    } while (FindNextFileA(search, &entry));
-    FindClose(search);
+    } while (FindNextFileA(search.Get(), &entry));
     return names;
 }

@@ -1,34 +1,29 @@
 #include <windows.h>
 
 #include "base/log_file.h"
+#include "base/unique_handle_win.h"
 
 namespace {
-HANDLE file = nullptr;
+UniqueFileHandle file;
 }  // namespace
 
 namespace LogFile {
 
-bool IsOpen() { return file != nullptr && file != INVALID_HANDLE_VALUE; }
+bool IsOpen() { return file.IsValid(); }
 
 bool Open(const std::string& path, bool truncate) {
-    file = CreateFileA(path.c_str(), GENERIC_WRITE, 0, nullptr, truncate ? CREATE_ALWAYS : OPEN_ALWAYS,
-                       FILE_ATTRIBUTE_NORMAL, nullptr);
-    if (file == INVALID_HANDLE_VALUE) {
-        file = nullptr;
-        return false;
-    }
-    SetFilePointer(file, 0, nullptr, FILE_END);
+    file.Reset(CreateFileA(path.c_str(), GENERIC_WRITE, 0, nullptr, truncate ? CREATE_ALWAYS : OPEN_ALWAYS,
+                           FILE_ATTRIBUTE_NORMAL, nullptr));
+    if (!file) return false;
+    SetFilePointer(file.Get(), 0, nullptr, FILE_END);
     return true;
 }
 
-void Close() {
-    if (IsOpen()) CloseHandle(file);
-    file = nullptr;
-}
+void Close() { file.Reset(); }
 
 bool Size(int64_t& size) {
     LARGE_INTEGER value;
-    if (!GetFileSizeEx(file, &value)) return false;
+    if (!GetFileSizeEx(file.Get(), &value)) return false;
     size = value.QuadPart;
     return true;
 }
@@ -36,9 +31,9 @@ bool Size(int64_t& size) {
 void Append(const std::string& bytes) {
     // Every line goes to the end, also when another thread wrote just
     // before: move there, then write the whole line in one call.
-    SetFilePointer(file, 0, nullptr, FILE_END);
+    SetFilePointer(file.Get(), 0, nullptr, FILE_END);
     DWORD written = 0;
-    WriteFile(file, bytes.data(), static_cast<DWORD>(bytes.size()), &written, nullptr);
+    WriteFile(file.Get(), bytes.data(), static_cast<DWORD>(bytes.size()), &written, nullptr);
 }
 
 }  // namespace LogFile

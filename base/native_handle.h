@@ -3,6 +3,8 @@
 #include <cstdint>
 #include <string>
 
+#include "base/unique_handle.h"
+
 // The thin OS layer under FileStream: one open file, closed on destruction.
 // Each operation returns false on failure; FileStream turns that into its
 // own error texts.
@@ -14,14 +16,9 @@ public:
         OpenAlways,    // write, exclusive, open or create, no truncation
     };
 
-    NativeHandle() = default;
-    NativeHandle(const NativeHandle&) = delete;
-    NativeHandle& operator=(const NativeHandle&) = delete;
-    ~NativeHandle() { Close(); }
-
     bool Open(const std::string& path, Mode mode);
-    void Close();
-    bool IsOpen() const;
+    void Close() { file.Reset(); }
+    bool IsOpen() const { return file.IsValid(); }
 
     bool Seek(int64_t offset, uint32_t origin, int64_t& newPosition);
     bool Length(int64_t& length);
@@ -30,7 +27,12 @@ public:
     bool Flush();
 
 private:
-    // A Win32 HANDLE or a POSIX descriptor; -1 (and on Windows also 0)
-    // means closed.
-    intptr_t value = -1;
+    // A Win32 HANDLE or a POSIX descriptor; -1 (INVALID_HANDLE_VALUE on
+    // Windows) for none.
+    struct Traits {
+        using Value = intptr_t;
+        static Value Invalid() { return -1; }
+        static void Close(Value value);
+    };
+    UniqueHandle<Traits> file;
 };

@@ -7,10 +7,12 @@
 
 #include <cerrno>
 
+#include "base/unique_handle_posix.h"
+
 // Windows' sharing modes are mirrored with flock: writers hold an exclusive
 // lock, readers a shared one, so a writer and a reader exclude each other
 // just as CreateFileA's share flags make them.
-bool NativeHandle::IsOpen() const { return value >= 0; }
+void NativeHandle::Traits::Close(intptr_t value) { ::close(static_cast<int>(value)); }
 
 bool NativeHandle::Open(const std::string& path, Mode mode) {
     Close();
@@ -28,32 +30,22 @@ bool NativeHandle::Open(const std::string& path, Mode mode) {
             flags |= O_WRONLY | O_CREAT;
             break;
     }
-    const int fd = ::open(path.c_str(), flags, 0644);
+    UniqueFileDescriptor opened(::open(path.c_str(), flags, 0644));
+    const int fd = opened.Get();
     if (fd < 0) return false;
     struct stat info;
-    if (fstat(fd, &info) != 0 || S_ISDIR(info.st_mode) || flock(fd, lock | LOCK_NB) != 0) {
-        ::close(fd);
-        return false;
-    }
+    if (fstat(fd, &info) != 0 || S_ISDIR(info.st_mode) || flock(fd, lock | LOCK_NB) != 0) return false;
     // Truncate only once the lock is ours, so a refused open leaves the
     // other holder's file intact.
-    if (mode == Mode::CreateAlways && ftruncate(fd, 0) != 0) {
-        ::close(fd);
-        return false;
-    }
-    value = fd;
+    if (mode == Mode::CreateAlways && ftruncate(fd, 0) != 0) return false;
+    file.Reset(opened.Release());
     return true;
 }
 
-void NativeHandle::Close() {
-    if (value >= 0) ::close(static_cast<int>(value));
-    value = -1;
-}
-
 bool NativeHandle::Seek(int64_t offset, uint32_t origin, int64_t& newPosition) {
-    if (value < 0 || origin > 2) return false;
+    if (!IsOpen() || origin > 2) return false;
     static const int kWhence[] = {SEEK_SET, SEEK_CUR, SEEK_END};
-    const off_t result = lseek(static_cast<int>(value), static_cast<off_t>(offset), kWhence[origin]);
+    const off_t result = lseek(static_cast<int>(file.Get()), static_cast<off_t>(offset), kWhence[origin]);
     if (result < 0) return false;
     newPosition = result;
     return true;
@@ -61,17 +53,17 @@ bool NativeHandle::Seek(int64_t offset, uint32_t origin, int64_t& newPosition) {
 
 bool NativeHandle::Length(int64_t& length) {
     struct stat info;
-    if (value < 0 || fstat(static_cast<int>(value), &info) != 0) return false;
+    if (!IsOpen() || fstat(static_cast<int>(file.Get()), &info) != 0) return false;
     length = info.st_size;
     return true;
 }
 
 bool NativeHandle::Read(void* destination, uint32_t count, uint32_t& done) {
     done = 0;
-    if (value < 0) return false;
+    if (!IsOpen()) return false;
     ssize_t n;
     do {
-        n = ::read(static_cast<int>(value), destination, count);
+        n = ::read(static_cast<int>(file.Get()), destination, count);
     } while (n < 0 && errno == EINTR);
     if (n < 0) return false;
     done = static_cast<uint32_t>(n);
@@ -80,10 +72,10 @@ bool NativeHandle::Read(void* destination, uint32_t count, uint32_t& done) {
 
 bool NativeHandle::Write(const void* source, uint32_t count, uint32_t& done) {
     done = 0;
-    if (value < 0) return false;
+    if (!IsOpen()) return false;
     const char* bytes = static_cast<const char*>(source);
     while (done < count) {
-        const ssize_t n = ::write(static_cast<int>(value), bytes + done, count - done);
+        const ssize_t n = ::write(static_cast<int>(file.Get()), bytes + done, count - done);
         if (n < 0) {
             if (errno == EINTR) continue;
             return false;
@@ -93,4 +85,4 @@ bool NativeHandle::Write(const void* source, uint32_t count, uint32_t& done) {
     return true;
 }
 
-bool NativeHandle::Flush() { return value >= 0 && fsync(static_cast<int>(value)) == 0; }
+bool NativeHandle::Flush() { return IsOpen() && fsync(static_cast<int>(file.Get())) == 0; }

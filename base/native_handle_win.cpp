@@ -6,7 +6,7 @@ namespace {
 HANDLE AsHandle(intptr_t value) { return reinterpret_cast<HANDLE>(value); }
 }  // namespace
 
-bool NativeHandle::IsOpen() const { return value != 0 && AsHandle(value) != INVALID_HANDLE_VALUE; }
+void NativeHandle::Traits::Close(intptr_t value) { CloseHandle(AsHandle(value)); }
 
 bool NativeHandle::Open(const std::string& path, Mode mode) {
     Close();
@@ -23,13 +23,8 @@ bool NativeHandle::Open(const std::string& path, Mode mode) {
             h = CreateFileA(path.c_str(), GENERIC_WRITE, 0, nullptr, OPEN_ALWAYS, 0, nullptr);
             break;
     }
-    value = reinterpret_cast<intptr_t>(h);
-    return h != INVALID_HANDLE_VALUE;
-}
-
-void NativeHandle::Close() {
-    if (IsOpen()) CloseHandle(AsHandle(value));
-    value = 0;
+    file.Reset(reinterpret_cast<intptr_t>(h));
+    return IsOpen();
 }
 
 bool NativeHandle::Seek(int64_t offset, uint32_t origin, int64_t& newPosition) {
@@ -37,30 +32,30 @@ bool NativeHandle::Seek(int64_t offset, uint32_t origin, int64_t& newPosition) {
     distance.QuadPart = offset;
     LARGE_INTEGER result;
     result.QuadPart = 0;
-    if (!SetFilePointerEx(AsHandle(value), distance, &result, origin)) return false;
+    if (!SetFilePointerEx(AsHandle(file.Get()), distance, &result, origin)) return false;
     newPosition = result.QuadPart;
     return true;
 }
 
 bool NativeHandle::Length(int64_t& length) {
     LARGE_INTEGER size;
-    if (!GetFileSizeEx(AsHandle(value), &size)) return false;
+    if (!GetFileSizeEx(AsHandle(file.Get()), &size)) return false;
     length = size.QuadPart;
     return true;
 }
 
 bool NativeHandle::Read(void* destination, uint32_t count, uint32_t& done) {
     DWORD read = 0;
-    const BOOL ok = ReadFile(AsHandle(value), destination, count, &read, nullptr);
+    const BOOL ok = ReadFile(AsHandle(file.Get()), destination, count, &read, nullptr);
     done = read;
     return ok != FALSE;
 }
 
 bool NativeHandle::Write(const void* source, uint32_t count, uint32_t& done) {
     DWORD written = 0;
-    const BOOL ok = WriteFile(AsHandle(value), source, count, &written, nullptr);
+    const BOOL ok = WriteFile(AsHandle(file.Get()), source, count, &written, nullptr);
     done = written;
     return ok != FALSE;
 }
 
-bool NativeHandle::Flush() { return FlushFileBuffers(AsHandle(value)) != FALSE; }
+bool NativeHandle::Flush() { return FlushFileBuffers(AsHandle(file.Get())) != FALSE; }

@@ -1,11 +1,10 @@
-#include <unistd.h>
-
 #include <cstdlib>
 #include <vector>
 
 #include "base/exception.h"
 
 #include "base/paths.h"
+#include "base/unique_handle_posix.h"
 
 const char kPathSeparator = '/';
 
@@ -20,9 +19,8 @@ std::string MakeTempFileName(const std::string& prefix) {
     std::string pattern = GetTempDirectory() + prefix + "XXXXXX";
     std::vector<char> name(pattern.begin(), pattern.end());
     name.push_back('\0');
-    const int fd = ::mkstemp(name.data());
-    if (fd < 0) throw Exception("GetTempFileName failed");
-    ::close(fd);
+    // The file only reserves the name.
+    if (!UniqueFileDescriptor(::mkstemp(name.data()))) throw Exception("GetTempFileName failed");
     return name.data();
 }
 

@@ -39,14 +39,13 @@ else()
   target_compile_definitions(ironvale_tinyxml INTERFACE TIXML_USE_STL)
 endif()
 
-add_library(ironvale_deps INTERFACE)
-target_link_libraries(ironvale_deps INTERFACE ironvale_lzma_decoder ironvale_tinyxml)
+# What every file of ours that includes windows.h must see alike; each folder
+# library passes it on.
+add_library(ironvale_platform INTERFACE)
 if(WIN32)
-  target_link_libraries(ironvale_deps INTERFACE wininet advapi32 shell32 shlwapi ole32 user32 gdi32 gdiplus crypt32 bcrypt)
-  target_compile_definitions(ironvale_deps INTERFACE WIN32_LEAN_AND_MEAN NOMINMAX _WIN32_WINNT=0x0601)
+  target_compile_definitions(ironvale_platform INTERFACE WIN32_LEAN_AND_MEAN NOMINMAX _WIN32_WINNT=0x0601)
 else()
   find_package(CURL REQUIRED)
   find_package(OpenSSL REQUIRED)
   find_package(Threads REQUIRED)
-  target_link_libraries(ironvale_deps INTERFACE CURL::libcurl OpenSSL::Crypto Threads::Threads)
 endif()

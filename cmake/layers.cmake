@@ -1,9 +1,10 @@
 # Every product folder is one static library that links only folders below
 # it. The calls of these two functions are also the include rules:
 # scripts/check_includes.py reads them and refuses a file that includes a
-# header of a folder its library does not reach.
+# header of a folder its call does not name, a named folder that no file
+# includes, and a named folder that is not below.
 
-# ironvale_folder_library(FOLDER [FOLDER_IT_LINKS ...]): the library
+# ironvale_folder_library(FOLDER [FOLDER_IT_INCLUDES ...]): the library
 # ironvale_<folder, '/' as '_'> from the folder's sources for this platform.
 # Entry points (main*.cpp) are left to the programs.
 function(ironvale_folder_library folder)
@@ -12,6 +13,7 @@ function(ironvale_folder_library folder)
   ironvale_folder_target(target ${folder})
   add_library(${target} STATIC ${sources})
   target_include_directories(${target} PUBLIC "${PROJECT_SOURCE_DIR}")
+  target_link_libraries(${target} PUBLIC ironvale_platform)
   foreach(dependency IN LISTS ARGN)
     ironvale_folder_target(linked ${dependency})
     target_link_libraries(${target} PUBLIC ${linked})
@@ -19,7 +21,7 @@ function(ironvale_folder_library folder)
   ironvale_warnings(${target})
 endfunction()
 
-# ironvale_folder_program(TARGET FOLDER [FOLDER_IT_LINKS ...]): a program
+# ironvale_folder_program(TARGET FOLDER [FOLDER_IT_INCLUDES ...]): a program
 # made of every source of FOLDER.
 function(ironvale_folder_program name folder)
   ironvale_collect_sources(sources ${folder})

@@ -1,8 +1,8 @@
 #include <curl/curl.h>
 
 #include <cstdint>
-#include <memory>
 
+#include "base/unique_handle.h"
 #include "net/http_transport.h"
 
 namespace {
@@ -11,16 +11,26 @@ namespace {
 // reported after every piece.
 const long kPieceSize = 64 * 1024;
 
-struct CurlList {
-    curl_slist* head = nullptr;
-    CurlList() = default;
-    CurlList(const CurlList&) = delete;
-    CurlList& operator=(const CurlList&) = delete;
-    ~CurlList() { curl_slist_free_all(head); }
-    void Append(const char* line) {
-        if (curl_slist* grown = curl_slist_append(head, line)) head = grown;
-    }
+struct CurlTraits {
+    using Value = CURL*;
+    static Value Invalid() { return nullptr; }
+    static void Close(Value value) { curl_easy_cleanup(value); }
 };
+
+struct CurlListTraits {
+    using Value = curl_slist*;
+    static Value Invalid() { return nullptr; }
+    static void Close(Value value) { curl_slist_free_all(value); }
+};
+
+// curl hands back the grown list, the same one unless it was empty; a
+// failed append leaves it as it was.
+void Append(UniqueHandle<CurlListTraits>& list, const char* line) {
+    if (curl_slist* grown = curl_slist_append(list.Get(), line)) {
+        list.Release();  // part of grown
+        list.Reset(grown);
+    }
+}
 
 struct Transfer {
     CURL* curl;
@@ -80,18 +90,18 @@ void InitializeLibraryOnce() {
 
 HttpOutcome HttpGet(const std::string& address, HttpResponseSink& sink) {
     InitializeLibraryOnce();
-    std::unique_ptr<CURL, decltype(&curl_easy_cleanup)> curl(curl_easy_init(), &curl_easy_cleanup);
+    const UniqueHandle<CurlTraits> curl(curl_easy_init());
     if (!curl) return HttpOutcome::NoSession;
-    Transfer transfer{curl.get(), sink};
-    CurlList headers;
-    headers.Append("Accept: */*");
-    headers.Append("Cache-Control: no-cache");
-    headers.Append("Pragma: no-cache");
+    Transfer transfer{curl.Get(), sink};
+    UniqueHandle<CurlListTraits> headers;
+    Append(headers, "Accept: */*");
+    Append(headers, "Cache-Control: no-cache");
+    Append(headers, "Pragma: no-cache");
 
-    CURL* handle = curl.get();
+    CURL* handle = curl.Get();
     curl_easy_setopt(handle, CURLOPT_URL, address.c_str());
     curl_easy_setopt(handle, CURLOPT_USERAGENT, "IronvaleUpdater");
-    curl_easy_setopt(handle, CURLOPT_HTTPHEADER, headers.head);
+    curl_easy_setopt(handle, CURLOPT_HTTPHEADER, headers.Get());
     curl_easy_setopt(handle, CURLOPT_PROTOCOLS_STR, "http");
     curl_easy_setopt(handle, CURLOPT_FOLLOWLOCATION, 1L);
     curl_easy_setopt(handle, CURLOPT_REDIR_PROTOCOLS_STR, "http,https");

@@ -4,23 +4,17 @@
 #include <chrono>
 #include <vector>
 
+#include "base/unique_handle.h"
 #include "net/http_transport.h"
 
 namespace {
 
-class InternetHandle {
-public:
-    explicit InternetHandle(HINTERNET value) : handle(value) {}
-    InternetHandle(const InternetHandle&) = delete;
-    InternetHandle& operator=(const InternetHandle&) = delete;
-    ~InternetHandle() {
-        if (handle != nullptr) InternetCloseHandle(handle);
-    }
-    HINTERNET get() const { return handle; }
-
-private:
-    HINTERNET handle;
+struct InternetHandleTraits {
+    using Value = HINTERNET;
+    static Value Invalid() { return nullptr; }
+    static void Close(Value value) { InternetCloseHandle(value); }
 };
+using InternetHandle = UniqueHandle<InternetHandleTraits>;
 
 const char kAgent[] = "IronvaleUpdater";
 const char kHeaders[] = "Accept: */*\r\n\r\n";
@@ -39,20 +33,20 @@ const auto kSlowRead = std::chrono::milliseconds(250);
 }  // namespace
 
 HttpOutcome HttpGet(const std::string& address, HttpResponseSink& sink) {
-    InternetHandle session(InternetOpenA(kAgent, INTERNET_OPEN_TYPE_PRECONFIG, nullptr, nullptr, 0));
-    if (session.get() == nullptr) return HttpOutcome::NoSession;
-    InternetHandle request(
-        InternetOpenUrlA(session.get(), address.c_str(), kHeaders, kHeadersLength, INTERNET_FLAG_RELOAD, 0));
-    if (request.get() == nullptr) return HttpOutcome::NoResponse;
+    const InternetHandle session(InternetOpenA(kAgent, INTERNET_OPEN_TYPE_PRECONFIG, nullptr, nullptr, 0));
+    if (!session) return HttpOutcome::NoSession;
+    const InternetHandle request(
+        InternetOpenUrlA(session.Get(), address.c_str(), kHeaders, kHeadersLength, INTERNET_FLAG_RELOAD, 0));
+    if (!request) return HttpOutcome::NoResponse;
 
     char status[32] = {};
     DWORD size = sizeof(status);
     std::string statusText;
-    if (HttpQueryInfoA(request.get(), HTTP_QUERY_STATUS_CODE, status, &size, nullptr)) statusText.assign(status, size);
+    if (HttpQueryInfoA(request.Get(), HTTP_QUERY_STATUS_CODE, status, &size, nullptr)) statusText.assign(status, size);
     DWORD length = 0;
     size = sizeof(length);
     const bool lengthKnown =
-        HttpQueryInfoA(request.get(), HTTP_QUERY_CONTENT_LENGTH | HTTP_QUERY_FLAG_NUMBER, &length, &size, nullptr);
+        HttpQueryInfoA(request.Get(), HTTP_QUERY_CONTENT_LENGTH | HTTP_QUERY_FLAG_NUMBER, &length, &size, nullptr);
     if (!sink.OnResponse(statusText, lengthKnown != FALSE, length)) return HttpOutcome::Abandoned;
 
     std::vector<char> buffer(kLargestRead);
@@ -60,7 +54,7 @@ HttpOutcome HttpGet(const std::string& address, HttpResponseSink& sink) {
     while (sink.KeepReading()) {
         const auto began = std::chrono::steady_clock::now();
         DWORD read = 0;
-        if (!InternetReadFile(request.get(), buffer.data(), piece, &read)) return HttpOutcome::ReadFailed;
+        if (!InternetReadFile(request.Get(), buffer.data(), piece, &read)) return HttpOutcome::ReadFailed;
         if (read == 0) return HttpOutcome::Complete;
         const auto took = std::chrono::steady_clock::now() - began;
         if (took < kQuickRead && piece < kLargestRead) piece *= 2;

@@ -1,23 +1,38 @@
 #include <curl/curl.h>
 #include <unistd.h>
 
-#include <memory>
 #include <vector>
 
+#include "base/unique_handle.h"
 #include "net/location.h"
 
+namespace {
+
+struct CurlUrlTraits {
+    using Value = CURLU*;
+    static Value Invalid() { return nullptr; }
+    static void Close(Value value) { curl_url_cleanup(value); }
+};
+
+struct CurlTextTraits {
+    using Value = char*;
+    static Value Invalid() { return nullptr; }
+    static void Close(Value value) { curl_free(value); }
+};
+
+}  // namespace
+
 std::string GetUrlHostName(const std::string& url) {
-    std::unique_ptr<CURLU, decltype(&curl_url_cleanup)> handle(curl_url(), &curl_url_cleanup);
+    const UniqueHandle<CurlUrlTraits> handle(curl_url());
     if (!handle) return std::string();
     // Any scheme, as the Windows URL cracker accepts any; no guessing of
     // a missing one, which that cracker refuses too.
-    if (curl_url_set(handle.get(), CURLUPART_URL, url.c_str(), CURLU_NON_SUPPORT_SCHEME) != CURLUE_OK) {
+    if (curl_url_set(handle.Get(), CURLUPART_URL, url.c_str(), CURLU_NON_SUPPORT_SCHEME) != CURLUE_OK) {
         return std::string();
     }
-    char* host = nullptr;
-    if (curl_url_get(handle.get(), CURLUPART_HOST, &host, 0) != CURLUE_OK || host == nullptr) return std::string();
-    std::string result(host);
-    curl_free(host);
+    UniqueHandle<CurlTextTraits> host;
+    if (curl_url_get(handle.Get(), CURLUPART_HOST, host.Receive(), 0) != CURLUE_OK || !host) return std::string();
+    std::string result(host.Get());
     // The Windows build cracks into a 256-byte buffer; keep the same limit.
     return result.size() < 256 ? result : std::string();
 }

@@ -3,20 +3,14 @@
 #include "net/sha256.h"
 
 struct Sha256::State {
-    State() : algorithm(BCRYPT_SHA256_ALGORITHM) {}
-    State(const State&) = delete;
-    State& operator=(const State&) = delete;
-    ~State() {
-        if (hash != nullptr) BCryptDestroyHash(hash);
-    }
-    CngAlgorithm algorithm;
-    BCRYPT_HASH_HANDLE hash = nullptr;
+    CngAlgorithm algorithm = OpenCngAlgorithm(BCRYPT_SHA256_ALGORITHM);
+    CngHash hash;
 };
 
 Sha256::Sha256() : state(new State) {
     // CNG keeps the hash object itself when given no buffer (Windows 7 on).
-    if (!state->algorithm.IsOpen() ||
-        !BCRYPT_SUCCESS(BCryptCreateHash(state->algorithm.handle, &state->hash, nullptr, 0, nullptr, 0, 0))) {
+    if (!state->algorithm ||
+        !BCRYPT_SUCCESS(BCryptCreateHash(state->algorithm.Get(), state->hash.Receive(), nullptr, 0, nullptr, 0, 0))) {
         throw Exception("SHA-256 is not available.");
     }
 }
@@ -28,7 +22,7 @@ void Sha256::Update(const void* data, size_t size) {
     const UCHAR* bytes = static_cast<const UCHAR*>(data);
     while (size > 0) {
         const ULONG piece = size > 0x40000000 ? 0x40000000 : static_cast<ULONG>(size);
-        if (!BCRYPT_SUCCESS(BCryptHashData(state->hash, const_cast<UCHAR*>(bytes), piece, 0))) {
+        if (!BCRYPT_SUCCESS(BCryptHashData(state->hash.Get(), const_cast<UCHAR*>(bytes), piece, 0))) {
             throw Exception("SHA-256 failed.");
         }
         bytes += piece;
@@ -38,7 +32,7 @@ void Sha256::Update(const void* data, size_t size) {
 
 Sha256Digest Sha256::Finish() {
     Sha256Digest digest{};
-    if (!BCRYPT_SUCCESS(BCryptFinishHash(state->hash, digest.data(), static_cast<ULONG>(digest.size()), 0))) {
+    if (!BCRYPT_SUCCESS(BCryptFinishHash(state->hash.Get(), digest.data(), static_cast<ULONG>(digest.size()), 0))) {
         throw Exception("SHA-256 failed.");
     }
     return digest;

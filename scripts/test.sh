@@ -18,7 +18,8 @@ rm -rf "$results"
 mkdir -p "$results"
 build_failures=0
 
-# The house rules: includes only point down the layers, and the code is
+# The house rules: each folder includes only the folders its CMake call names
+# (all below it), OS headers stay in _win/_posix files, and the code is
 # formatted with the repository's .clang-format.
 echo "== checking includes and formatting"
 if ! python3 scripts/check_includes.py >"$results/includes.log" 2>&1; then

@@ -6,21 +6,21 @@
 
 #include "base/command_line.h"
 #include "base/paths.h"
+#include "base/unique_handle_win.h"
 #include "state/processes.h"
 
 namespace {
 
 // Waits for a started process and takes its exit code; one that reports
 // itself still active is ended with 0.
-int32_t WaitAndClose(HANDLE process) {
-    WaitForSingleObject(process, INFINITE);
+int32_t WaitForExit(const UniqueKernelHandle& process) {
+    WaitForSingleObject(process.Get(), INFINITE);
     DWORD code = 0;
-    GetExitCodeProcess(process, &code);
+    GetExitCodeProcess(process.Get(), &code);
     if (code == STILL_ACTIVE) {
-        TerminateProcess(process, 0);
+        TerminateProcess(process.Get(), 0);
         code = 0;
     }
-    CloseHandle(process);
     return static_cast<int32_t>(code);
 }
 
@@ -42,12 +42,9 @@ int32_t RunProcess(const std::string& programPath, const std::string& parameters
                         folder.empty() ? nullptr : folder.c_str(), &startup, &process)) {
         return -1;
     }
-    CloseHandle(process.hThread);
-    if (!wait) {
-        CloseHandle(process.hProcess);
-        return 0;
-    }
-    return WaitAndClose(process.hProcess);
+    const UniqueKernelHandle thread(process.hThread);
+    const UniqueKernelHandle started(process.hProcess);
+    return wait ? WaitForExit(started) : 0;
 }
 
 int32_t RunElevated(const std::string& parameters, const std::string& programPath) {
@@ -62,7 +59,7 @@ int32_t RunElevated(const std::string& parameters, const std::string& programPat
     execute.lpDirectory = folder.empty() ? nullptr : folder.c_str();
     execute.nShow = SW_SHOW;
     if (!ShellExecuteExA(&execute) || execute.hProcess == nullptr) return -1;
-    return WaitAndClose(execute.hProcess);
+    return WaitForExit(UniqueKernelHandle(execute.hProcess));
 }
 
 std::string GetOwnCommandLine() { return GetCommandLineA(); }

@@ -2,6 +2,7 @@
 
 #include <vector>
 
+#include "base/unique_handle_win.h"
 #include "state/registry_manager.h"
 
 namespace {
@@ -26,18 +27,6 @@ HKEY RootKey(RegistryHive hive) {
 // changes nothing on a 32-bit Windows).
 constexpr REGSAM kView = KEY_WOW64_32KEY;
 
-// An open key, closed on every way out.
-class OpenKey {
-public:
-    OpenKey() = default;
-    OpenKey(const OpenKey&) = delete;
-    OpenKey& operator=(const OpenKey&) = delete;
-    ~OpenKey() {
-        if (key != nullptr) RegCloseKey(key);
-    }
-    HKEY key = nullptr;
-};
-
 }  // namespace
 
 namespace RegistryPlatform {
@@ -48,18 +37,18 @@ bool QueryValue(RegistryHive hive, const std::string& keyPath, const std::string
     // A key only the system's own view has (a 64-bit-only system such as a
     // Wine prefix without 32-bit support keeps DirectX's key there alone)
     // is still read.
-    OpenKey opened;
-    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_READ | kView, &opened.key) != ERROR_SUCCESS &&
-        RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_READ, &opened.key) != ERROR_SUCCESS) {
+    UniqueRegistryKey opened;
+    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_READ | kView, opened.Receive()) != ERROR_SUCCESS &&
+        RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_READ, opened.Receive()) != ERROR_SUCCESS) {
         return false;
     }
     DWORD size = 0;
-    if (RegQueryValueExA(opened.key, valueName.c_str(), nullptr, nullptr, nullptr, &size) != ERROR_SUCCESS ||
+    if (RegQueryValueExA(opened.Get(), valueName.c_str(), nullptr, nullptr, nullptr, &size) != ERROR_SUCCESS ||
         size == 0) {
         return false;
     }
     std::vector<BYTE> buffer(size);
-    if (RegQueryValueExA(opened.key, valueName.c_str(), nullptr, nullptr, buffer.data(), &size) != ERROR_SUCCESS) {
+    if (RegQueryValueExA(opened.Get(), valueName.c_str(), nullptr, nullptr, buffer.data(), &size) != ERROR_SUCCESS) {
         return false;
     }
     data.assign(reinterpret_cast<const char*>(buffer.data()), size);
@@ -69,10 +58,10 @@ bool QueryValue(RegistryHive hive, const std::string& keyPath, const std::string
 bool CreateKey(RegistryHive hive, const std::string& keyPath) {
     const HKEY root = RootKey(hive);
     if (root == nullptr) return false;
-    OpenKey created;
+    UniqueRegistryKey created;
     DWORD disposition = 0;
     const LONG result = RegCreateKeyExA(root, keyPath.c_str(), 0, nullptr, REG_OPTION_NON_VOLATILE, KEY_WRITE | kView,
-                                        nullptr, &created.key, &disposition);
+                                        nullptr, created.Receive(), &disposition);
     return result == ERROR_SUCCESS && (disposition == REG_CREATED_NEW_KEY || disposition == REG_OPENED_EXISTING_KEY);
 }
 
@@ -80,10 +69,10 @@ bool SetStringValue(RegistryHive hive, const std::string& keyPath, const std::st
                     const std::string& text) {
     const HKEY root = RootKey(hive);
     if (root == nullptr) return false;
-    OpenKey opened;
-    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_WRITE | kView, &opened.key) != ERROR_SUCCESS) return false;
+    UniqueRegistryKey opened;
+    if (RegOpenKeyExA(root, keyPath.c_str(), 0, KEY_WRITE | kView, opened.Receive()) != ERROR_SUCCESS) return false;
     const DWORD size = static_cast<DWORD>(text.size() + 1);
-    return RegSetValueExA(opened.key, valueName.c_str(), 0, REG_SZ, reinterpret_cast<const BYTE*>(text.c_str()),
+    return RegSetValueExA(opened.Get(), valueName.c_str(), 0, REG_SZ, reinterpret_cast<const BYTE*>(text.c_str()),
                           size) == ERROR_SUCCESS;
 }
 

@@ -2,55 +2,50 @@
 // windows.h first: shlwapi.h needs its types.
 #include <shlwapi.h>
 
+#include "base/unique_handle_win.h"
 #include "state/system_facts.h"
 
 namespace {
 
-// A token handle, closed on every way out.
-class TokenHandle {
-public:
-    TokenHandle() = default;
-    TokenHandle(const TokenHandle&) = delete;
-    TokenHandle& operator=(const TokenHandle&) = delete;
-    ~TokenHandle() {
-        if (handle != nullptr) CloseHandle(handle);
-    }
-    HANDLE handle = nullptr;
+// A SID from AllocateAndInitializeSid.
+struct SidTraits {
+    using Value = PSID;
+    static Value Invalid() { return nullptr; }
+    static void Close(Value value) { FreeSid(value); }
 };
 
 bool IsMemberOfBuiltinGroup(DWORD alias) {
     SID_IDENTIFIER_AUTHORITY ntAuthority = SECURITY_NT_AUTHORITY;
-    PSID group = nullptr;
-    if (!AllocateAndInitializeSid(&ntAuthority, 2, SECURITY_BUILTIN_DOMAIN_RID, alias, 0, 0, 0, 0, 0, 0, &group)) {
+    UniqueHandle<SidTraits> group;
+    if (!AllocateAndInitializeSid(&ntAuthority, 2, SECURITY_BUILTIN_DOMAIN_RID, alias, 0, 0, 0, 0, 0, 0,
+                                  group.Receive())) {
         return false;
     }
     BOOL member = FALSE;
-    const BOOL checked = CheckTokenMembership(nullptr, group, &member);
-    FreeSid(group);
-    return checked && member;
+    return CheckTokenMembership(nullptr, group.Get(), &member) && member;
 }
 
 }  // namespace
 
 bool IsUacEnabled() {
-    HKEY key = nullptr;
+    UniqueRegistryKey key;
     if (RegOpenKeyExA(HKEY_LOCAL_MACHINE, "SOFTWARE\\Microsoft\\Windows\\CurrentVersion\\Policies\\System", 0, KEY_READ,
-                      &key) != ERROR_SUCCESS) {
+                      key.Receive()) != ERROR_SUCCESS) {
         return false;
     }
     DWORD value = 0;
     DWORD size = sizeof(value);
-    const LONG result = RegQueryValueExA(key, "EnableLUA", nullptr, nullptr, reinterpret_cast<BYTE*>(&value), &size);
-    RegCloseKey(key);
+    const LONG result =
+        RegQueryValueExA(key.Get(), "EnableLUA", nullptr, nullptr, reinterpret_cast<BYTE*>(&value), &size);
     return result == ERROR_SUCCESS && value != 0;
 }
 
 int32_t GetElevationType() {
-    TokenHandle token;
-    if (!OpenProcessToken(GetCurrentProcess(), TOKEN_QUERY, &token.handle)) return 0;
+    UniqueKernelHandle token;
+    if (!OpenProcessToken(GetCurrentProcess(), TOKEN_QUERY, token.Receive())) return 0;
     TOKEN_ELEVATION_TYPE type = TokenElevationTypeDefault;
     DWORD size = 0;
-    if (!GetTokenInformation(token.handle, TokenElevationType, &type, sizeof(type), &size)) return 0;
+    if (!GetTokenInformation(token.Get(), TokenElevationType, &type, sizeof(type), &size)) return 0;
     return static_cast<int32_t>(type);
 }
 
@@ -73,13 +68,13 @@ bool ReadOsVersion(uint32_t& major, uint32_t& minor) {
 }
 
 bool ReadProcessOwnerSid(std::array<uint8_t, 6>& authority, std::vector<uint32_t>& subAuthorities) {
-    TokenHandle token;
-    if (!OpenProcessToken(GetCurrentProcess(), TOKEN_QUERY, &token.handle)) return false;
+    UniqueKernelHandle token;
+    if (!OpenProcessToken(GetCurrentProcess(), TOKEN_QUERY, token.Receive())) return false;
     DWORD size = 0;
-    GetTokenInformation(token.handle, TokenUser, nullptr, 0, &size);
+    GetTokenInformation(token.Get(), TokenUser, nullptr, 0, &size);
     if (size == 0) return false;
     std::vector<BYTE> buffer(size);
-    if (!GetTokenInformation(token.handle, TokenUser, buffer.data(), size, &size)) return false;
+    if (!GetTokenInformation(token.Get(), TokenUser, buffer.data(), size, &size)) return false;
     const PSID sid = reinterpret_cast<TOKEN_USER*>(buffer.data())->User.Sid;
     if (!IsValidSid(sid)) return false;
     const SID_IDENTIFIER_AUTHORITY* identifier = GetSidIdentifierAuthority(sid);

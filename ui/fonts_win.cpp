@@ -14,8 +14,8 @@ namespace {
 // thread both ask for the dialog font, hence the lock.
 struct FontCache {
     std::mutex mutex;
-    HFONT dialogFont = nullptr;
-    HFONT mainWindowSystemFont = nullptr;
+    UniqueFont dialogFont;
+    UniqueFont mainWindowSystemFont;
     std::unique_ptr<Gdiplus::Font> mainWindowFont;
 };
 
@@ -32,39 +32,38 @@ int CALLBACK CollectFontName(const LOGFONTA* logFont, const TEXTMETRICA*, DWORD,
     return 1;
 }
 
-HFONT MakeFont(const std::string& faceName, int32_t height, int32_t weight) {
+UniqueFont MakeFont(const std::string& faceName, int32_t height, int32_t weight) {
     LOGFONTA description = {};
     description.lfHeight = height;
     description.lfWeight = weight;
     description.lfCharSet = SHIFTJIS_CHARSET;
     lstrcpynA(description.lfFaceName, faceName.c_str(), LF_FACESIZE);
-    return CreateFontIndirectA(&description);
+    return UniqueFont(CreateFontIndirectA(&description));
 }
 
 }  // namespace
 
-HFONT CreateBestFont(const std::vector<FontCandidate>& candidates, int32_t defaultHeight, int32_t defaultWeight) {
-    HDC screen = GetDC(nullptr);
+UniqueFont CreateBestFont(const std::vector<FontCandidate>& candidates, int32_t defaultHeight, int32_t defaultWeight) {
+    const UniqueScreenDc screen(GetDC(nullptr));
     LOGFONTA query = {};
     query.lfCharSet = SHIFTJIS_CHARSET;
     std::vector<std::string> installed;
-    EnumFontFamiliesExA(screen, &query, CollectFontName, reinterpret_cast<LPARAM>(&installed), 0);
-    HFONT font = nullptr;
+    EnumFontFamiliesExA(screen.Get(), &query, CollectFontName, reinterpret_cast<LPARAM>(&installed), 0);
+    UniqueFont font;
     if (!installed.empty()) {
         const FontCandidate* chosen = ChooseFontCandidate(candidates, installed);
         if (chosen != nullptr) font = MakeFont(chosen->faceName, chosen->height, chosen->weight);
-        if (font == nullptr) font = MakeFont("", defaultHeight, defaultWeight);
+        if (!font) font = MakeFont("", defaultHeight, defaultWeight);
     }
-    if (font != nullptr) {
+    if (font) {
         // The face the system really gave us, which for an empty name is
         // its own choice.
         char face[LF_FACESIZE] = {};
-        HGDIOBJ previous = SelectObject(screen, font);
-        GetTextFaceA(screen, LF_FACESIZE, face);
-        SelectObject(screen, previous);
+        HGDIOBJ previous = SelectObject(screen.Get(), font.Get());
+        GetTextFaceA(screen.Get(), LF_FACESIZE, face);
+        SelectObject(screen.Get(), previous);
         LOG(Info) << "Created font: " << face;
     }
-    ReleaseDC(nullptr, screen);
     return font;
 }
 
@@ -72,11 +71,11 @@ HFONT GetDialogFont() {
     if (!NeedsJapaneseFont()) return nullptr;
     FontCache& cache = Cache();
     std::lock_guard<std::mutex> lock(cache.mutex);
-    if (cache.dialogFont == nullptr) {
+    if (!cache.dialogFont) {
         LOG(Trace) << "Finding dialog font...";
         cache.dialogFont = CreateBestFont(GetDialogFontCandidates(), 14, 400);
     }
-    return cache.dialogFont;
+    return cache.dialogFont.Get();
 }
 
 Gdiplus::Font* GetMainWindowFont() {
@@ -86,15 +85,14 @@ Gdiplus::Font* GetMainWindowFont() {
     if (cache.mainWindowFont == nullptr) {
         LOG(Trace) << "Finding main window font...";
         cache.mainWindowSystemFont = CreateBestFont(GetMainWindowFontCandidates(), 24, 700);
-        HDC screen = GetDC(nullptr);
+        const UniqueScreenDc screen(GetDC(nullptr));
         LOGFONTA description = {};
-        if (cache.mainWindowSystemFont != nullptr &&
-            GetObjectA(cache.mainWindowSystemFont, sizeof(description), &description) != 0) {
-            cache.mainWindowFont = std::make_unique<Gdiplus::Font>(screen, &description);
+        if (cache.mainWindowSystemFont &&
+            GetObjectA(cache.mainWindowSystemFont.Get(), sizeof(description), &description) != 0) {
+            cache.mainWindowFont = std::make_unique<Gdiplus::Font>(screen.Get(), &description);
         } else {
-            cache.mainWindowFont = std::make_unique<Gdiplus::Font>(screen);
+            cache.mainWindowFont = std::make_unique<Gdiplus::Font>(screen.Get());
         }
-        ReleaseDC(nullptr, screen);
     }
     return cache.mainWindowFont.get();
 }
@@ -102,10 +100,8 @@ Gdiplus::Font* GetMainWindowFont() {
 void DeleteFonts() {
     FontCache& cache = Cache();
     std::lock_guard<std::mutex> lock(cache.mutex);
-    if (cache.dialogFont != nullptr) DeleteObject(cache.dialogFont);
-    if (cache.mainWindowSystemFont != nullptr) DeleteObject(cache.mainWindowSystemFont);
-    cache.dialogFont = nullptr;
-    cache.mainWindowSystemFont = nullptr;
+    cache.dialogFont.Reset();
+    cache.mainWindowSystemFont.Reset();
     cache.mainWindowFont.reset();
 }
 

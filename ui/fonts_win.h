@@ -14,12 +14,13 @@
 #include <vector>
 
 #include "ui/fonts.h"
+#include "ui/gdi_handles_win.h"
 
 // Enumerates the installed fonts with Japanese characters and creates the
 // first available candidate; with none of them installed, the system's
 // choice for an empty face name at the default size. Null when no
 // Japanese font is installed at all.
-HFONT CreateBestFont(const std::vector<FontCandidate>& candidates, int32_t defaultHeight, int32_t defaultWeight);
+UniqueFont CreateBestFont(const std::vector<FontCandidate>& candidates, int32_t defaultHeight, int32_t defaultWeight);
 
 // Null unless the language is Japanese. Made on first use and kept; while
 // no Japanese font is installed, each call searches again.

@@ -16,25 +16,24 @@ GdiPlusBitmapResource::~GdiPlusBitmapResource() { Release(); }
 
 void GdiPlusBitmapResource::Release() {
     bitmap.reset();
-    if (memory != nullptr) GlobalFree(memory);
-    memory = nullptr;
+    memory.Reset();
 }
 
 bool GdiPlusBitmapResource::Load(const char* name) {
     Release();
     ResourceBytes bytes;
     if (!FindProgramResource(name, "PNG", bytes)) return false;
-    memory = GlobalAlloc(GMEM_MOVEABLE, bytes.size);
-    if (memory == nullptr) return false;
-    void* block = GlobalLock(memory);
+    memory.Reset(GlobalAlloc(GMEM_MOVEABLE, bytes.size));
+    if (!memory) return false;
+    void* block = GlobalLock(memory.Get());
     if (block == nullptr) {
         Release();
         return false;
     }
     std::memcpy(block, bytes.data, bytes.size);
-    GlobalUnlock(memory);
+    GlobalUnlock(memory.Get());
     IStream* stream = nullptr;
-    if (CreateStreamOnHGlobal(memory, FALSE, &stream) == S_OK) {
+    if (CreateStreamOnHGlobal(memory.Get(), FALSE, &stream) == S_OK) {
         bitmap.reset(Gdiplus::Bitmap::FromStream(stream));
         stream->Release();
     }

@@ -12,6 +12,8 @@
 
 #include <memory>
 
+#include "base/unique_handle.h"
+
 // Owns one GDI+ bitmap, or none.
 class GdiPlusBitmap {
 public:
@@ -44,5 +46,10 @@ public:
     void Release();
 
 private:
-    HGLOBAL memory = nullptr;
+    struct GlobalMemoryTraits {
+        using Value = HGLOBAL;
+        static Value Invalid() { return nullptr; }
+        static void Close(Value value) { GlobalFree(value); }
+    };
+    UniqueHandle<GlobalMemoryTraits> memory;
 };

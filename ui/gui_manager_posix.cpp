@@ -8,6 +8,7 @@
 
 #include "base/encoding.h"
 #include "base/exception.h"
+#include "base/unique_handle_posix.h"
 #include "text/localization.h"
 #include "ui/gui_manager.h"
 
@@ -58,7 +59,9 @@ public:
     std::mutex mutex;  // progress reports come from any thread
     std::thread thread;
     std::atomic<bool> running{false};
-    int pipe[2] = {-1, -1};
+    // Ctrl+C and Stop write to the listener through this pipe.
+    UniqueFileDescriptor readEnd;
+    UniqueFileDescriptor writeEnd;
     struct sigaction previousAction = {};
     bool handlerInstalled = false;
     bool terminal = false;
@@ -71,7 +74,7 @@ public:
 void GuiManager::UiThread::Listen(GuiManager& owner) {
     for (;;) {
         char command = 0;
-        const ssize_t count = read(pipe[0], &command, 1);
+        const ssize_t count = read(readEnd.Get(), &command, 1);
         if (count < 0 && errno == EINTR) continue;
         if (count <= 0 || command == 'q') break;
         if (owner.ConfirmCancel(HitArea::Cancel)) break;
@@ -121,11 +124,14 @@ void GuiManager::Start(ICancelable* cancelableToTell) {
     }
     Stop();
     cancelable = cancelableToTell;
-    if (::pipe(ui->pipe) != 0) throw Exception("Could not start the console's listener.");
+    int ends[2];
+    if (::pipe(ends) != 0) throw Exception("Could not start the console's listener.");
+    ui->readEnd.Reset(ends[0]);
+    ui->writeEnd.Reset(ends[1]);
     ui->terminal = isatty(STDERR_FILENO) != 0;
     {
         std::lock_guard<std::mutex> lock(ui->mutex);
-        interruptPipe = ui->pipe[1];
+        interruptPipe = ui->writeEnd.Get();
         struct sigaction action = {};
         action.sa_handler = OnInterrupt;
         action.sa_flags = SA_RESTART;
@@ -138,12 +144,11 @@ void GuiManager::Start(ICancelable* cancelableToTell) {
 
 void GuiManager::Stop() {
     if (!ui->thread.joinable()) return;
-    Send(ui->pipe[1], 'q');
+    Send(ui->writeEnd.Get(), 'q');
     ui->thread.join();
     ui->RestoreInterruptHandler();
-    close(ui->pipe[0]);
-    close(ui->pipe[1]);
-    ui->pipe[0] = ui->pipe[1] = -1;
+    ui->readEnd.Reset();
+    ui->writeEnd.Reset();
     std::lock_guard<std::mutex> lock(ui->mutex);
     ui->EndLine();
     ui->shown = false;

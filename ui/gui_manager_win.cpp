@@ -10,9 +10,11 @@
 
 #include "base/exception.h"
 #include "base/log.h"
+#include "base/unique_handle_win.h"
 #include "resources/resource_ids.h"
 #include "text/localization.h"
 #include "ui/fonts_win.h"
+#include "ui/gdi_handles_win.h"
 #include "ui/gdiplus_bitmap_win.h"
 #include "ui/message_box_hook_win.h"
 
@@ -27,9 +29,6 @@ const wchar_t* const kWindowClassName = L"IRONVALE.MAIN";
 class GuiManager::UiThread {
 public:
     explicit UiThread(GuiManager& manager);
-    UiThread(const UiThread&) = delete;
-    UiThread& operator=(const UiThread&) = delete;
-    ~UiThread();
 
     bool IsUiThread() const { return threadId != 0 && GetCurrentThreadId() == threadId; }
     // Marks area for repainting, without erasing; nothing without a window.
@@ -37,10 +36,10 @@ public:
 
     static DWORD WINAPI ThreadMain(void* parameter);
 
-    HANDLE thread = nullptr;
+    UniqueKernelHandle thread;
     std::atomic<DWORD> threadId{0};
     std::atomic<HWND> window{nullptr};
-    HANDLE readyEvent = nullptr;
+    UniqueKernelHandle readyEvent;
 
 private:
     static LRESULT CALLBACK WindowProcedure(HWND window, UINT message, WPARAM wParam, LPARAM lParam);
@@ -58,9 +57,9 @@ private:
 
     GuiManager& owner;
     ATOM windowClass = 0;
-    HDC windowDc = nullptr;
-    HDC memoryDc = nullptr;
-    HBITMAP backBuffer = nullptr;
+    HDC windowDc = nullptr;  // released with its window, which it needs
+    UniqueMemoryDc memoryDc;
+    UniqueBitmap backBuffer;
     HGDIOBJ previousBitmap = nullptr;
     HINSTANCE instance = nullptr;
     bool dragging = false;
@@ -81,11 +80,6 @@ GuiManager::UiThread::UiThread(GuiManager& manager)
       instance(GetModuleHandleW(nullptr)),
       handCursor(LoadCursor(nullptr, IDC_HAND)) {}
 
-GuiManager::UiThread::~UiThread() {
-    if (thread != nullptr) CloseHandle(thread);
-    if (readyEvent != nullptr) CloseHandle(readyEvent);
-}
-
 void GuiManager::UiThread::Invalidate(const PixelRect& area) const {
     HWND target = window;
     if (target == nullptr) return;
@@ -104,7 +98,7 @@ void GuiManager::UiThread::Run() {
     // by a hook of this thread.
     const bool hooked = InstallMessageBoxHook();
     CreateMainWindow();
-    SetEvent(readyEvent);
+    SetEvent(readyEvent.Get());
     MSG message;
     bool running = true;
     while (running && GetMessageW(&message, nullptr, 0, 0) > 0) {
@@ -170,23 +164,20 @@ void GuiManager::UiThread::CreateMainWindow() {
     // The system owns the region once it is set.
     SetWindowRgn(created, CreateRectRgn(1, 1, width - 1, height - 1), TRUE);
     windowDc = GetDC(created);
-    memoryDc = CreateCompatibleDC(windowDc);
-    backBuffer = CreateCompatibleBitmap(windowDc, width, height);
-    previousBitmap = SelectObject(memoryDc, backBuffer);
+    memoryDc.Reset(CreateCompatibleDC(windowDc));
+    backBuffer.Reset(CreateCompatibleBitmap(windowDc, width, height));
+    previousBitmap = SelectObject(memoryDc.Get(), backBuffer.Get());
     window = created;
 }
 
 void GuiManager::UiThread::DestroyMainWindow() {
     HWND destroyed = window.exchange(nullptr);
-    if (memoryDc != nullptr) {
-        SelectObject(memoryDc, previousBitmap);
-        DeleteDC(memoryDc);
-    }
-    if (backBuffer != nullptr) DeleteObject(backBuffer);
+    // The bitmap goes back out of the memory context before either is deleted.
+    if (memoryDc) SelectObject(memoryDc.Get(), previousBitmap);
+    memoryDc.Reset();
+    backBuffer.Reset();
     if (windowDc != nullptr) ReleaseDC(destroyed, windowDc);
     if (destroyed != nullptr) DestroyWindow(destroyed);
-    memoryDc = nullptr;
-    backBuffer = nullptr;
     windowDc = nullptr;
     font = MainWindowFont();
     progressUnit.Release();
@@ -262,10 +253,10 @@ void GuiManager::UiThread::Paint() {
     RECT rect;
     GetWindowRect(window, &rect);
     {
-        Gdiplus::Graphics graphics(memoryDc);
+        Gdiplus::Graphics graphics(memoryDc.Get());
         RenderFrame(graphics);
     }
-    BitBlt(windowDc, 0, 0, rect.right - rect.left, rect.bottom - rect.top, memoryDc, 0, 0, SRCCOPY);
+    BitBlt(windowDc, 0, 0, rect.right - rect.left, rect.bottom - rect.top, memoryDc.Get(), 0, 0, SRCCOPY);
     // Without this the system would ask for the same paint again at once.
     ValidateRect(window, nullptr);
 }
@@ -324,31 +315,31 @@ GuiManager::GuiManager() : ui(std::make_unique<UiThread>(*this)) {}
 GuiManager::~GuiManager() { Stop(); }
 
 void GuiManager::Start(ICancelable* cancelableToTell) {
-    if (ui->thread != nullptr) {
-        if (WaitForSingleObject(ui->thread, 100) != WAIT_OBJECT_0) throw Exception("GuiManager is already running.");
-        CloseHandle(ui->thread);
-        ui->thread = nullptr;
+    if (ui->thread) {
+        if (WaitForSingleObject(ui->thread.Get(), 100) != WAIT_OBJECT_0) {
+            throw Exception("GuiManager is already running.");
+        }
+        ui->thread.Reset();
         ui->threadId = 0;
     }
     cancelable = cancelableToTell;
-    ResetEvent(ui->readyEvent);
+    ResetEvent(ui->readyEvent.Get());
     DWORD id = 0;
-    ui->thread = CreateThread(nullptr, 0, UiThread::ThreadMain, ui.get(), 0, &id);
-    if (ui->thread == nullptr) throw Exception("Could not start the window's thread.");
+    ui->thread.Reset(CreateThread(nullptr, 0, UiThread::ThreadMain, ui.get(), 0, &id));
+    if (!ui->thread) throw Exception("Could not start the window's thread.");
     ui->threadId = id;
-    HANDLE handles[2] = {ui->thread, ui->readyEvent};
+    HANDLE handles[2] = {ui->thread.Get(), ui->readyEvent.Get()};
     WaitForMultipleObjects(2, handles, FALSE, INFINITE);
 }
 
 void GuiManager::Stop() {
-    if (ui->thread == nullptr) return;
+    if (!ui->thread) return;
     // A thread message that arrives while a box of the UI thread is open is
     // lost in the box's own message loop: post again until the thread ends.
     do {
         PostThreadMessageW(ui->threadId, kQuitUiThreadMessage, 0, 0);
-    } while (WaitForSingleObject(ui->thread, 100) == WAIT_TIMEOUT);
-    CloseHandle(ui->thread);
-    ui->thread = nullptr;
+    } while (WaitForSingleObject(ui->thread.Get(), 100) == WAIT_TIMEOUT);
+    ui->thread.Reset();
     ui->threadId = 0;
 }
 

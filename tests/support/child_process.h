@@ -4,6 +4,8 @@
 #include <string>
 #include <vector>
 
+#include "base/unique_handle.h"
+
 // A program of the test build run as a child process, which the test may kill at any moment: SIGKILL natively,
 // TerminateProcess on Windows, so nothing of the child's own runs after the kill.
 class ChildProcess {
@@ -19,7 +21,13 @@ public:
     int Wait();
 
 private:
-    intptr_t handle = -1;
+    // The process HANDLE on Windows; natively the pid, which is no handle (Wait reaps it). -1 for none.
+    struct Traits {
+        using Value = intptr_t;
+        static Value Invalid() { return -1; }
+        static void Close(Value value);
+    };
+    UniqueHandle<Traits> handle;
     bool waited = false;
     int exitCode = -1;
 };

@@ -10,6 +10,8 @@
 
 extern char** environ;
 
+void ChildProcess::Traits::Close(intptr_t) {}
+
 ChildProcess::ChildProcess(const std::string& program, const std::vector<std::string>& arguments) {
     // posix_spawn leaves the words as they are.
     std::vector<char*> argv{const_cast<char*>(program.c_str())};
@@ -19,7 +21,7 @@ ChildProcess::ChildProcess(const std::string& program, const std::vector<std::st
     if (posix_spawn(&child, program.c_str(), nullptr, nullptr, argv.data(), environ) != 0) {
         throw std::runtime_error("cannot start " + program);
     }
-    handle = child;
+    handle.Reset(child);
 }
 
 ChildProcess::~ChildProcess() {
@@ -29,12 +31,12 @@ ChildProcess::~ChildProcess() {
     }
 }
 
-void ChildProcess::Kill() { kill(static_cast<pid_t>(handle), SIGKILL); }
+void ChildProcess::Kill() { kill(static_cast<pid_t>(handle.Get()), SIGKILL); }
 
 int ChildProcess::Wait() {
     if (!waited) {
         int status = 0;
-        waitpid(static_cast<pid_t>(handle), &status, 0);
+        waitpid(static_cast<pid_t>(handle.Get()), &status, 0);
         exitCode = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
         waited = true;
     }

@@ -3,7 +3,10 @@
 #include <stdexcept>
 
 #include "base/paths.h"
+#include "base/unique_handle_win.h"
 #include "tests/support/child_process.h"
+
+void ChildProcess::Traits::Close(intptr_t value) { CloseHandle(reinterpret_cast<HANDLE>(value)); }
 
 ChildProcess::ChildProcess(const std::string& program, const std::vector<std::string>& arguments) {
     std::string commandLine = "\"" + program + "\"";
@@ -16,23 +19,22 @@ ChildProcess::ChildProcess(const std::string& program, const std::vector<std::st
     if (!CreateProcessA(nullptr, buffer.data(), nullptr, nullptr, FALSE, 0, nullptr, nullptr, &startup, &process)) {
         throw std::runtime_error("cannot start " + program);
     }
-    CloseHandle(process.hThread);
-    handle = reinterpret_cast<intptr_t>(process.hProcess);
+    const UniqueKernelHandle thread(process.hThread);
+    handle.Reset(reinterpret_cast<intptr_t>(process.hProcess));
 }
 
 ChildProcess::~ChildProcess() {
     Kill();
     Wait();
-    CloseHandle(reinterpret_cast<HANDLE>(handle));
 }
 
-void ChildProcess::Kill() { TerminateProcess(reinterpret_cast<HANDLE>(handle), 137); }
+void ChildProcess::Kill() { TerminateProcess(reinterpret_cast<HANDLE>(handle.Get()), 137); }
 
 int ChildProcess::Wait() {
     if (!waited) {
-        WaitForSingleObject(reinterpret_cast<HANDLE>(handle), INFINITE);
+        WaitForSingleObject(reinterpret_cast<HANDLE>(handle.Get()), INFINITE);
         DWORD code = 0;
-        GetExitCodeProcess(reinterpret_cast<HANDLE>(handle), &code);
+        GetExitCodeProcess(reinterpret_cast<HANDLE>(handle.Get()), &code);
         exitCode = code == 137 ? -1 : static_cast<int>(code);
         waited = true;
     }

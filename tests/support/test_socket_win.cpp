@@ -23,25 +23,24 @@ TestSocket TestSocket::ListenOnLoopback(uint16_t& port) {
 }
 
 bool TestSocket::Readable(int timeoutMs) const {
-    WSAPOLLFD entry = {static_cast<SOCKET>(handle), POLLRDNORM, 0};
+    WSAPOLLFD entry = {static_cast<SOCKET>(handle.Get()), POLLRDNORM, 0};
     return WSAPoll(&entry, 1, timeoutMs) > 0;
 }
 
 TestSocket TestSocket::Accept() const {
-    return TestSocket(static_cast<intptr_t>(::accept(static_cast<SOCKET>(handle), nullptr, nullptr)));
+    return TestSocket(static_cast<intptr_t>(::accept(static_cast<SOCKET>(handle.Get()), nullptr, nullptr)));
 }
 
 int TestSocket::Receive(char* buffer, size_t size) const {
-    return ::recv(static_cast<SOCKET>(handle), buffer, static_cast<int>(size), 0);
+    return ::recv(static_cast<SOCKET>(handle.Get()), buffer, static_cast<int>(size), 0);
 }
 
 bool TestSocket::SendAll(const char* data, size_t size) const {
     // A blocking send returns once all is sent.
-    return ::send(static_cast<SOCKET>(handle), data, static_cast<int>(size), 0) == static_cast<int>(size);
+    return ::send(static_cast<SOCKET>(handle.Get()), data, static_cast<int>(size), 0) == static_cast<int>(size);
 }
 
-void TestSocket::Close() {
-    if (handle == -1) return;
-    ::shutdown(static_cast<SOCKET>(handle), SD_SEND);
-    ::closesocket(static_cast<SOCKET>(std::exchange(handle, -1)));
+void TestSocket::Traits::Close(intptr_t value) {
+    ::shutdown(static_cast<SOCKET>(value), SD_SEND);
+    ::closesocket(static_cast<SOCKET>(value));
 }

@@ -3,6 +3,7 @@
 #include <windows.h>
 
 #include "base/encoding.h"
+#include "base/unique_handle_win.h"
 
 namespace {
 
@@ -40,24 +41,24 @@ int RunProgram(const std::vector<std::string>& arguments, bool quiet) {
     STARTUPINFOW startup = {};
     startup.cb = sizeof(startup);
     SECURITY_ATTRIBUTES inheritable = {sizeof(inheritable), nullptr, TRUE};
-    HANDLE nowhere = INVALID_HANDLE_VALUE;
+    UniqueFileHandle nowhere;
     if (quiet) {
-        nowhere = CreateFileW(L"NUL", GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE, &inheritable, OPEN_EXISTING, 0,
-                              nullptr);
+        nowhere.Reset(CreateFileW(L"NUL", GENERIC_WRITE, FILE_SHARE_READ | FILE_SHARE_WRITE, &inheritable,
+                                  OPEN_EXISTING, 0, nullptr));
         startup.dwFlags = STARTF_USESTDHANDLES;
         startup.hStdInput = GetStdHandle(STD_INPUT_HANDLE);
-        startup.hStdOutput = nowhere;
-        startup.hStdError = nowhere;
+        startup.hStdOutput = nowhere.Get();
+        startup.hStdError = nowhere.Get();
     }
     PROCESS_INFORMATION process = {};
     const BOOL started = CreateProcessW(nullptr, &commandLine[0], nullptr, nullptr, quiet ? TRUE : FALSE, 0, nullptr,
                                         nullptr, &startup, &process);
-    if (nowhere != INVALID_HANDLE_VALUE) CloseHandle(nowhere);
+    nowhere.Reset();
     if (!started) return -1;
-    CloseHandle(process.hThread);
-    WaitForSingleObject(process.hProcess, INFINITE);
+    const UniqueKernelHandle thread(process.hThread);
+    const UniqueKernelHandle child(process.hProcess);
+    WaitForSingleObject(child.Get(), INFINITE);
     DWORD code = 0;
-    const BOOL known = GetExitCodeProcess(process.hProcess, &code);
-    CloseHandle(process.hProcess);
+    const BOOL known = GetExitCodeProcess(child.Get(), &code);
     return known ? static_cast<int>(code) : -1;
 }

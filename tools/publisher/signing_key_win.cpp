@@ -1,7 +1,7 @@
 #include <cstring>
-#include <memory>
 
 #include "base/exception.h"
+#include "base/unique_handle_win.h"
 #include "net/cng_handles_win.h"
 #include "tools/publisher/signing_key.h"
 
@@ -10,22 +10,16 @@ namespace {
 // CNG's private blob: its header, X, Y, then the scalar.
 constexpr size_t kBlobSize = sizeof(BCRYPT_ECCKEY_BLOB) + 3 * 32;
 
-struct FileClose {
-    void operator()(HANDLE file) const {
-        if (file != INVALID_HANDLE_VALUE) CloseHandle(file);
-    }
-};
-
 }  // namespace
 
 P256PrivateKey GenerateSigningKey() {
-    const CngAlgorithm algorithm(BCRYPT_ECDSA_P256_ALGORITHM);
+    const CngAlgorithm algorithm = OpenCngAlgorithm(BCRYPT_ECDSA_P256_ALGORITHM);
     CngKey pair;
     UCHAR blob[kBlobSize];
     ULONG size = 0;
-    if (!algorithm.IsOpen() || !BCRYPT_SUCCESS(BCryptGenerateKeyPair(algorithm.handle, &pair.handle, 256, 0)) ||
-        !BCRYPT_SUCCESS(BCryptFinalizeKeyPair(pair.handle, 0)) ||
-        !BCRYPT_SUCCESS(BCryptExportKey(pair.handle, nullptr, BCRYPT_ECCPRIVATE_BLOB, blob, sizeof blob, &size, 0)) ||
+    if (!algorithm || !BCRYPT_SUCCESS(BCryptGenerateKeyPair(algorithm.Get(), pair.Receive(), 256, 0)) ||
+        !BCRYPT_SUCCESS(BCryptFinalizeKeyPair(pair.Get(), 0)) ||
+        !BCRYPT_SUCCESS(BCryptExportKey(pair.Get(), nullptr, BCRYPT_ECCPRIVATE_BLOB, blob, sizeof blob, &size, 0)) ||
         size != sizeof blob) {
         throw Exception("Cannot make an ECDSA P-256 key.");
     }
@@ -43,16 +37,16 @@ P256Signature SignDigest(const P256PrivateKey& key, const Sha256Digest& digest) 
     std::memcpy(blob, &header, sizeof header);
     std::memcpy(blob + sizeof header, key.publicKey.data() + 1, 64);
     std::memcpy(blob + sizeof header + 64, key.scalar.data(), 32);
-    const CngAlgorithm algorithm(BCRYPT_ECDSA_P256_ALGORITHM);
+    const CngAlgorithm algorithm = OpenCngAlgorithm(BCRYPT_ECDSA_P256_ALGORITHM);
     CngKey pair;
     const bool imported =
-        algorithm.IsOpen() && BCRYPT_SUCCESS(BCryptImportKeyPair(algorithm.handle, nullptr, BCRYPT_ECCPRIVATE_BLOB,
-                                                                 &pair.handle, blob, sizeof blob, 0));
+        algorithm && BCRYPT_SUCCESS(BCryptImportKeyPair(algorithm.Get(), nullptr, BCRYPT_ECCPRIVATE_BLOB,
+                                                        pair.Receive(), blob, sizeof blob, 0));
     SecureZeroMemory(blob, sizeof blob);
     P256Signature signature{};
     ULONG size = 0;
     if (!imported ||
-        !BCRYPT_SUCCESS(BCryptSignHash(pair.handle, nullptr, const_cast<UCHAR*>(digest.data()),
+        !BCRYPT_SUCCESS(BCryptSignHash(pair.Get(), nullptr, const_cast<UCHAR*>(digest.data()),
                                        static_cast<ULONG>(digest.size()), signature.data(),
                                        static_cast<ULONG>(signature.size()), &size, 0)) ||
         size != signature.size()) {
@@ -66,12 +60,12 @@ bool WritePrivateFile(const std::string& path, const std::string& text) {
     // are closed to other users already.
     bool ok = false;
     {
-        const std::unique_ptr<void, FileClose> file(
+        const UniqueFileHandle file(
             CreateFileA(path.c_str(), GENERIC_WRITE, 0, nullptr, CREATE_NEW, FILE_ATTRIBUTE_NORMAL, nullptr));
-        if (file.get() == INVALID_HANDLE_VALUE) return false;
+        if (!file) return false;
         DWORD written = 0;
-        ok = WriteFile(file.get(), text.data(), static_cast<DWORD>(text.size()), &written, nullptr) &&
-             written == text.size() && FlushFileBuffers(file.get());
+        ok = WriteFile(file.Get(), text.data(), static_cast<DWORD>(text.size()), &written, nullptr) &&
+             written == text.size() && FlushFileBuffers(file.Get());
     }
     if (!ok) DeleteFileA(path.c_str());
     return ok;
