@@ -42,7 +42,27 @@ void Updater::ResumeBatch(const PatchBatch& batch, const ResumePoint& resumeAt, 
     PatchInfoFile description;
     description.Parse(checked.text);
     PatchStages stages(batch, description, progressFile, Services());
-    StageTwo(stages, batch, resumeAt);
+    try {
+        StageTwo(stages, batch, resumeAt);
+    } catch (const Exception& error) {
+        if (error.Code() == ErrorCode::PreparedFilesMissing) {
+            // Nothing has been moved yet: prepared again, the batch goes on
+            // from its record.
+            LOG_AS("Updater", Error) << error.message << " Preparing the patch again.";
+            StageOne(stages, batch, description);
+            quitRequested.ThrowIfCancelled("User cancelled before the installation was changed further.");
+            StageTwo(stages, batch, resumeAt);
+        } else if (error.Code() == ErrorCode::ReinstallRequired) {
+            // Moves have run and files are lost: the record goes, and the
+            // next pass finds the installation in change without one, which
+            // the complete build finishes.
+            LOG_AS("Updater", Error) << error.message << " Installing the complete build.";
+            RemoveFile(progressFile.GetAlternativeRecordPath());
+            RemoveFile(progressFile.GetRecordPath());
+        } else {
+            throw;
+        }
+    }
 }
 
 void Updater::AbandonBatch(const PatchBatch& batch) {

@@ -19,6 +19,7 @@ enum class ErrorCode : int32_t {
     CorruptData = 12,
     CorruptInstallation = 13,
     SteamIncompatible = 14,
+    PreparedFilesMissing = 15,  // stage one must run again before stage two may
 };
 
 // The program's one error type, thrown by value and caught by reference.

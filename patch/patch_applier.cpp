@@ -1,12 +1,16 @@
 #include "patch/patch_applier.h"
 
+#include <algorithm>
+
 #include "base/archive_source.h"
+#include "base/atomic_file.h"
 #include "base/cancellation.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/file_stream.h"
 #include "base/item_path.h"
 #include "base/log.h"
+#include "base/path_kind.h"
 #include "base/paths.h"
 #include "base/record_names.h"
 #include "base/status_interfaces.h"
@@ -18,7 +22,6 @@
 namespace {
 
 const char* const kLogSource = "PatchApplier";
-const char* const kDeltaFileName = "diffTempFile.dz";
 
 // Every folder from root down to the one that holds path, root included,
 // when path lies below root: the folders whose entries may change when
@@ -44,7 +47,28 @@ void FlushToDisk(const std::string& path) {
     file.Flush();
 }
 
+// The size of the file at path; -1 when there is none.
+int64_t SizeOf(const std::string& path) {
+    if (KindOf(path) != PathKind::File) return -1;
+    try {
+        FileStream file;
+        file.Open(path);
+        return file.GetLength();
+    } catch (const Exception&) {
+        return -1;
+    }
+}
+
 }  // namespace
+
+const char* const kDeltaFileName = "diffTempFile.dz";
+const char* const kPreparedListName = "patchedfiles.lst";
+
+const std::vector<std::string>& WorkFileNames() {
+    static const std::vector<std::string> names{kDeltaFileName, kPreparedListName, "patchinfo.xml",
+                                                "patchinfo.xml.sig"};
+    return names;
+}
 
 PatchApplier::PatchApplier(const PatchBatch& work, PatchInfoFile& description, PatchProgressFile& progress,
                            const StageServices& stageServices)
@@ -80,6 +104,20 @@ void PatchApplier::RequireSafe(const std::string& path, const std::vector<std::s
     if (!IsSafeItemPath(path, ownNames)) throw Exception("Unsafe path in patch description: \"" + path + "\"");
 }
 
+// An item of the installation is also checked by what it names on the disk:
+// an 8.3 alias (TEMP~MPE) reaches the program's own names by another
+// spelling, and a link on the way would carry a write, move or delete out
+// of the installation.
+void PatchApplier::RequireInside(const std::string& item, const std::vector<std::string>& ownNames) const {
+    RequireSafe(item, ownNames);
+    const std::string& root = batch.installationFolder;
+    const std::string resolved = PathBelow(LongPathName(PathJoin(root, item)), LongPathName(root));
+    if (!resolved.empty()) RequireSafe(resolved, ownNames);
+    const std::string link = FirstLinkBelow(root, item, false);
+    if (!link.empty())
+        throw Exception("Path in patch description passes through the link " + link + ": \"" + item + "\"");
+}
+
 // Every name of the batch is checked before the first file is written or
 // deleted, so a hostile description fails without touching anything. An
 // item may not reach the updater's own work folders and records: deleting
@@ -95,20 +133,28 @@ void PatchApplier::CheckItemPaths() {
         const std::string relative = PathBelow(record, batch.installationFolder);
         if (!relative.empty()) ownNames.push_back(relative);
     }
+    // The work folders are written and emptied: neither may be a link, nor
+    // lie behind one.
+    for (const std::string& folder : {batch.patchFolder, batch.patchedFilesFolder}) {
+        const std::string relative = PathBelow(folder, batch.installationFolder);
+        if (!relative.empty() && !FirstLinkBelow(batch.installationFolder, relative, true).empty()) {
+            throw Exception("The work folder " + folder + " is a link or lies behind one.");
+        }
+    }
     patchInfo.ResetIterators();
     std::string path;
     std::string archive;
     while (patchInfo.NextDiffFile(path, archive)) {
-        RequireSafe(path, ownNames);
-        RequireSafe(archive, {});
+        RequireInside(path, ownNames);
+        RequireSafe(archive, WorkFileNames());
     }
     while (patchInfo.NextNewFile(path, archive)) {
-        RequireSafe(path, ownNames);
-        RequireSafe(archive, {});
+        RequireInside(path, ownNames);
+        RequireSafe(archive, WorkFileNames());
     }
-    while (patchInfo.NextDeletedFile(path)) RequireSafe(path, ownNames);
-    while (patchInfo.NextDeletedDirectory(path)) RequireSafe(path, ownNames);
-    while (patchInfo.NextNewDirectory(path)) RequireSafe(path, ownNames);
+    while (patchInfo.NextDeletedFile(path)) RequireInside(path, ownNames);
+    while (patchInfo.NextDeletedDirectory(path)) RequireInside(path, ownNames);
+    while (patchInfo.NextNewDirectory(path)) RequireInside(path, ownNames);
     patchInfo.ResetIterators();
 }
 
@@ -134,6 +180,7 @@ void PatchApplier::PreparePatch(IArchiveSource& archives) {
     // A cancel during the last extraction must not pass for a finished
     // stage: stage two would move a cut-off file in.
     CheckCancel();
+    WritePreparedList();
     MakePreparedFilesDurable();
 }
 
@@ -183,7 +230,8 @@ void PatchApplier::PrepareNewFile(IArchiveSource& archives, const std::string& p
 // folder from the installation down to each prepared file.
 void PatchApplier::MakePreparedFilesDurable() {
     std::vector<std::string> prepared;
-    CollectFiles(batch.patchedFilesFolder, prepared);
+    for (const std::string& item : PreparedItems()) prepared.push_back(PathJoin(batch.patchedFilesFolder, item));
+    prepared.push_back(PathJoin(batch.patchFolder, kPreparedListName));
     std::set<std::string> folders;
     const std::string root = PathBelow(batch.patchedFilesFolder, batch.installationFolder).empty()
                                  ? batch.patchedFilesFolder
@@ -198,36 +246,102 @@ void PatchApplier::NoteChanged(const std::string& path) {
     for (const std::string& folder : FoldersFromRootTo(path, batch.installationFolder)) changedFolders.insert(folder);
 }
 
+// The files stage one prepares: every "diff" and "new" item, each path
+// once, in the description's order.
+std::vector<std::string> PatchApplier::PreparedItems() {
+    std::vector<std::string> items;
+    std::set<std::string> seen;
+    std::string path;
+    std::string archive;
+    patchInfo.ResetIterators();
+    while (patchInfo.NextDiffFile(path, archive)) {
+        if (seen.insert(path).second) items.push_back(path);
+    }
+    while (patchInfo.NextNewFile(path, archive)) {
+        if (seen.insert(path).second) items.push_back(path);
+    }
+    patchInfo.ResetIterators();
+    return items;
+}
+
+// What stage one prepared and how large each file came out, so that stage
+// two, perhaps in a later process, can tell a complete set from one that
+// lost files. One line per file: the size, a tab, the item's path (item
+// paths hold no control characters).
+void PatchApplier::WritePreparedList() {
+    std::string list;
+    for (const std::string& item : PreparedItems()) {
+        list += std::to_string(SizeOf(PathJoin(batch.patchedFilesFolder, item))) + "\t" + item + "\n";
+    }
+    const std::string path = PathJoin(batch.patchFolder, kPreparedListName);
+    if (!ReplaceFileAtomically(path, list)) throw Exception("Failed to write " + path, ErrorCode::StepFailed);
+}
+
+std::map<std::string, int64_t> PatchApplier::ReadPreparedList() const {
+    std::map<std::string, int64_t> sizes;
+    std::string text;
+    if (!ReadFileBytes(PathJoin(batch.patchFolder, kPreparedListName), 64 * 1024 * 1024, text)) return sizes;
+    for (size_t start = 0; start < text.size();) {
+        const size_t end = std::min(text.find('\n', start), text.size());
+        const std::string line = text.substr(start, end - start);
+        const size_t tab = line.find('\t');
+        const std::string digits = line.substr(0, tab);
+        if (tab == std::string::npos || digits.empty() || digits.size() > 18 ||
+            digits.find_first_not_of("0123456789") != std::string::npos) {
+            return {};  // not the program's own list
+        }
+        sizes[line.substr(tab + 1)] = std::stoll(digits);
+        start = end + 1;
+    }
+    return sizes;
+}
+
+// Every prepared file must be there, as large as stage one made it, before
+// the installation starts to depend on them; once the moves have begun, a
+// file may already stand at its destination instead.
+void PatchApplier::CheckPreparedFiles(const std::optional<ResumePoint>& recordedAction) {
+    // The record that marks the start of the moves names no path.
+    const bool movesBegun = recordedAction && recordedAction->actionIndex >= 0 && recordedAction->file.empty();
+    const std::map<std::string, int64_t> sizes = ReadPreparedList();
+    for (const std::string& item : PreparedItems()) {
+        const auto recorded = sizes.find(item);
+        const int64_t size = recorded == sizes.end() ? -2 : recorded->second;
+        if (SizeOf(PathJoin(batch.patchedFilesFolder, item)) == size) continue;
+        if (movesBegun && SizeOf(PathJoin(batch.installationFolder, item)) == size) continue;
+        if (movesBegun) {
+            throw Exception("The prepared file " + item + " was lost after the moves had begun.",
+                            ErrorCode::ReinstallRequired);
+        }
+        throw Exception("The prepared file " + item + " is missing or not as stage one made it.",
+                        ErrorCode::PreparedFilesMissing);
+    }
+}
+
 // Each action is on the disk before the next one is recorded: a record
 // that outlived a power cut must never name an action after one the cut
-// undid, or the resumed run would skip the undone one.
+// undid, or the resumed run would skip the undone one. Nothing is skipped:
+// what cannot be deleted, made or moved gets the retry question, and a
+// Cancel ends the stage unfinished, resumable.
 void PatchApplier::ApplyPatch(const std::optional<ResumePoint>& recordedAction) {
     LogEntry(LogLevel::Trace, kLogSource, 161).Stream() << "ApplyPatch Start";
     resumeAt = recordedAction;
     CheckItemPaths();
     std::string path;
     while (patchInfo.NextDeletedFile(path)) {
-        const std::string target = PathJoin(batch.installationFolder, path);
-        if (ShouldApply(path)) {
-            RemoveFile(target);
-            SyncFolder(GetParentDirectory(target));
-        }
+        if (ShouldApply(path)) Delete(PathJoin(batch.installationFolder, path), PathKind::File);
         ++filesDone;
         ReportProgress(path);
     }
     while (patchInfo.NextDeletedDirectory(path)) {
-        const std::string target = PathJoin(batch.installationFolder, path);
-        if (ShouldApply(path)) {
-            DeleteDirectory(target, true);
-            SyncFolder(GetParentDirectory(target));
-        }
+        if (ShouldApply(path)) Delete(PathJoin(batch.installationFolder, path), PathKind::Directory);
         ++filesDone;
         ReportProgress(path);
     }
     while (patchInfo.NextNewDirectory(path)) {
         const std::string target = PathJoin(batch.installationFolder, path);
         if (ShouldApply(path)) {
-            MakeDirectories(target);
+            ClearWay(target, PathKind::Directory);
+            if (!MakeDirectories(target)) throw Exception("Failed to create " + target, ErrorCode::StepFailed);
             for (const std::string& folder : FoldersFromRootTo(target, batch.installationFolder)) SyncFolder(folder);
         }
         ++filesDone;
@@ -241,15 +355,58 @@ void PatchApplier::ApplyPatch(const std::optional<ResumePoint>& recordedAction) 
     Record(actionCounter, "");
     resumeAt.reset();
 
-    std::vector<std::string> prepared;
-    CollectFiles(batch.patchedFilesFolder, prepared);
-    for (const std::string& file : prepared) {
-        const std::string destination = DestinationOf(file);
-        MoveWithRetry(file, destination);
+    for (const std::string& item : PreparedItems()) {
+        const std::string source = PathJoin(batch.patchedFilesFolder, item);
+        // Moved before an interruption: CheckPreparedFiles found it there.
+        if (KindOf(source) != PathKind::File) continue;
+        const std::string destination = PathJoin(batch.installationFolder, item);
+        ClearWay(destination, PathKind::File);
+        MoveWithRetry(source, destination);
         NoteChanged(destination);
     }
     // Everything must be durable before the caller records the new version.
     for (const std::string& folder : changedFolders) SyncFolder(folder);
+}
+
+// Deletes what an item deletes when it is there as that kind (a link in
+// its place goes itself, never what it leads to).
+void PatchApplier::Delete(const std::string& target, PathKind kind) {
+    const PathKind found = KindOf(target);
+    if (found == PathKind::Missing || (found != kind && found != PathKind::Link)) return;
+    RemoveWithRetry(target);
+}
+
+void PatchApplier::RemoveWithRetry(const std::string& target) {
+    for (;;) {
+        const PathKind found = KindOf(target);
+        if (found == PathKind::Missing) break;
+        ClearReadOnly(target);
+        if (found == PathKind::Directory ? DeleteDirectory(target, true) : RemoveFile(target)) break;
+        if (services.retryQuestion == nullptr || !services.retryQuestion->AskRetryDelete(target)) {
+            throw Exception("Failed to delete " + target, ErrorCode::StepFailed);
+        }
+    }
+    SyncFolder(GetParentDirectory(target));
+}
+
+// The build installs over any tree the game can have had: a file (or a
+// link) standing where a folder is needed, or a folder where a file is, is
+// removed first, inside the installation only. Everything else stays.
+void PatchApplier::ClearWay(const std::string& target, PathKind needed) {
+    const std::string relative = PathBelow(target, batch.installationFolder);
+    std::string path = batch.installationFolder;
+    for (size_t start = 0;;) {
+        const size_t end = relative.find(kPathSeparator, start);
+        path = PathJoin(path, relative.substr(start, end == std::string::npos ? std::string::npos : end - start));
+        const PathKind found = KindOf(path);
+        if (end == std::string::npos) {
+            if (found == PathKind::Link || (found != PathKind::Missing && found != needed)) RemoveWithRetry(path);
+            if (found == PathKind::File) ClearReadOnly(path);
+            return;
+        }
+        if (found == PathKind::File || found == PathKind::Link) RemoveWithRetry(path);
+        start = end + 1;
+    }
 }
 
 // The write-ahead gate. Normally each action is recorded before it is
@@ -284,20 +441,13 @@ void PatchApplier::Record(int32_t action, const std::string& path) {
     }
 }
 
-std::string PatchApplier::DestinationOf(const std::string& preparedFile) const {
-    // Every collected file lies below the patched-files folder; only that
-    // leading part is exchanged for the installation folder.
-    const std::string& prepared = batch.patchedFilesFolder;
-    if (preparedFile.compare(0, prepared.size(), prepared) != 0) return preparedFile;
-    return PathJoin(batch.installationFolder, preparedFile.substr(prepared.size()));
-}
-
 void PatchApplier::MoveWithRetry(const std::string& source, const std::string& destination) {
     // A prepared file's folder normally exists by now (a "new" folder item,
     // or an earlier file); when a description forgot it, make it rather
     // than ask the player to fix what they cannot.
     const std::string folder = GetParentDirectory(destination);
-    if (!folder.empty() && !FileExists(folder)) MakeDirectories(folder);
+    if (!folder.empty() && !MakeDirectories(folder))
+        throw Exception("Failed to create " + folder, ErrorCode::StepFailed);
     while (!MoveFileReplacing(source, destination)) {
         if (services.retryQuestion == nullptr || !services.retryQuestion->AskRetryMove(source, destination)) {
             throw Exception("Failed to move file from " + source + " to " + destination, ErrorCode::StepFailed);

@@ -1,11 +1,13 @@
 #pragma once
 
 #include <cstdint>
+#include <map>
 #include <optional>
 #include <set>
 #include <string>
 #include <vector>
 
+#include "base/path_kind.h"
 #include "patch/patch_batch.h"
 
 class CancellationToken;
@@ -29,6 +31,13 @@ protected:
     IRetryQuestion& operator=(const IRetryQuestion&) = default;
     ~IRetryQuestion() = default;
 };
+
+// The files the stages keep in a batch's patch folder besides the
+// archives: the delta being applied, and the list of what stage one
+// prepared. No archive may take their names, nor the description's.
+extern const char* const kDeltaFileName;
+extern const char* const kPreparedListName;
+const std::vector<std::string>& WorkFileNames();
 
 // Who the stages talk to while they work; none is owned, each may be null.
 struct StageServices {
@@ -70,6 +79,11 @@ public:
     // Both stages begin with it; stage two's caller calls it before it
     // writes anything of its own.
     void CheckItemPaths();
+    // Before stage two depends on them: every prepared file as large as
+    // stage one made it (or, once the moves have begun, already at its
+    // destination). Throws PreparedFilesMissing when stage one must run
+    // again, ReinstallRequired when files were lost after the moves began.
+    void CheckPreparedFiles(const std::optional<ResumePoint>& resumeAt);
 
 private:
     void CheckCancel() const;
@@ -78,12 +92,18 @@ private:
     bool ShouldApply(const std::string& path);
     void Record(int32_t action, const std::string& path);
     void MoveWithRetry(const std::string& source, const std::string& destination);
+    void Delete(const std::string& target, PathKind kind);
+    void RemoveWithRetry(const std::string& target);
+    void ClearWay(const std::string& target, PathKind needed);
     void RequireSafe(const std::string& path, const std::vector<std::string>& ownNames) const;
+    void RequireInside(const std::string& item, const std::vector<std::string>& ownNames) const;
+    std::vector<std::string> PreparedItems();
+    void WritePreparedList();
+    std::map<std::string, int64_t> ReadPreparedList() const;
     void MakePreparedFilesDurable();
     void NoteChanged(const std::string& path);
     void PrepareDiffFile(IArchiveSource& archives, const std::string& path, const std::string& archive);
     void PrepareNewFile(IArchiveSource& archives, const std::string& path, const std::string& archive);
-    std::string DestinationOf(const std::string& preparedFile) const;
 
     const PatchBatch batch;
     PatchInfoFile& patchInfo;

@@ -16,7 +16,7 @@ std::vector<std::string> ArchivesInFetchOrder(PatchInfoFile& info) {
     const auto add = [&](const std::string& archive) {
         // The name becomes a file name in the patch folder before the
         // applier ever sees the description.
-        if (!IsSafeItemPath(archive)) {
+        if (!IsSafeItemPath(archive, WorkFileNames())) {
             throw Exception("Unsafe archive name in patch description: \"" + archive + "\"");
         }
         if (seen.insert(archive).second) names.push_back(archive);
@@ -33,8 +33,10 @@ std::vector<std::string> ArchivesInFetchOrder(PatchInfoFile& info) {
 void PatchStages::Prepare(IArchiveSource& archives) { applier.PreparePatch(archives); }
 
 void PatchStages::Apply(IInstallationRecords* records, const std::optional<ResumePoint>& resumeAt) {
-    // A description changed since stage one must fail before the record.
+    // A description changed since stage one, or prepared files lost, must
+    // fail before the record.
     applier.CheckItemPaths();
+    applier.CheckPreparedFiles(resumeAt);
     progressFile.SetPatchPath(work.patchFolder);
     progressFile.SetPatchedFilesPath(work.patchedFilesFolder);
     progressFile.SetPatchUri(work.location);

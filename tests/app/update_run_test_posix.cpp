@@ -307,17 +307,19 @@ TEST_F(UpdateRun, ResumesAnInterruptedPatchOnlyFromItsOwnCheckedState) {
          "keyed_updater", false},
     };
     Publish(Version(1), Version(2), "2", &signer);
-    std::string added;  // a file the patch adds: a folder in its way stops the moves
+    std::string added;  // a file the patch adds: an immutable one in its way stops the moves
     for (const auto& file : Version(2).files) {
         if (Version(1).files.count(file.first) == 0) added = PathJoin(install, file.first);
     }
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         Install(Version(1), "1");
-        WriteTree(added, TreeOf("in the way.txt=x"));
+        WriteTextFile(added, "in the way");
+        SetImmutable(added, true);
         Run("y\nc\n", {"-latestVersion", "2"}, c.program);  // Cancel at the retry question
+        SetImmutable(added, false);
         ASSERT_EQ(InstalledVersion(), "-1");
-        DeleteDirectory(added, true);
+        RemoveFile(added);
         WriteTree(documents, TreeOf("letter.txt=mine|saves/slot1.sav=progress"));
         if (c.tamper) c.tamper();
         const size_t requests = server.Requests().size();

@@ -23,3 +23,7 @@ private:
 void WriteTextFile(const std::string& path, const std::string& content);
 std::string ReadTextFile(const std::string& path);
 bool PathExists(const std::string& path);
+
+// Natively only: makes a file or folder immutable (nothing may delete,
+// rename or replace it, not even root), or mutable again.
+void SetImmutable(const std::string& path, bool immutable);

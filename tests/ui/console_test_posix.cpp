@@ -155,13 +155,15 @@ TEST(ConsoleFrontEnd, MoveRetryAsksAgainUntilCancelled) {
     RetryBox retryBox;
     run.retryQuestion = &retryBox;
     run.Prepare();
-    WriteTree(batch.Installation(), TreeOf("blocked.bin/inside.txt=a folder that a move cannot replace"));
+    WriteTextFile(PathJoin(batch.Installation(), "blocked.bin"), "a file nothing may replace");
+    SetImmutable(PathJoin(batch.Installation(), "blocked.bin"), true);
     try {
         run.Apply();
         ADD_FAILURE() << "the move succeeded";
     } catch (const Exception& error) {
         EXPECT_EQ(error.Code(), ErrorCode::StepFailed);
     }
+    SetImmutable(PathJoin(batch.Installation(), "blocked.bin"), false);
     const std::string shown = console.Shown();
     const size_t first = shown.find("[R]etry / [c]ancel? ");  // asked exactly twice
     EXPECT_TRUE(first != shown.npos && shown.find("[R]etry", first + 1) == shown.rfind("[R]etry")) << shown;
