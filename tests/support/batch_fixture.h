@@ -31,14 +31,14 @@ void WriteTree(const std::string& root, const Tree& tree);
 Tree ReadTree(const std::string& root);
 
 std::string SeededBytes(size_t size, unsigned seed);
-// A seeded game tree, and its next version: files edited, added and
-// removed, folders added and removed, files and folders trading places.
+std::string Varint(size_t value);  // VCDIFF's integer: base 128, most significant digit first
+// A seeded game tree, and its next version: files edited, added and removed, folders added and removed, files and
+// folders trading places.
 Tree RandomTree(unsigned seed);
 Tree NextVersion(const Tree& old, unsigned seed);
 
-// A patch made from two trees, laid out as stage one finds it: the old tree
-// installed with version "1", the archives (one per top folder or file) and
-// the description; published: those of the publisher's tool (needs xdelta3).
+// A patch made from two trees, laid out as stage one finds it: the old tree installed with version "1", the archives
+// (one per top folder or file) and the description; published: those of the publisher's tool (needs xdelta3).
 class TestBatch {
 public:
     TestBatch(const Tree& installed, const Tree& target, bool published = false);
@@ -54,9 +54,8 @@ private:
     TempFolder root;
 };
 
-// One run of the updater over a batch, its parts open to the test: the
-// archives are in place (state makes every wait end otherwise), the
-// applier's reports are kept and handed to onReport (a cancel, a crash).
+// One run of the updater over a batch, its parts open to the test: the archives are in place (state makes every wait
+// end otherwise), the applier's reports are kept and handed to onReport (a cancel, a crash).
 class BatchRun final : public IArchiveSource, public IStatusView {
 public:
     // The batch a TestBatch laid out below root (perhaps in another process).
@@ -71,8 +70,8 @@ public:
     void OnFileDone(const std::string&) override {}
     void Prepare() { stages.Prepare(work, this, this); }
     void Apply();  // stage two, storing the version in the batch's file
-    // The next start after an interruption, by the updater's own decision:
-    // stage two resumed from its record, or nothing; a reinstall throws.
+    // The next start after an interruption, by the updater's own decision: stage two resumed from its record, or
+    // nothing; a reinstall throws.
     void Resume();
 
     const std::string versionFile;
