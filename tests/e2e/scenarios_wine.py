@@ -289,31 +289,27 @@ def interrupt_stage_two(s, run, rng):
     process.wait()
 
 
-def scenario_chain_resume(s, run):
+def scenario_killed(s, run):
+    # The next start after each kill finishes from the record or asks again. The first record left is finished on the
+    # way to 3 instead: without a question, then 3 is offered.
     s.publish(version_tree(1, big=True), version_tree(2, big=True), "2", s.work / "server")
-    rng = random.Random(2)
-    for _ in range(8):
-        interrupt_stage_two(s, run, rng)
-        if run.version() == "-1":
-            break
-    s.publish(version_tree(2, big=True), version_tree(3, big=True), "3", s.work / "server")
-    # The record is finished without a question, then 3 is offered.
-    run.play([], [("3", YES), ("", NO)], version_tree(3, big=True), "3")
-    history = (run.install / "UpdateHistory.log").read_text().splitlines()
-    check([line.split()[-1][-14:] for line in history] == ["patch_515195_2", "patch_515195_3"], f"history: {history}")
-
-
-def scenario_terminate(s, run):
-    s.publish(version_tree(1, big=True), version_tree(2, big=True), "2", s.work / "server")
-    rng = random.Random(16)
+    rng, chained = random.Random(16), False
     for trial in range(12):
         interrupt_stage_two(s, run, rng)
-        process = run.start("-latestVersion", "2")  # asks again unless it finishes from the record
+        if not chained and run.version() == "-1":
+            chained = True
+            s.publish(version_tree(2, big=True), version_tree(3, big=True), "3", s.work / "server")
+            run.play([], [("3", YES), ("", NO)], version_tree(3, big=True), "3")
+            history = [line.split()[-1][-14:] for line in (run.install / "UpdateHistory.log").read_text().splitlines()]
+            check(history == ["patch_515195_2", "patch_515195_3"], f"history: {history}")
+            continue
+        process = run.start("-latestVersion", "2")
         while process.poll() is None:
             if text := s.answer(0, timeout_ms=2000, may_miss=True):
                 s.answer(YES if s.text("INSTALLER_PATCH_CONFIRM_UPADATE") in text else NO)
         run.finish(process)
         run.expect(version_tree(2, big=True), "2", game="")  # up to date when killed after the version was stored
+    check(chained, "no kill left a record")
 
 
 def scenario_reinstall(s, run):
@@ -609,9 +605,8 @@ def scenario_window(s, run):
 SCENARIOS = [
     ("start-up", start_up),  # no game: the language dialog, the not-installed box, the log's exact format
     ("patch over HTTP", patch_1_to_2),  # signed addresses, both questions in the registry's language, the game started
-    ("chain 1 to 3", scenario_chain_resume),  # a record of an interrupted run resumed, then the newest
+    ("killed", scenario_killed),  # SIGKILL (as TerminateProcess) at seeded moments of stage two, a chain 1 to 3
     ("reinstall", scenario_reinstall),  # -1 without a record: the complete build
-    ("terminate", scenario_terminate),  # TerminateProcess at seeded moments of stage two, then a clean start
     ("cancel download", scenario_cancel_download),  # "Cancel" then Yes while an archive arrives
     ("cancel preparation", scenario_cancel_preparation),  # ... while a large file is unpacked
     ("missing patch", scenario_missing_patch),  # the play-old question; Yes starts the game
