@@ -6,7 +6,6 @@
 #include <functional>
 #include <utility>
 
-#include "base/exception.h"
 #include "base/file_operations.h"
 #include "net/sha256.h"
 #include "net/signature_check.h"

@@ -14,7 +14,6 @@
 #include <sstream>
 #include <string>
 
-#include "base/exception.h"
 #include "base/paths.h"
 #include "patch/lzma_decoder.h"
 #include "tests/support/batch_fixture.h"
