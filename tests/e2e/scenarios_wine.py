@@ -1,10 +1,12 @@
-#!/usr/bin/env python3
+#!/usr/bin/python3
 """IronvaleUpdater.exe under Wine as a player's machine runs it, one table row per scenario: patches made by
-ironvale-patch served by nginx, the window on a private Xvfb display, dialog_answer playing the player.
+ironvale-patch served by nginx, the window on a private Xvfb display, dialog_answer playing the player, window_driver
+showing the window and boxes as the update run does.
   scenarios_wine.py BUILD_DIR [NAME...]   (the Windows build folder)"""
 import os
 import random
 import re
+import select
 import shutil
 import socket
 import subprocess
@@ -13,9 +15,11 @@ import tempfile
 import time
 from pathlib import Path
 
+from PIL import Image, ImageGrab
+
 ROOT = Path(__file__).resolve().parents[2]
 YES, NO, OK, CANCEL, RETRY = 6, 7, 1, 2, 4
-ENGLISH, GERMAN, JAPANESE, POLISH = 0, 2, 4, 5
+ENGLISH, GERMAN, JAPANESE, POLISH, SPANISH = 0, 2, 4, 5, 7
 LANGUAGES = ["English", "French", "German", "Italian", "Japanese", "Polish", "Russian", "Spanish"]
 OWN = ("InstallationData.xml", "Uninstall.xml", "UpdateHistory.log", "IronvaleGame.exe")
 QUIET = dict(stdout=subprocess.DEVNULL, stderr=subprocess.DEVNULL)
@@ -30,6 +34,7 @@ def wait_until(condition, seconds, pause=0.05):
     end = time.monotonic() + seconds
     while not condition() and time.monotonic() < end:
         time.sleep(pause)
+    return condition()
 
 
 # Files edited, added and removed from version to version, a file that becomes a folder; the big game's stage two
@@ -83,7 +88,7 @@ class Session:
         os.close(read)
         self.nginx, self.port = self.start_nginx()
         # Without a window manager Wine waits for one after every closed box.
-        for program in ("IronvaleUpdater.exe", "served_updater.exe"):
+        for program in ("IronvaleUpdater.exe", "served_updater.exe", "window_driver.exe"):
             self.wine("reg", "add", f"HKCU\\Software\\Wine\\AppDefaults\\{program}\\X11 Driver", "/v", "Managed",
                       "/d", "N", "/f")
         rows = (line.split("\t") for line in (ROOT / "resources/strings.tsv").read_text("utf-8").splitlines())
@@ -107,8 +112,7 @@ class Session:
             f"  server {{ listen 127.0.0.1:{port}; root {self.work}/server;\n"
             f"    location /slow/ {{ alias {self.work}/server/; limit_rate 64k; }} }} }}\n")
         nginx = subprocess.Popen(["nginx", "-c", str(self.work / "nginx.conf")], stderr=subprocess.DEVNULL)
-        wait_until((self.work / "nginx.pid").exists, 5)  # written once it listens
-        check((self.work / "nginx.pid").exists(), "nginx did not start")
+        check(wait_until((self.work / "nginx.pid").exists, 5), "nginx did not start")  # the file comes once it listens
         return nginx, port
 
     def end_wine(self):
@@ -119,6 +123,13 @@ class Session:
         for key in (["HKLM\\Software\\Halvard", "/reg:32"], ["HKCU\\Software\\Halvard"]):
             self.wine("reg", "delete", *key, "/f", check=False)
 
+    def forget_fonts(self):  # Wine's memory of the fonts a test showed it
+        for key in ("Cache", "External Fonts"):
+            self.wine("reg", "delete", f"HKCU\\Software\\Wine\\Fonts\\{key}", "/f", check=False)
+        for face in ("IPAGothic", "IPAPGothic", "@IPAGothic", "@IPAPGothic"):
+            self.wine("reg", "delete", "HKLM\\Software\\Microsoft\\Windows NT\\CurrentVersion\\Fonts", "/v",
+                      f"{face} (TrueType)", "/f", check=False)
+
     def close(self):
         self.forget_game()
         self.end_wine()
@@ -127,18 +138,20 @@ class Session:
             process.wait()
         shutil.rmtree(self.work, ignore_errors=True)
 
-    def wine(self, *args, check=True):
-        return subprocess.run([ROOT / "scripts/wine-run.sh", *map(str, args)], env=self.env, check=check,
+    def wine(self, *args, check=True, env=None):
+        return subprocess.run([ROOT / "scripts/wine-run.sh", *map(str, args)], env=env or self.env, check=check,
                               stdout=subprocess.PIPE, stderr=subprocess.DEVNULL)
 
-    def start(self, program, *args, env=None, cwd=None):
-        return subprocess.Popen([ROOT / "scripts/wine-run.sh", program, *args], env=env or self.env, cwd=cwd, **QUIET)
+    def start(self, program, *args, env=None, cwd=None, **pipes):
+        return subprocess.Popen([ROOT / "scripts/wine-run.sh", program, *args], env=env or self.env, cwd=cwd,
+                                **{**QUIET, **pipes})
 
-    def answer(self, button, expected="", language=ENGLISH, caption=None, timeout_ms=30000, may_miss=False):
-        """The text of the next box, which must hold expected (a string key or text), after button (0: none, it
-        stays) is pressed; "" when none came and may_miss."""
+    def answer(self, button, expected="", language=ENGLISH, caption=None, timeout_ms=30000, may_miss=False, choose=(),
+               env=None):
+        """The text of the next box, then a line of its controls ("[ID LABEL]" per button), which must hold expected
+        (a string key or text), after button (0: none, it stays) is pressed; "" when none came and may_miss."""
         done = self.wine(self.programs / "dialog_answer.exe", caption or self.caption(language), button, timeout_ms,
-                         check=False)
+                         *choose, check=False, env=env)
         check(done.returncode == 0 or may_miss, f"no box to answer with {button}")
         text = done.stdout.decode("utf-8", "replace").replace("\r", "") if done.returncode == 0 else ""
         expected = self.text(expected, language) if expected in self.strings else expected
@@ -258,7 +271,7 @@ def patch_1_to_2(s, run, language=ENGLISH, location=None, beside=None):  # besid
         run.env["IRONVALE_TEST_UPDATE_LOCATION"] = location
     texts = run.play([], [("INSTALLER_PATCH_CONFIRM_UPADATE", YES), ("INSTALLER_SUCCESS_PATCH", YES)],
                      version_tree(2), "2", "+webSiteHostName", language, program=beside and beside / "IronvaleUpdater.exe")
-    check("[button] " + s.text("INSTALLER_DIALOG_YES", language) in texts[1], f"button label: {texts[1]}")
+    check(f"[{YES} {s.text('INSTALLER_DIALOG_YES', language)}]" in texts[1], f"button label: {texts[1]}")
     if location is not None:
         return
     requests = [line for line in (s.work / "access.log").read_text().splitlines() if "patch_515195_2" in line]
@@ -276,31 +289,27 @@ def interrupt_stage_two(s, run, rng):
     process.wait()
 
 
-def scenario_chain_resume(s, run):
+def scenario_killed(s, run):
+    # The next start after each kill finishes from the record or asks again. The first record left is finished on the
+    # way to 3 instead: without a question, then 3 is offered.
     s.publish(version_tree(1, big=True), version_tree(2, big=True), "2", s.work / "server")
-    rng = random.Random(2)
-    for _ in range(8):
-        interrupt_stage_two(s, run, rng)
-        if run.version() == "-1":
-            break
-    s.publish(version_tree(2, big=True), version_tree(3, big=True), "3", s.work / "server")
-    # The record is finished without a question, then 3 is offered.
-    run.play([], [("3", YES), ("", NO)], version_tree(3, big=True), "3")
-    history = (run.install / "UpdateHistory.log").read_text().splitlines()
-    check([line.split()[-1][-14:] for line in history] == ["patch_515195_2", "patch_515195_3"], f"history: {history}")
-
-
-def scenario_terminate(s, run):
-    s.publish(version_tree(1, big=True), version_tree(2, big=True), "2", s.work / "server")
-    rng = random.Random(16)
+    rng, chained = random.Random(16), False
     for trial in range(12):
         interrupt_stage_two(s, run, rng)
-        process = run.start("-latestVersion", "2")  # asks again unless it finishes from the record
+        if not chained and run.version() == "-1":
+            chained = True
+            s.publish(version_tree(2, big=True), version_tree(3, big=True), "3", s.work / "server")
+            run.play([], [("3", YES), ("", NO)], version_tree(3, big=True), "3")
+            history = [line.split()[-1][-14:] for line in (run.install / "UpdateHistory.log").read_text().splitlines()]
+            check(history == ["patch_515195_2", "patch_515195_3"], f"history: {history}")
+            continue
+        process = run.start("-latestVersion", "2")
         while process.poll() is None:
             if text := s.answer(0, timeout_ms=2000, may_miss=True):
                 s.answer(YES if s.text("INSTALLER_PATCH_CONFIRM_UPADATE") in text else NO)
         run.finish(process)
         run.expect(version_tree(2, big=True), "2", game="")  # up to date when killed after the version was stored
+    check(chained, "no kill left a record")
 
 
 def scenario_reinstall(s, run):
@@ -314,11 +323,14 @@ def cancel_in_window(s, run, line):
     process = run.start("-latestVersion", "2")
     s.answer(YES)
     wait_for_line(s, process, line, 0.05)
-    # The window is centred on the 1024 x 768 screen; "Cancel" is at (435, 443) in it.
-    subprocess.run(["xdotool", "mousemove", str(246 + 435), str(143 + 443), "click", "1"], env=s.env, check=True)
+    click(s, 246, 143, 435, 443)  # "Cancel"
     s.answer(YES, "INSTALLER_CONFIRM_CANCEL")
     run.finish(process)
     run.expect(version_tree(1), "1")
+
+
+def click(s, left, top, x, y):  # at x, y of the window at left, top
+    subprocess.run(["xdotool", "mousemove", str(left + x), str(top + y), "click", "1"], env=s.env, check=True)
 
 
 def scenario_cancel_download(s, run):
@@ -353,9 +365,8 @@ def scenario_locked_file(s, run):  # Retry once the file is let go; Cancel leave
     changed = next(p for p, c in version_tree(2).items() if version_tree(1).get(p, c) != c)
     for button in (RETRY, CANCEL):
         run.ready()
-        holder = subprocess.Popen([ROOT / "scripts/wine-run.sh", s.programs / "hold_file.exe",
-                                   s.windows_path(run.install / changed)], env=s.env, stdin=subprocess.PIPE,
-                                  stdout=subprocess.PIPE, stderr=subprocess.DEVNULL)
+        holder = s.start(s.programs / "hold_file.exe", s.windows_path(run.install / changed), stdin=subprocess.PIPE,
+                         stdout=subprocess.PIPE)
         check(holder.stdout.readline().strip() == b"held", "the file could not be held")
         process = run.start("-latestVersion", "2")
         s.answer(YES)
@@ -452,12 +463,150 @@ def scenario_elevated_copy(s, run):
         s.wine("reg", "delete", f"HKU\\{sid}", "/f", check=False)
 
 
+def scenario_second_copy(s, run):
+    # The updater's own first box, before any window, in a box whose OK differs from the system's in Spanish; its log
+    # line, and the exit code -1.
+    run.install_version(version_tree(1), "1", SPANISH)
+    holder = s.start(s.programs / "hold_instance.exe", "60000", stdout=subprocess.PIPE)
+    check(holder.stdout.readline().strip() == b"held", "the holder did not take the mutex")
+    process = s.start(s.build / "IronvaleUpdater.exe")
+    s.answer(OK, f"[{OK} Aceptar]", SPANISH)
+    run.finish(process, 255)
+    holder.kill()
+    holder.wait()
+    check(": Error: There is already another updater instance running." in s.log.read_text(errors="replace")
+          .splitlines()[-1], "no log line")
+
+
+KEY_BAR_LEFT, BAR_ROW, KEY = 26, 443, (236, 0, 140)
+
+
+def window_shows(s, left, top, length):
+    # Within ten seconds the screen shows the window at left, top with its bar length px long, title, status and
+    # "Cancel" drawn, and the screen behind every colour-key pixel with no pink fringe; else the screen is kept.
+    picture = Image.open(ROOT / "resources/pictures/background.png").convert("RGB")
+    drawn = picture.load()
+    differs = lambda a, b: sum(abs(x - y) for x, y in zip(a, b)) > 48
+    # The window's region leaves out its outermost pixels; the screen's corner is never covered by it.
+    inside = [(x, y) for y in range(1, picture.height - 1) for x in range(1, picture.width - 1)]
+    for _ in range(40):
+        screen = ImageGrab.grab(xdisplay=s.env["DISPLAY"]).convert("RGB")
+        shown = screen.load()
+        at = lambda x, y: shown[left + x, top + y]
+        changed = lambda x0, y0, x1, y1: sum(differs(at(x, y), drawn[x, y]) for x in range(x0, x1)
+                                             for y in range(y0, y1))
+        bar = next((x for x in range(KEY_BAR_LEFT, KEY_BAR_LEFT + 340) if not differs(at(x, BAR_ROW), drawn[x, BAR_ROW])),
+                   999) - KEY_BAR_LEFT
+        keyed = [at(x, y) for x, y in inside if drawn[x, y] == KEY]
+        seen = dict(bar=bar, title=changed(11, 5, 260, 26), status=changed(22, 408, 322, 428),
+                    cancel=changed(395, 433, 475, 452), keyed=len(keyed),
+                    keyed_opaque=sum(pixel != shown[0, 0] for pixel in keyed),
+                    pinkish=sum(r >= 150 and g <= 90 and b >= 70 for r, g, b in (at(x, y) for x, y in inside)))
+        if (bar == length and seen["title"] > 100 and seen["status"] > 100 and seen["cancel"] > 50 and keyed and
+                not seen["keyed_opaque"] and not seen["pinkish"]):
+            return
+        time.sleep(0.25)
+    screen.save(s.build / "test-results/window_wine-failed.png")
+    check(False, f"the window with a bar {length} px long is not drawn right: {seen}")
+
+
+class Driver:  # window_driver; with fonts, it knows only the fonts in those folders
+    def __init__(self, s, fonts=None):
+        self.s, self.log, self.env, self.reply = s, s.log.parent / "window_driver.log", s.env, None
+        self.log.write_text("")
+        if fonts:
+            # Wine finds fonts through fontconfig and remembers them in its registry and in every running Wine process.
+            s.forget_fonts()
+            s.end_wine()
+            self.env = dict(s.env, FONTCONFIG_FILE=str(s.work / "fonts.conf"))
+            (s.work / "fonts.conf").write_text("<fontconfig>" + "".join(f"<dir>{f}</dir>" for f in fonts) +
+                                               f"<cachedir>{s.work}/fontcache</cachedir></fontconfig>")
+        self.process = s.start(s.programs / "window_driver.exe", env=self.env, stdin=subprocess.PIPE,
+                               stdout=subprocess.PIPE, text=True)
+
+    def send(self, command, reply=None, **box):
+        # The reply must be the one given; box: how to answer the box the command puts up, whose controls are returned.
+        self.process.stdin.write(command + "\n")
+        self.process.stdin.flush()
+        seen = self.s.answer(**box, env=self.env) if box else ""
+        check(select.select([self.process.stdout], [], [], 60)[0], f"no answer to {command}")
+        self.reply = self.process.stdout.readline().strip()
+        check(reply in (None, self.reply), f"'{command}' answered '{self.reply}', expected '{reply}'")
+        return seen.split("\n")[-2].strip() if box else ""
+
+    def close(self):
+        self.process.stdin.close()
+        self.process.wait()
+        return self.log.read_text(errors="replace")
+
+
+def scenario_window(s, run):
+    # The window, its boxes and fonts in German, whose button labels differ from the system's, clicked and dragged
+    # with xdotool; the screen read back.
+    key = "HKCU\\Software\\Halvard\\Ironvale"
+    s.forget_game()
+    for name, value in (("Install Dir", "C:\\Games\\Ironvale"), ("Language", "German")):
+        s.wine("reg", "add", key, "/v", name, "/d", value, "/f")
+    try:
+        driver, yes_no = Driver(s), f"[{YES} Ja] [{NO} Nein]"
+        check(driver.send("language", "Polish", button=OK, language=GERMAN, choose=["Polish"]) ==
+              "[1 OK] [2 Abbrechen] {English French German Italian Japanese Polish Russian Spanish} German",
+              f"the language dialog: {driver.reply}")
+        check("REG_SZ    Polish" in s.wine("reg", "query", key, "/v", "Language").stdout.decode(), "not stored")
+        check(driver.send("retry", "cancel", button=CANCEL, expected="INSTALLER_FAILED_TO_MOVE_THE_FILE",
+                          language=GERMAN) == f"[{RETRY} Wiederholen] [{CANCEL} Abbrechen]", "the retry buttons")
+        driver.send("start", "started")
+        driver.send("rect", "246 143")  # centred on the 1024 x 768 screen
+        for progress, length in ((0, 0), (500, 165)):
+            driver.send(f"progress {progress}", "ok")
+            window_shows(s, 246, 143, length)
+        # A drag from the title line moves the window by the pointer's way; the next picture waits for the screen to
+        # show it there, where clicks go.
+        subprocess.run(["xdotool", "mousemove", "346", "158", "mousedown", "1", "mousemove", "396", "188", "mouseup",
+                        "1"], env=s.env, check=True)
+        check(wait_until(lambda: driver.send("rect") == "" and driver.reply == "296 173", 10), "the drag")
+        driver.send("progress 1000", "ok")
+        window_shows(s, 296, 173, 330)
+        # A question of the main thread owned by the window, then the confirmations of the window's thread (with its
+        # own hook) answered No: the run goes on, and the bar still follows it.
+        check(driver.send("ask Weiter?", "no", button=NO, expected="Weiter?", language=GERMAN) == yes_no, "ask")
+        for spot, question in (((435, 443), "INSTALLER_CONFIRM_CANCEL"), ((515, 15), "INSTALLER_CONFIRM_QUIT")):
+            click(s, 296, 173, *spot)  # "Cancel", the close spot
+            check(s.answer(NO, question, GERMAN).split("\n")[-2].strip() == yes_no, "the confirmation's buttons")
+            driver.send("state", "cancels=0 window=1")
+        driver.send("progress 0", "ok")
+        window_shows(s, 296, 173, 0)
+        # Yes: cancelled once, the LZMA loop's flag set, the window gone.
+        click(s, 296, 173, 515, 15)
+        s.answer(YES, "INSTALLER_CONFIRM_QUIT", GERMAN)
+        driver.send("state", "cancels=1 window=0")
+        driver.close()
+
+        # Japanese. No Japanese font: no font is made, and each request searches again. A Japanese font, none of the
+        # candidates: the system's choice for an empty face name at the default size, made once; the boxes, which the
+        # hook gives that font, keep their labels.
+        s.wine("reg", "add", key, "/v", "Language", "/d", "Japanese", "/f")
+        driver = Driver(s, ["/usr/share/fonts/truetype/dejavu"])
+        driver.send("dialogfont", "none")
+        driver.send("dialogfont", "none")
+        check(driver.close().count("Trace: Finding dialog font") == 2, "a missing font must be searched again")
+        driver = Driver(s, ["/usr/share/fonts/truetype/dejavu", "/usr/share/fonts/opentype/ipafont-gothic"])
+        driver.send("dialogfont", "'' 14 400")
+        check(driver.send("ask OK?", "yes", button=YES, expected="OK?", language=JAPANESE) ==
+              f"[{YES} はい] [{NO} いいえ]", "the Japanese labels")
+        log = driver.close()
+        check(log.count("Trace: Finding dialog font") == 1 and "Info: Created font: IPAGothic" in log, "font choice")
+    finally:
+        s.forget_fonts()
+        s.forget_game()
+        s.end_wine()  # no Wine process keeps the fonts it was shown
+
+
 SCENARIOS = [
     ("start-up", start_up),  # no game: the language dialog, the not-installed box, the log's exact format
     ("patch over HTTP", patch_1_to_2),  # signed addresses, both questions in the registry's language, the game started
-    ("chain 1 to 3", scenario_chain_resume),  # a record of an interrupted run resumed, then the newest
+    ("killed", scenario_killed),  # SIGKILL (as TerminateProcess) at seeded moments of stage two, a chain 1 to 3
     ("reinstall", scenario_reinstall),  # -1 without a record: the complete build
-    ("terminate", scenario_terminate),  # TerminateProcess at seeded moments of stage two, then a clean start
     ("cancel download", scenario_cancel_download),  # "Cancel" then Yes while an archive arrives
     ("cancel preparation", scenario_cancel_preparation),  # ... while a large file is unpacked
     ("missing patch", scenario_missing_patch),  # the play-old question; Yes starts the game
@@ -474,6 +623,8 @@ SCENARIOS = [
     # RunElevated ("runas", granted by Wine) as the rights check starts it: the copy reads the starting user's key
     # under HKEY_USERS by -SID (its language: Polish), its exit code comes back.
     ("elevated copy", scenario_elevated_copy),
+    ("second copy", scenario_second_copy),  # the instance-running box
+    ("window", scenario_window),  # the progress window, its boxes and fonts, as window_driver shows them
 ]
 
 

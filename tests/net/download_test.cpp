@@ -2,7 +2,6 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <functional>
 #include <random>
 #include <thread>
 #include <tuple>
@@ -23,24 +22,6 @@ namespace {
 
 using namespace std::chrono_literals;
 
-// What the downloader reported; read it once the worker has ended.
-struct RecordingView final : IStatusView {
-    void OnApplyProgress(const std::string&, int32_t) override {}
-    void OnFileProgress(const std::string&, uint32_t done, uint32_t total) override {
-        reports.emplace_back(done, total);
-        if (stopper != nullptr) stopper->RequestStop();
-    }
-    void OnFileDone(const std::string& path) override {
-        finished.push_back(path);
-        if (onDone) onDone();
-    }
-
-    HttpDownloader* stopper = nullptr;                   // asked to stop at the first report
-    std::function<void()> onDone;                        // after each transfer, before the file is checked
-    std::vector<std::pair<uint32_t, uint32_t>> reports;  // bytes done, of total
-    std::vector<std::string> finished;
-};
-
 // Bytes of every value, zeros and line ends included.
 std::string TestBytes(size_t count) {
     std::string bytes;
@@ -48,7 +29,8 @@ std::string TestBytes(size_t count) {
     return bytes;
 }
 
-class DownloadTest : public ::testing::Test {
+// Records what the downloader reports; read once the worker has ended.
+class DownloadTest : public ::testing::Test, public IStatusView {
 protected:
     DownloadTest() {
         WriteTextFile(source, body);
@@ -56,6 +38,15 @@ protected:
         server.Serve("/slow", {200, TestBytes(2000000), true, std::string::npos, 1000, 5ms});
     }
     ~DownloadTest() override { DeleteDirectory(PathJoin(GetProgramFolder(), besideProgram), true); }
+    void OnApplyProgress(const std::string&, int32_t) override {}
+    void OnFileProgress(const std::string&, uint32_t done, uint32_t total) override {
+        reports.emplace_back(done, total);
+        if (stopper != nullptr) stopper->RequestStop();
+    }
+    void OnFileDone(const std::string& path) override {
+        finished.push_back(path);
+        server.Serve("/heals", {200, body});  // the next copy is sound
+    }
 
     HttpTestServer server;
     TempFolder folder;
@@ -63,11 +54,13 @@ protected:
     const std::string source = folder / "source.bin";
     const std::string target = folder / "target.bin";
     const std::string besideProgram = "ivl-test-" + std::to_string(std::random_device()());
-    RecordingView view;
+    HttpDownloader* stopper = nullptr;                   // asked to stop at the first report
+    std::vector<std::pair<uint32_t, uint32_t>> reports;  // bytes done, of total
+    std::vector<std::string> finished;
 };
 
-// A file whose size and SHA-256 are declared arrives as declared or not at all: damaged, it is fetched once more,
-// then given up; a transfer running past the size stops at once.
+// A file whose size and SHA-256 are declared arrives as declared or not at all: damaged, it is fetched once more, then
+// given up; a transfer running past the size stops at once.
 TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStays) {
     std::string damaged = body;
     damaged[damaged.size() / 2] ^= 0x01;
@@ -123,7 +116,7 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         {source, DownloadStatus::Unsupported, old, 0, 0},
         {server.Url("/sized"), done, body, 0, 1, kDeclared},
         {server.Url("/damaged"), corrupt, none, 0, 2, kDeclared},
-        {server.Url("/heals"), done, body, 0, 2, kDeclared},  // the second copy is sound
+        {server.Url("/heals"), done, body, 0, 2, kDeclared},
         {server.Url("/appended-unsized"), failed, none, 0, 1, kDeclared},
         {server.Url("/short-unsized"), corrupt, none, 0, 2, kDeclared},
         {"file://" + (folder / "damaged.bin"), corrupt, none, 0, 2, kDeclared},
@@ -132,8 +125,8 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         SCOPED_TRACE(item.location);
         WriteTextFile(target, old);
         server.Serve("/heals", {200, damaged});
-        view = RecordingView();
-        view.onDone = [this] { server.Serve("/heals", {200, body}); };
+        reports.clear();
+        finished.clear();
         DownloadEntry entry(item.location, target);
         if (item.how == kDeclared) {
             entry.declaredSize = static_cast<int64_t>(body.size());
@@ -141,20 +134,20 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         }
         SetServerClockOffset(item.serverClockOffset);
         HttpDownloader downloader;
-        view.stopper = item.how == kStopped ? &downloader : nullptr;
-        downloader.SetStatusView(&view);
+        stopper = item.how == kStopped ? &downloader : nullptr;
+        downloader.SetStatusView(this);
         downloader.Start({entry}, item.how == kSigned);
         downloader.WaitForWorker();
         EXPECT_EQ(downloader.Entries().front().status, item.status);
         EXPECT_EQ(downloader.WaitForArchive("target.bin") == ArchiveState::Corrupt, item.status == corrupt);
         const std::string left = PathExists(target) ? ReadTextFile(target) : none;
         EXPECT_TRUE(left == item.left) << left.size() << " bytes: " << left.substr(0, 20);
-        EXPECT_EQ(view.finished, std::vector<std::string>(item.transfers, target));
+        EXPECT_EQ(finished, std::vector<std::string>(item.transfers, target));
         if (item.total == 0 || (item.location.rfind("http", 0) != 0 && !copyReports)) continue;
-        ASSERT_FALSE(view.reports.empty());
-        EXPECT_EQ(view.reports.front(), std::make_pair(0u, item.total));
-        EXPECT_EQ(view.reports.back(), std::make_pair(static_cast<uint32_t>(body.size()), item.total));
-        EXPECT_TRUE(std::is_sorted(view.reports.begin(), view.reports.end()));  // never backwards
+        ASSERT_FALSE(reports.empty());
+        EXPECT_EQ(reports.front(), std::make_pair(0u, item.total));
+        EXPECT_EQ(reports.back(), std::make_pair(static_cast<uint32_t>(body.size()), item.total));
+        EXPECT_TRUE(std::is_sorted(reports.begin(), reports.end()));  // never backwards
     }
     EXPECT_NE(server.Requests().front().find("\r\nUser-Agent: IronvaleUpdater\r\n"), std::string::npos);
     // A copy onto its own source fails before it could truncate it.

@@ -1,13 +1,9 @@
-// DecodeLzma on streams of the SDK encoder in every shape the header allows,
-// of xz (data/make_lzma_fixtures.sh), broken or hostile; how PatchArchive
-// finds members; VcdiffDecoder on xdelta3's deltas (bit for bit), on
-// hand-made ones for what xdelta3 never writes, and on every kind of damage.
+// DecodeLzma on every shape of stream the header allows (SDK encoder, xz), broken or hostile; PatchArchive's member
+// search; VcdiffDecoder on xdelta3's deltas, on hand-made ones for what xdelta3 never writes, and on every damage.
 #include <gtest/gtest.h>
 
 #include <algorithm>
 #include <fstream>
-#include <string>
-#include <utility>
 #include <vector>
 
 #include "base/cancellation.h"
@@ -21,16 +17,14 @@
 #include "patch/patch_archive.h"
 #include "patch/vcdiff_decoder.h"
 #include "tests/support/batch_fixture.h"
-#include "tests/support/test_files.h"
 #include "tools/publisher/lzma_encoder.h"
 
 namespace {
 
 CancellationToken quit;
 
-// A memory stream over its own bytes, with room for at least capacity. Its
-// failingRead-th read throws, as a file does that cannot be read (negative:
-// the player asks to quit at that read), and it takes writes of nothing.
+// A memory stream over its own bytes, with room for at least capacity. Its failingRead-th read throws, as a file does
+// that cannot be read (negative: the player asks to quit at that read), and it takes writes of nothing.
 struct Bytes : MemoryStream {
     explicit Bytes(const std::string& text, size_t capacity = 0) : bytes(text) {
         bytes.resize(std::max(text.size(), capacity));
@@ -50,19 +44,13 @@ struct Bytes : MemoryStream {
     int reads = 0;
 };
 
-// The decoded data, or "error: " ("cancelled: " for a cancel) and the
-// Exception's text.
+// The decoded data, or the error and its code.
 std::string Decode(const std::string& lzma, int failingRead = 0) {
-    Bytes input(lzma);
-    Bytes output("", 1 << 18);
+    Bytes input(lzma), output("", 1 << 18);
     input.failingRead = failingRead;
-    try {
-        DecodeLzma(input, output, &quit);
-    } catch (const Exception& error) {
-        quit.Reset();
-        return (error.Code() == ErrorCode::UserCancelled ? "cancelled: " : "error: ") + error.message;
-    }
-    return output.Written();
+    const std::string error = ErrorOf([&] { DecodeLzma(input, output, &quit); });
+    quit.Reset();
+    return error.empty() ? output.Written() : error;
 }
 
 // Writes value over bytes bytes of the stream, lowest first.
@@ -72,8 +60,8 @@ std::string Patched(std::string lzma, size_t at, uint64_t value, int bytes = 1) 
 }
 
 TEST(DecodeLzma, DecodesEveryShapeAndRefusesBrokenStreams) {
-    const std::string dataError = "error: Data error, please verify that downloaded files are complete and correct!";
-    const std::string allocationFailure = "error: Failed to allocate LZMA structures while decoding.";
+    const std::string dataError = "Data error, please verify that downloaded files are complete and correct! (0)";
+    const std::string allocationFailure = "Failed to allocate LZMA structures while decoding. (0)";
     // level, dictionary size, lc, lp, pb, size stored, end marker
     const LzmaOptions marked = {5, 0, 3, 0, 2, false};
     std::string text;  // as data/make_lzma_fixtures.sh writes it
@@ -109,15 +97,14 @@ TEST(DecodeLzma, DecodesEveryShapeAndRefusesBrokenStreams) {
         {"end marker before the stated size", Patched(sizeAndMarker, 5, text.size() + 1, 4), dataError},
         {"range coder not starting with zero", Patched(sized, 13, 1), dataError},
         {"header cut short", sized.substr(0, 12),
-         "error: Missing data, please verify that downloaded files are complete!"},
+         "Missing data, please verify that downloaded files are complete! (0)"},
         {"lc/lp/pb byte out of range", Patched(sized, 0, 225), allocationFailure},
         {"dictionary over the limit, size unknown", Patched(markedText, 1, kMaximumLzmaDictionarySize + 1, 4),
          allocationFailure},
-        // Passed on unchanged, and (under the leak checker) after freeing
-        // the decoder state.
-        {"stream error in the loop", EncodeLzma(noise), "error: Failed to read data from file.", 3},
+        // Passed on unchanged, and (under the leak checker) after freeing the decoder state.
+        {"stream error in the loop", EncodeLzma(noise), "Failed to read data from file. (0)", 3},
         // A stopped extraction must never pass for a finished, shorter one.
-        {"quit request: a cancel, which says nothing", EncodeLzma(noise), "cancelled: ", -3},
+        {"quit request: a cancel, which says nothing", EncodeLzma(noise), " (1)", -3},
     };
     for (const auto& c : cases) {
         const std::string decoded = Decode(c.lzma, c.failingRead);
@@ -131,21 +118,17 @@ std::string Member(const std::string& name, const std::string& data, uint64_t si
 }
 std::string Member(const std::string& name, const std::string& data) { return Member(name, data, data.size()); }
 
-// The member's text, or the error message.
+// The member's text, or the error.
 std::string Extract(const std::string& archiveBytes, const std::string& member) {
     TempFolder folder;
     WriteTextFile(folder / "a.pak", archiveBytes);
-    try {
-        PatchArchive(folder / "a.pak").DecodeFile(member, folder / "out");
-        return ReadTextFile(folder / "out");
-    } catch (const Exception& error) {
-        return error.message;
-    }
+    const std::string error = ErrorOf([&] { PatchArchive(folder / "a.pak").DecodeFile(member, folder / "out"); });
+    return error.empty() ? ReadTextFile(folder / "out") : error;
 }
 
 TEST(PatchArchive, FindsMembersByExactName) {
-    // End markers instead of stated sizes: the decoder reads whole blocks and
-    // must stop at the marker, whatever follows in the file.
+    // End markers instead of stated sizes: the decoder reads whole blocks and must stop at the marker, whatever follows
+    // in the file.
     const LzmaOptions marked = {5, 0, 3, 0, 2, false};
     const std::string archive = Member("data\\one.txt", EncodeLzma("first", marked)) +
                                 Member("data\\two.txt", EncodeLzma("second", marked)) +
@@ -169,14 +152,8 @@ TEST(PatchArchive, FindsMembersByExactName) {
     };
     for (const auto& c : cases) {
         EXPECT_EQ(Extract(c.bytes, c.member),
-                  c.found.empty() ? "Failed to find file in patch archive. File: " + c.member : c.found);
+                  c.found.empty() ? "Failed to find file in patch archive. File: " + c.member + " (0)" : c.found);
     }
-}
-
-std::string Varint(uint32_t value) {
-    std::string bytes(1, static_cast<char>(value & 0x7F));
-    while (value >>= 7) bytes.insert(bytes.begin(), static_cast<char>(0x80 | (value & 0x7F)));
-    return bytes;
 }
 
 // Magic, version 0 and the header indicator.
@@ -191,8 +168,7 @@ uint32_t ChecksumOf(const std::string& text) {
     return Checksum(reinterpret_cast<const uint8_t*>(text.data()), static_cast<int64_t>(text.size()));
 }
 
-// The checksum is written when the indicator has bit 2; lengthError is
-// added to the true length of the delta encoding.
+// The checksum is written when the indicator has bit 2; lengthError is added to the true length of the delta encoding.
 std::string Window(uint8_t indicator, uint32_t segmentLength, uint32_t segmentPosition, uint32_t targetLength,
                    const std::string& data, const std::string& instructions, const std::string& addresses = "",
                    uint32_t checksum = 0, int32_t lengthError = 0, char deltaIndicator = 0) {
@@ -207,9 +183,8 @@ std::string Window(uint8_t indicator, uint32_t segmentLength, uint32_t segmentPo
 
 std::string Adding(const std::string& text) { return Window(0, 0, 0, text.size(), text, AddOp(text.size())); }
 
-// A header bringing its own code table: the default one with its first
-// entries replaced, cut to length bytes. Entries 0-2 of each of the six
-// rows are sent, the rest is copied from the default table.
+// A header bringing its own code table: the default one with its first entries replaced, cut to length bytes. Entries
+// 0-2 of each of the six rows are sent, the rest is copied from the default table.
 std::string OwnTable(uint8_t nearSize, uint8_t sameSize, const std::vector<CodeTableEntry>& entries,
                      size_t length = CodeTable::kEncodedSize) {
     CodeTable::Encoded table = CodeTable::Default().Encode();
@@ -230,21 +205,17 @@ std::string OwnTable(uint8_t nearSize, uint8_t sameSize, const std::vector<CodeT
            compressed;
 }
 
-// Runs the decoder's own steps, so that a missing source reaches it: what
-// reached the target, and the error text (empty on success).
+// Runs the decoder's own steps, so that a missing source reaches it: what reached the target, and the error text (empty
+// on success).
 std::pair<std::string, std::string> DecodeDelta(FileStream* source, const std::string& delta,
                                                 size_t capacity = 1 << 16) {
-    Bytes deltaStream(delta);
-    Bytes target("", capacity);
-    std::string error;
-    try {
+    Bytes deltaStream(delta), target("", capacity);
+    const std::string error = ErrorOf([&] {
         VcdiffDecoder decoder(source, &deltaStream, &target);
         decoder.ReadHeader();
         while (decoder.DecodeWindow()) {
         }
-    } catch (const Exception& thrown) {
-        error = thrown.message;
-    }
+    });
     return {target.Written(), error};
 }
 
@@ -291,8 +262,8 @@ struct LargeSource : FileStream {
     int64_t position = 0;
 };
 
-// Each row decodes a delta against a 16-byte source: a part of the error
-// text (none for a delta that is fine) and what reaches the target.
+// Each row decodes a delta against a 16-byte source: a part of the error text (none for a delta that is fine) and what
+// reaches the target.
 TEST(VcdiffDecoder, DecodesWhatXdelta3NeverWritesAndRefusesEveryDamage) {
     const uint32_t kSegment = VcdiffDecoder::kMaxSegmentLength;
     const uint32_t kWindow = VcdiffDecoder::kMaxTargetWindowLength;
@@ -310,15 +281,14 @@ TEST(VcdiffDecoder, DecodesWhatXdelta3NeverWritesAndRefusesEveryDamage) {
         {Delta(0, 0, 0, 11, "z", AddOp(1) + CopyOp(10, 1), Varint(1)), "", "zzzzzzzzzzz"},
         {Delta(0, 0, 0, 13, "abc", AddOp(3) + CopyOp(10, 1), Varint(3)), "", "abcabcabcabca"},
         {Delta(0, 0, 0, 4, "ab", AddOp(2) + CopyOp(2, 1), Varint(2)), "", "abab"},
-        // Every address mode of the default cache: self 2; near slot 0 (2)
-        // + 4; near slot 1 (6) + 0; same block 0, byte 2; here 32 - 20.
+        // Every address mode of the default cache: self 2; near slot 0 (2) + 4; near slot 1 (6) + 0; same block 0, byte
+        // 2; here 32 - 20.
         {Delta(1, 16, 0, 20, "", CopyOp(4, 0) + CopyOp(4, 2) + CopyOp(4, 3) + CopyOp(4, 6) + CopyOp(4, 1),
                Varint(2) + Varint(4) + Varint(0) + "\x02" + Varint(20)),
          "", "2345678967892345CDEF"},
         {kTargetSegment, "", "hello worldworld!."},
-        // Near and same cache of one slot each: modes 0 self, 1 here, 2 near,
-        // 3 same. Entry 0 adds 3 and copies 3 from here, entry 1 copies in
-        // mode same, entry 2 does nothing.
+        // Near and same cache of one slot each: modes 0 self, 1 here, 2 near, 3 same. Entry 0 adds 3 and copies 3 from
+        // here, entry 1 copies in mode same, entry 2 does nothing.
         {OwnTable(1, 1, {{{kAdd, 3, 0}, {kCopy, 3, 1}}, {{kCopy, 0, 3}, {}}, {}}) +
              Window(0, 0, 0, 8, "abc", std::string("\x00\x02\x01", 3) + Varint(2), Varint(3) + '\0'),
          "", "abcabcab"},
@@ -366,7 +336,7 @@ TEST(VcdiffDecoder, DecodesWhatXdelta3NeverWritesAndRefusesEveryDamage) {
             << row.target << row.error << ": " << error;
     }
     EXPECT_EQ(DecodeDelta(nullptr, Delta(1, 0, 0, 3, "abc", AddOp(3))).second,
-              "Source stream requested by delta but not provided by caller.");
+              "Source stream requested by delta but not provided by caller. (0)");
     LargeSource large;
     const uint32_t at = 0x800000A1;  // above 2 GiB; at % 251 is 'a'
     const auto [target, error] =
@@ -375,8 +345,8 @@ TEST(VcdiffDecoder, DecodesWhatXdelta3NeverWritesAndRefusesEveryDamage) {
 }
 
 TEST(VcdiffDecoder, DefaultCodeTableAndChecksum) {
-    // Entries of two instructions, which xdelta3 never writes: the first and
-    // last of every group (index, types, sizes and modes of the two halves).
+    // Entries of two instructions, which xdelta3 never writes: the first and last of every group (index, types, sizes
+    // and modes of the two halves).
     const uint8_t entries[][7] = {
         {163, kAdd, kCopy, 1, 4, 0, 0}, {165, kAdd, kCopy, 1, 6, 0, 0}, {166, kAdd, kCopy, 2, 4, 0, 0},
         {234, kAdd, kCopy, 4, 6, 0, 5}, {235, kAdd, kCopy, 1, 4, 0, 6}, {246, kAdd, kCopy, 4, 4, 0, 8},

@@ -1,29 +1,30 @@
-// The XML files of a batch: descriptions read or refused, the progress record
-// and uninstall schema printed as TinyXML does, and the progress record's
-// recovery from "PPF.xml" and "_PPF.xml" with every torn write.
+// The XML files of a batch: descriptions read or refused, the progress record and uninstall schema printed as TinyXML
+// does, and the progress record's recovery from "PPF.xml" and "_PPF.xml" with every torn write.
 #include <gtest/gtest.h>
 
 #include <array>
-#include <string>
 #include <vector>
 
 #include "base/exception.h"
+#include "base/xml_file.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
-#include "tests/support/format_test_helpers.h"
 #include "tests/support/test_files.h"
 
 namespace {
 
-// Everything a description says, or the refusal and its code: one
-// "|"-ended list per cursor (file items as "path@archive"), then the hive,
-// registry path, space requirement, count of changes, version and archives.
+// Expected XML with "\n" turned into this platform's line break.
+std::string WithPlatformLineBreaks(const std::string& text) {
+    std::string result;
+    for (char c : text) result += c == '\n' ? std::string(kXmlLineBreak) : std::string(1, c);
+    return result;
+}
+
+// Everything a description says, or the refusal and its code: one "|"-ended list per cursor (file items as
+// "path@archive"), then the hive, registry path, space requirement, count of changes, version and archives.
 std::string Read(PatchInfoFile& info, const std::string& path) {
-    try {
-        info.Load(path);
-    } catch (const Exception& error) {
-        return error.message + " (" + std::to_string(error.code) + ")";
-    }
+    const std::string error = ErrorOf([&] { info.Load(path); });
+    if (!error.empty()) return error;
     info.ResetIterators();
     std::string out, item, archive;
     for (auto next : {&PatchInfoFile::NextDiffFile, &PatchInfoFile::NextNewFile}) {
@@ -47,8 +48,7 @@ std::string Read(PatchInfoFile& info, const std::string& path) {
     return out;
 }
 
-// One object loads every row in turn: what a row leaves out takes its
-// default, whatever the row before said.
+// One object loads every row in turn: what a row leaves out takes its default, whatever the row before said.
 TEST(PatchInfoFile, ReadsDescriptionsOrRefusesThem) {
     const std::string digest(64, 'a');
     const auto archive = [](const std::string& name, const std::string& size, const std::string& sha256) {
@@ -140,9 +140,8 @@ TEST(XmlFiles, AreWrittenAsTinyXmlPrintsThem) {
     EXPECT_FALSE(PathExists(folder / "none.xml"));
 }
 
-// "PPF.xml", "_PPF.xml" (or none), and the outcome: the action and file of
-// the record taken (which is then "PPF.xml", alone; a missing file name is
-// an empty one), "none", or the error.
+// "PPF.xml", "_PPF.xml" (or none), and the outcome: the action and file of the record taken (which is then "PPF.xml",
+// alone; a missing file name is an empty one), "none", or the error.
 TEST(PatchProgressFile, RecoversFromWhicheverRecordIsReadable) {
     const std::string none = "(no file)";
     const std::string one = RecordText(1, "f");
@@ -150,17 +149,18 @@ TEST(PatchProgressFile, RecoversFromWhicheverRecordIsReadable) {
     const std::string torn = one.substr(0, 100);
     const std::string lost = "Unrecoverable interrupted batch, reinstall necessary. (3)";
     std::vector<std::array<std::string, 3>> cases = {
-        {none, none, "none"}, {one, none, "1 f"}, {torn, none, lost}, {none, two, "2 f"}, {none, torn, lost},
-        {one, two, "1 f"},    {one, torn, "1 f"}, {torn, two, "2 f"}, {torn, torn, lost},
+        {none, none, "none"}, {one, none, "1 f"},
+        {torn, none, lost},   {none, two, "2 f"},
+        {one, two, "1 f"},    {torn, two, "2 f"},
+        {torn, torn, lost},   {"<S><PatchStatus action=\"4\" /></S>", none, "4 "},
     };
-    cases.push_back({"<S><PatchStatus action=\"4\" /></S>", none, "4 "});
     for (const char* unreadable :
          {"<S><PatchStatus action=\"12abc\" file=\"f\" /></S>", "<S><PatchStatus file=\"f\" /></S>",
           "<S><PatchStatus action=\"2147483648\" file=\"f\" /></S>", "<S><Version>2</Version></S>"}) {
         cases.push_back({unreadable, two, "2 f"});
     }
-    // A write cut off anywhere before the end of its XML leaves the previous
-    // record, and no such prefix of the new one reads as a record.
+    // A write cut off anywhere before the end of its XML leaves the previous record, and no such prefix of the new one
+    // reads as a record.
     for (size_t k = 0; k + 1 < two.size(); ++k) {
         cases.push_back({one, two.substr(0, k), "1 f"});
         cases.push_back({none, two.substr(0, k), lost});
@@ -172,12 +172,11 @@ TEST(PatchProgressFile, RecoversFromWhicheverRecordIsReadable) {
         const auto recover = [&folder] {
             PatchProgressFile progress;
             progress.SetDirectory(folder.Path());
-            try {
-                return progress.Recover() ? std::to_string(progress.GetActionIndex()) + " " + progress.GetFile()
-                                          : "none";
-            } catch (const Exception& error) {
-                return error.message + " (" + std::to_string(error.code) + ")";
-            }
+            std::string taken = "none";
+            const std::string error = ErrorOf([&] {
+                if (progress.Recover()) taken = std::to_string(progress.GetActionIndex()) + " " + progress.GetFile();
+            });
+            return error.empty() ? taken : error;
         };
         EXPECT_EQ(recover(), outcome) << record << "\n" << spare;
         EXPECT_FALSE(PathExists(folder / "_PPF.xml"));

@@ -27,19 +27,10 @@ std::string CommandOutput(const std::string& command) {
 }
 
 // The game's 32-bit installer wrote its machine-wide key into the 32-bit view; the updater must find it there and only
-// there.
-TEST(RegistryRegExe, ReadsWhatTheManagerWroteTheOtherWayRoundAndMachineKeysInThe32BitView) {
+// there. (That the manager and reg.exe read each other's values in the user's hive shows in the Wine scenarios.)
+TEST(RegistryRegExe, MachineKeysAreReadInThe32BitView) {
     RegistrySandbox sandbox;
-    const std::string user = "\"HKCU\\" + sandbox.keyPath + "\"", machine = "\"HKLM\\" + sandbox.keyPath + "\"";
-    const RegistryManager registry(RegistryHive::CurrentUser, sandbox.keyPath);
-    registry.SetLanguage("German");
-    registry.SetInstallDir("C:\\Games\\Iron vale");
-    const std::string output = CommandOutput("reg.exe query " + user);
-    EXPECT_NE(output.find("Language    REG_SZ    German"), std::string::npos) << output;
-    EXPECT_NE(output.find("Install Dir    REG_SZ    C:\\Games\\Iron vale"), std::string::npos) << output;
-    CommandOutput("reg.exe add " + user + " /v Language /t REG_SZ /d Polish /f");
-    EXPECT_EQ(registry.GetLanguage(), "Polish");
-
+    const std::string machine = "\"HKLM\\" + sandbox.keyPath + "\"";
     CommandOutput("reg.exe add " + machine + " /v \"Install Dir\" /t REG_SZ /d C:\\Thirty /reg:32 /f");
     CommandOutput("reg.exe add " + machine + " /v Language /t REG_SZ /d German /reg:64 /f");
     const RegistryManager machineWide(RegistryHive::LocalMachine, sandbox.keyPath);

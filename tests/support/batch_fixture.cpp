@@ -28,14 +28,8 @@ std::string Backslashed(std::string path) {
     return path;
 }
 
-std::string Varint(size_t value) {
-    std::string bytes(1, static_cast<char>(value & 0x7F));
-    while (value >>= 7) bytes.insert(bytes.begin(), static_cast<char>(0x80 | (value & 0x7F)));
-    return bytes;
-}
-
-// A VCDIFF delta copying the common prefix and adding the rest, as a Windows
-// test program cannot start xdelta3 (whose output the round trips cover).
+// A VCDIFF delta copying the common prefix and adding the rest, as a Windows test program cannot start xdelta3 (whose
+// output the round trips cover).
 std::string PrefixDelta(const std::string& oldData, const std::string& newData) {
     size_t copied = 0;
     while (copied < oldData.size() && copied < newData.size() && oldData[copied] == newData[copied]) ++copied;
@@ -64,6 +58,12 @@ std::string Edited(std::string content, std::mt19937& random) {
 }
 
 }  // namespace
+
+std::string Varint(size_t value) {
+    std::string bytes(1, static_cast<char>(value & 0x7F));
+    while (value >>= 7) bytes.insert(bytes.begin(), static_cast<char>(0x80 | (value & 0x7F)));
+    return bytes;
+}
 
 Tree& Tree::File(const std::string& path, const std::string& content) {
     files[path] = content;

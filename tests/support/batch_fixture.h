@@ -33,14 +33,14 @@ void WriteTree(const std::string& root, const Tree& tree);
 Tree ReadTree(const std::string& root);
 
 std::string SeededBytes(size_t size, unsigned seed);
-// A seeded game tree, and its next version: files edited, added and
-// removed, folders added and removed, files and folders trading places.
+std::string Varint(size_t value);  // VCDIFF's integer: base 128, most significant digit first
+// A seeded game tree, and its next version: files edited, added and removed, folders added and removed, files and
+// folders trading places.
 Tree RandomTree(unsigned seed);
 Tree NextVersion(const Tree& old, unsigned seed);
 
-// A patch made from two trees, laid out as stage one finds it: the old tree
-// installed with version "1", the archives (one per top folder or file) and
-// the description; published: those of the publisher's tool (needs xdelta3).
+// A patch made from two trees, laid out as stage one finds it: the old tree installed with version "1", the archives
+// (one per top folder or file) and the description; published: those of the publisher's tool (needs xdelta3).
 class TestBatch {
 public:
     TestBatch(const Tree& installed, const Tree& target, bool published = false);

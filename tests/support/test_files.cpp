@@ -7,6 +7,7 @@
 #include <random>
 #include <stdexcept>
 
+#include "base/exception.h"
 #include "base/paths.h"
 
 namespace fs = std::filesystem;
@@ -37,3 +38,12 @@ std::string ReadTextFile(const std::string& path) {
 }
 
 bool PathExists(const std::string& path) { return fs::exists(path); }
+
+std::string ErrorOf(const std::function<void()>& action) {
+    try {
+        action();
+    } catch (const Exception& error) {
+        return error.message + " (" + std::to_string(error.code) + ")";
+    }
+    return "";
+}

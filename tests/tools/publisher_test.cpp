@@ -5,7 +5,6 @@
 #include <tuple>
 
 #include "base/exception.h"
-#include "base/file_operations.h"
 #include "base/paths.h"
 #include "net/signature_formats.h"
 #include "patch/patch_info_file.h"

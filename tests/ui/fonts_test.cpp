@@ -1,5 +1,4 @@
-// Which Japanese font the updater picks from the names of the installed
-// fonts.
+// Which Japanese font the updater picks from the names of the installed fonts.
 
 #include <gtest/gtest.h>
 

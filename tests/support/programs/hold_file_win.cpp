@@ -1,6 +1,5 @@
-// hold_file PATH: opens the file as a running game holds its own files
-// (others may read it, nobody may replace or delete it), prints "held" and
-// keeps it open until its standard input ends.
+// hold_file PATH: opens the file as a running game holds its own files (others may read it, nobody may replace or
+// delete it), prints "held" and keeps it open until its standard input ends.
 #include <windows.h>
 
 #include <cstdio>

@@ -1,6 +1,5 @@
-// run_elevated PROGRAM [ARGUMENT...]: starts the program through the
-// updater's own RunElevated (the shell's "runas"), waits for it and ends
-// with its exit code.
+// run_elevated PROGRAM [ARGUMENT...]: starts the program through the updater's own RunElevated (the shell's "runas"),
+// waits for it and ends with its exit code.
 #include <string>
 
 #include "state/processes.h"
