@@ -164,6 +164,7 @@ class Session:
     def publish(self, old, new, version, out):
         # The patch from tree old to new, the complete build of new, version.txt.
         trees = self.work / "trees"
+        (out / "version.txt").unlink(missing_ok=True)  # each scenario's site starts afresh, at any version
         write_tree(trees / "old", old)
         write_tree(trees / "new", new)
         for how in (["--from", trees / "old", "--max-archive-size", "3000"], ["--complete"]):
