@@ -1,5 +1,6 @@
 #pragma once
 
+#include <cstdint>
 #include <string>
 
 // What is at a path on the disk, the path itself never followed: a
@@ -7,6 +8,9 @@
 // it points to.
 enum class PathKind { Missing, File, Directory, Link };
 PathKind KindOf(const std::string& path);
+// The size of the file at path, without opening it; -1 when path is not a
+// file (missing, a folder or a link).
+int64_t FileSizeOf(const std::string& path);
 
 // The first link met on the way from root down to root joined with
 // relative (either slash separates), the last component only when

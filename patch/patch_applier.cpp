@@ -47,18 +47,6 @@ void FlushToDisk(const std::string& path) {
     file.Flush();
 }
 
-// The size of the file at path; -1 when there is none.
-int64_t SizeOf(const std::string& path) {
-    if (KindOf(path) != PathKind::File) return -1;
-    try {
-        FileStream file;
-        file.Open(path);
-        return file.GetLength();
-    } catch (const Exception&) {
-        return -1;
-    }
-}
-
 }  // namespace
 
 const char* const kDeltaFileName = "diffTempFile.dz";
@@ -108,14 +96,26 @@ void PatchApplier::RequireSafe(const std::string& path, const std::vector<std::s
 // an 8.3 alias (TEMP~MPE) reaches the program's own names by another
 // spelling, and a link on the way would carry a write, move or delete out
 // of the installation.
-void PatchApplier::RequireInside(const std::string& item, const std::vector<std::string>& ownNames) const {
+void PatchApplier::RequireInside(const std::string& item, const std::vector<std::string>& ownNames,
+                                 std::set<std::string>& linkFreeFolders) const {
     RequireSafe(item, ownNames);
     const std::string& root = batch.installationFolder;
-    const std::string resolved = PathBelow(LongPathName(PathJoin(root, item)), LongPathName(root));
-    if (!resolved.empty()) RequireSafe(resolved, ownNames);
-    const std::string link = FirstLinkBelow(root, item, false);
-    if (!link.empty())
-        throw Exception("Path in patch description passes through the link " + link + ": \"" + item + "\"");
+    // Only a name that is not 8.3 itself gets an alias, and the alias is
+    // always written with a tilde: the (slow) lookup is for those alone.
+    if (item.find('~') != std::string::npos) {
+        const std::string resolved = PathBelow(LongPathName(PathJoin(root, item)), LongPathName(root));
+        if (!resolved.empty()) RequireSafe(resolved, ownNames);
+    }
+    // Each folder on the way is looked at once per check, however many
+    // items lie in it.
+    for (size_t end = item.find_first_of("/\\"); end != std::string::npos; end = item.find_first_of("/\\", end + 1)) {
+        const std::string folder = PathJoin(root, item.substr(0, end));
+        if (linkFreeFolders.count(folder) != 0) continue;
+        if (KindOf(folder) == PathKind::Link) {
+            throw Exception("Path in patch description passes through the link " + folder + ": \"" + item + "\"");
+        }
+        linkFreeFolders.insert(folder);
+    }
 }
 
 // Every name of the batch is checked before the first file is written or
@@ -142,19 +142,20 @@ void PatchApplier::CheckItemPaths() {
         }
     }
     patchInfo.ResetIterators();
+    std::set<std::string> linkFree;
     std::string path;
     std::string archive;
     while (patchInfo.NextDiffFile(path, archive)) {
-        RequireInside(path, ownNames);
+        RequireInside(path, ownNames, linkFree);
         RequireSafe(archive, WorkFileNames());
     }
     while (patchInfo.NextNewFile(path, archive)) {
-        RequireInside(path, ownNames);
+        RequireInside(path, ownNames, linkFree);
         RequireSafe(archive, WorkFileNames());
     }
-    while (patchInfo.NextDeletedFile(path)) RequireInside(path, ownNames);
-    while (patchInfo.NextDeletedDirectory(path)) RequireInside(path, ownNames);
-    while (patchInfo.NextNewDirectory(path)) RequireInside(path, ownNames);
+    while (patchInfo.NextDeletedFile(path)) RequireInside(path, ownNames, linkFree);
+    while (patchInfo.NextDeletedDirectory(path)) RequireInside(path, ownNames, linkFree);
+    while (patchInfo.NextNewDirectory(path)) RequireInside(path, ownNames, linkFree);
     patchInfo.ResetIterators();
 }
 
@@ -271,7 +272,7 @@ std::vector<std::string> PatchApplier::PreparedItems() {
 void PatchApplier::WritePreparedList() {
     std::string list;
     for (const std::string& item : PreparedItems()) {
-        list += std::to_string(SizeOf(PathJoin(batch.patchedFilesFolder, item))) + "\t" + item + "\n";
+        list += std::to_string(FileSizeOf(PathJoin(batch.patchedFilesFolder, item))) + "\t" + item + "\n";
     }
     const std::string path = PathJoin(batch.patchFolder, kPreparedListName);
     if (!ReplaceFileAtomically(path, list)) throw Exception("Failed to write " + path, ErrorCode::StepFailed);
@@ -306,8 +307,8 @@ void PatchApplier::CheckPreparedFiles(const std::optional<ResumePoint>& recorded
     for (const std::string& item : PreparedItems()) {
         const auto recorded = sizes.find(item);
         const int64_t size = recorded == sizes.end() ? -2 : recorded->second;
-        if (SizeOf(PathJoin(batch.patchedFilesFolder, item)) == size) continue;
-        if (movesBegun && SizeOf(PathJoin(batch.installationFolder, item)) == size) continue;
+        if (FileSizeOf(PathJoin(batch.patchedFilesFolder, item)) == size) continue;
+        if (movesBegun && FileSizeOf(PathJoin(batch.installationFolder, item)) == size) continue;
         if (movesBegun) {
             throw Exception("The prepared file " + item + " was lost after the moves had begun.",
                             ErrorCode::ReinstallRequired);
@@ -325,7 +326,6 @@ void PatchApplier::CheckPreparedFiles(const std::optional<ResumePoint>& recorded
 void PatchApplier::ApplyPatch(const std::optional<ResumePoint>& recordedAction) {
     LogEntry(LogLevel::Trace, kLogSource, 161).Stream() << "ApplyPatch Start";
     resumeAt = recordedAction;
-    CheckItemPaths();
     std::string path;
     while (patchInfo.NextDeletedFile(path)) {
         if (ShouldApply(path)) Delete(PathJoin(batch.installationFolder, path), PathKind::File);

@@ -69,10 +69,11 @@ public:
     // installation is not changed. When it returns, every prepared file is
     // on the disk.
     void PreparePatch(IArchiveSource& archives);
-    // Stage two, from the recorded action when resumeAt is given. Throws
-    // Exception when a prepared file cannot be moved and the user gives up,
-    // or when an action cannot be recorded. When it returns, every change
-    // is on the disk.
+    // Stage two, from the recorded action when resumeAt is given, once
+    // CheckItemPaths and CheckPreparedFiles passed. Throws Exception when a
+    // prepared file cannot be moved and the user gives up, or when an
+    // action cannot be recorded. When it returns, every change is on the
+    // disk.
     void ApplyPatch(const std::optional<ResumePoint>& resumeAt);
 
     // Throws Exception when any name of the batch may not touch the disk.
@@ -96,7 +97,8 @@ private:
     void RemoveWithRetry(const std::string& target);
     void ClearWay(const std::string& target, PathKind needed);
     void RequireSafe(const std::string& path, const std::vector<std::string>& ownNames) const;
-    void RequireInside(const std::string& item, const std::vector<std::string>& ownNames) const;
+    void RequireInside(const std::string& item, const std::vector<std::string>& ownNames,
+                       std::set<std::string>& linkFreeFolders) const;
     std::vector<std::string> PreparedItems();
     void WritePreparedList();
     std::map<std::string, int64_t> ReadPreparedList() const;
