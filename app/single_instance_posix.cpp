@@ -4,6 +4,7 @@
 #include <sys/file.h>
 #include <unistd.h>
 
+#include "base/own_file_posix.h"
 #include "base/paths.h"
 
 const char* const kInstanceName = "IronvaleUpdater";
@@ -12,8 +13,9 @@ void SingleInstance::Traits::Close(intptr_t value) { ::close(static_cast<int>(va
 
 bool SingleInstance::Acquire() {
     const std::string path = PathJoin(GetTempDirectory(), std::string(kInstanceName) + ".lock");
-    const int fd = ::open(path.c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0644);
-    if (fd < 0) return false;
-    guard.Reset(fd);
+    UniqueFileDescriptor file = OpenOwnFile(path, O_RDWR);
+    if (!file) return false;
+    const int fd = file.Get();
+    guard.Reset(file.Release());
     return flock(fd, LOCK_EX | LOCK_NB) == 0;
 }

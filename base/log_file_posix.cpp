@@ -4,6 +4,7 @@
 #include <unistd.h>
 
 #include "base/log_file.h"
+#include "base/own_file_posix.h"
 #include "base/unique_handle_posix.h"
 
 namespace {
@@ -15,7 +16,7 @@ namespace LogFile {
 bool IsOpen() { return file.IsValid(); }
 
 bool Open(const std::string& path, bool truncate) {
-    UniqueFileDescriptor opened(::open(path.c_str(), O_WRONLY | O_CREAT | O_APPEND | O_CLOEXEC, 0644));
+    UniqueFileDescriptor opened = OpenOwnFile(path, O_WRONLY | O_APPEND);
     if (!opened) return false;
     // Exclusive like the Windows build: a second instance gets no log.
     if (flock(opened.Get(), LOCK_EX | LOCK_NB) != 0 || (truncate && ftruncate(opened.Get(), 0) != 0)) return false;

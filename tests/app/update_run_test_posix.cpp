@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 #include <sys/file.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 #include <algorithm>
 #include <chrono>
@@ -416,6 +417,14 @@ TEST_F(UpdateRun, StartsAndKeepsASecondCopyOut) {
     EXPECT_NE(last.find(": Error: There is already another updater instance running.\r\n"), std::string::npos) << last;
     Run("\n", {"-internallyElevated", "1"}, updater);
     close(guard);
+    // The fixed names in the shared temporary folder are never opened through a link someone put there.
+    WriteTextFile(temp / "victim.txt", "another user's");
+    for (const char* name : {"IronvaleUpdater.log", "IronvaleUpdater.lock"}) {
+        RemoveFile(PathJoin(temp / "tmp", name));
+        ASSERT_EQ(symlink((temp / "victim.txt").c_str(), PathJoin(temp / "tmp", name).c_str()), 0);
+    }
+    Start("", {}, updater).Wait();
+    EXPECT_EQ(ReadTextFile(temp / "victim.txt"), "another user's");
 }
 
 }  // namespace
