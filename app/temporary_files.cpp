@@ -1,8 +1,11 @@
 #include "app/temporary_files.h"
 
+#include "base/atomic_file.h"
 #include "base/file_operations.h"
 #include "base/paths.h"
+#include "base/record_names.h"
 #include "base/string_helpers.h"
+#include "patch/patch_applier.h"
 
 void CleanTemporaryFiles(const std::string& patchDir, const std::string& patchedDir) {
     DeleteDirectory(patchedDir, true);
@@ -17,5 +20,13 @@ void CleanTemporaryFiles(const std::string& patchDir, const std::string& patched
             }
         }
     }
+    // A write of the description or the prepared-files list cut short
+    // leaves its replacement beside it.
+    for (const std::string& name : WorkFileNames()) RemoveLeftoverReplacement(PathJoin(patchDir, name));
     DeleteDirectory(patchDir, false);
+}
+
+void RemoveLeftovers(const std::string& installDir, const std::string& patchDir, const std::string& patchedDir) {
+    CleanTemporaryFiles(patchDir, patchedDir);
+    for (const std::string& record : InstallationRecordNames()) RemoveLeftoverReplacement(PathJoin(installDir, record));
 }

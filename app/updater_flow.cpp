@@ -25,15 +25,9 @@ void Updater::RunUpdate() {
         const UpdateFacts facts = ReadFacts();
         const UpdateLayout layout = MakeUpdateLayout(configuration, installDir);
         const UpdatePlan plan = PlanUpdate(facts, layout);
-        if (plan.road != Road::Resume) {
-            // Work folders of a run that ended before its stage two began,
-            // or after it was done, hold nothing to resume; nor do the
-            // records' half-written replacements.
-            CleanTemporaryFiles(layout.patchFolder, layout.patchedFilesFolder);
-            for (const char* record : {kInstallationDataFileName, kUninstallRecordName}) {
-                RemoveLeftoverReplacement(PathJoin(installDir, record));
-            }
-        }
+        // Work folders of a run that ended before its stage two began, or
+        // after it was done, hold nothing to resume.
+        if (plan.road != Road::Resume) RemoveLeftovers(installDir, layout.patchFolder, layout.patchedFilesFolder);
         switch (plan.road) {
             case Road::UpToDate:
                 return;

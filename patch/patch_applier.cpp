@@ -14,6 +14,7 @@
 #include "base/paths.h"
 #include "base/record_names.h"
 #include "base/status_interfaces.h"
+#include "patch/checksum.h"
 #include "patch/patch_archive.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
@@ -265,50 +266,69 @@ std::vector<std::string> PatchApplier::PreparedItems() {
     return items;
 }
 
-// What stage one prepared and how large each file came out, so that stage
-// two, perhaps in a later process, can tell a complete set from one that
-// lost files. One line per file: the size, a tab, the item's path (item
-// paths hold no control characters).
+// What stage one prepared, how large each file came out and its Adler-32,
+// so that stage two, perhaps in a later process, can tell a complete set
+// from one that lost files, and a moved file from the old one of the same
+// size. One line per file: size, checksum, the item's path, tab-separated
+// (item paths hold no control characters).
 void PatchApplier::WritePreparedList() {
     std::string list;
     for (const std::string& item : PreparedItems()) {
-        list += std::to_string(FileSizeOf(PathJoin(batch.patchedFilesFolder, item))) + "\t" + item + "\n";
+        const std::string prepared = PathJoin(batch.patchedFilesFolder, item);
+        list += std::to_string(FileSizeOf(prepared)) + "\t" + std::to_string(ChecksumOfFile(prepared)) + "\t" + item +
+                "\n";
     }
     const std::string path = PathJoin(batch.patchFolder, kPreparedListName);
     if (!ReplaceFileAtomically(path, list)) throw Exception("Failed to write " + path, ErrorCode::StepFailed);
 }
 
-std::map<std::string, int64_t> PatchApplier::ReadPreparedList() const {
-    std::map<std::string, int64_t> sizes;
+std::map<std::string, PatchApplier::PreparedFile> PatchApplier::ReadPreparedList() const {
+    std::map<std::string, PreparedFile> files;
     std::string text;
-    if (!ReadFileBytes(PathJoin(batch.patchFolder, kPreparedListName), 64 * 1024 * 1024, text)) return sizes;
+    if (!ReadFileBytes(PathJoin(batch.patchFolder, kPreparedListName), 64 * 1024 * 1024, text)) return files;
+    const auto number = [](const std::string& digits, int64_t& value) {
+        if (digits.empty() || digits.size() > 18 || digits.find_first_not_of("0123456789") != std::string::npos) {
+            return false;
+        }
+        value = std::stoll(digits);
+        return true;
+    };
     for (size_t start = 0; start < text.size();) {
         const size_t end = std::min(text.find('\n', start), text.size());
         const std::string line = text.substr(start, end - start);
-        const size_t tab = line.find('\t');
-        const std::string digits = line.substr(0, tab);
-        if (tab == std::string::npos || digits.empty() || digits.size() > 18 ||
-            digits.find_first_not_of("0123456789") != std::string::npos) {
+        const size_t first = line.find('\t');
+        const size_t second = first == std::string::npos ? first : line.find('\t', first + 1);
+        PreparedFile file;
+        int64_t checksum = 0;
+        if (second == std::string::npos || !number(line.substr(0, first), file.size) ||
+            !number(line.substr(first + 1, second - first - 1), checksum)) {
             return {};  // not the program's own list
         }
-        sizes[line.substr(tab + 1)] = std::stoll(digits);
+        file.checksum = static_cast<uint32_t>(checksum);
+        files[line.substr(second + 1)] = file;
         start = end + 1;
     }
-    return sizes;
+    return files;
 }
 
 // Every prepared file must be there, as large as stage one made it, before
 // the installation starts to depend on them; once the moves have begun, a
-// file may already stand at its destination instead.
+// file may already stand at its destination instead, which its checksum
+// tells from the old file.
 void PatchApplier::CheckPreparedFiles(const std::optional<ResumePoint>& recordedAction) {
     // The record that marks the start of the moves names no path.
     const bool movesBegun = recordedAction && recordedAction->actionIndex >= 0 && recordedAction->file.empty();
-    const std::map<std::string, int64_t> sizes = ReadPreparedList();
+    const std::map<std::string, PreparedFile> listed = ReadPreparedList();
     for (const std::string& item : PreparedItems()) {
-        const auto recorded = sizes.find(item);
-        const int64_t size = recorded == sizes.end() ? -2 : recorded->second;
-        if (FileSizeOf(PathJoin(batch.patchedFilesFolder, item)) == size) continue;
-        if (movesBegun && FileSizeOf(PathJoin(batch.installationFolder, item)) == size) continue;
+        const auto found = listed.find(item);
+        if (found != listed.end()) {
+            const PreparedFile& file = found->second;
+            if (FileSizeOf(PathJoin(batch.patchedFilesFolder, item)) == file.size) continue;
+            const std::string destination = PathJoin(batch.installationFolder, item);
+            if (movesBegun && FileSizeOf(destination) == file.size && ChecksumOfFile(destination) == file.checksum) {
+                continue;
+            }
+        }
         if (movesBegun) {
             throw Exception("The prepared file " + item + " was lost after the moves had begun.",
                             ErrorCode::ReinstallRequired);

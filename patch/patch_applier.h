@@ -101,7 +101,11 @@ private:
                        std::set<std::string>& linkFreeFolders) const;
     std::vector<std::string> PreparedItems();
     void WritePreparedList();
-    std::map<std::string, int64_t> ReadPreparedList() const;
+    struct PreparedFile {
+        int64_t size = -1;
+        uint32_t checksum = 0;
+    };
+    std::map<std::string, PreparedFile> ReadPreparedList() const;
     void MakePreparedFilesDurable();
     void NoteChanged(const std::string& path);
     void PrepareDiffFile(IArchiveSource& archives, const std::string& path, const std::string& archive);

@@ -167,7 +167,7 @@ TestBatch::TestBatch(const Tree& installed, const Tree& target, bool published) 
         const auto old = installed.files.find(file.first);
         if (old != installed.files.end() && old->second == file.second) continue;
         const std::string path = Backslashed(file.first);
-        const std::string archive = file.first.substr(0, file.first.find('/')) + ".dat";
+        const std::string archive = "patch_" + file.first.substr(0, file.first.find('/')) + ".dat";
         if (!archives[archive]) archives[archive] = std::make_unique<ArchiveWriter>(PathJoin(PatchFolder(), archive));
         (old == installed.files.end() ? description.newFiles : description.diffFiles).emplace_back(path, archive);
         archives[archive]->AddStoredMember(

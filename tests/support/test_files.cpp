@@ -12,10 +12,10 @@
 
 namespace fs = std::filesystem;
 
-TempFolder::TempFolder() {
+TempFolder::TempFolder(const std::string& base) {
     static std::atomic<unsigned> counter{0};
     const std::string name = "ivl-test-" + std::to_string(std::random_device()()) + "-" + std::to_string(counter++);
-    path = (fs::temp_directory_path() / name).string();
+    path = ((base.empty() ? fs::temp_directory_path() : fs::path(base)) / name).string();
     fs::create_directories(path);
 }
 

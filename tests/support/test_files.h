@@ -6,7 +6,8 @@
 // A fresh folder under the system's temporary folder, removed with all its contents when the object goes away.
 class TempFolder {
 public:
-    TempFolder();
+    // In the system's temporary folder, or in base when given.
+    explicit TempFolder(const std::string& base = "");
     TempFolder(const TempFolder&) = delete;
     TempFolder& operator=(const TempFolder&) = delete;
     ~TempFolder();
