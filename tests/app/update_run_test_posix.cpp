@@ -103,8 +103,8 @@ protected:
                        const std::string& program = "served_updater", const std::string& folder = "") {
         WriteTextFile(temp / "answers", answers);
         const std::string path = program.find('/') == std::string::npos ? TestProgramPath(program) : program;
-        const std::string script = "cd \"$0\" && TMPDIR='" + temp / "tmp" + "' exec \"$@\" <'" + temp / "answers" +
-                                   "' >'" + temp / "output" + "' 2>&1";
+        const std::string script =
+            "cd \"$0\" && TMPDIR='" + tmp + "' exec \"$@\" <'" + temp / "answers" + "' >'" + temp / "output" + "' 2>&1";
         arguments.insert(arguments.begin(), {"-c", script, folder.empty() ? temp.Path() : folder, path});
         return ChildProcess("/bin/sh", arguments);
     }
@@ -150,6 +150,7 @@ protected:
     TempFolder temp;
     HttpTestServer server;
     std::string install = temp / "Ironvale";
+    std::string tmp = temp / "tmp";  // the program's temporary folder
 };
 
 TEST_F(UpdateRun, PatchesToTheLatestVersionAndStartsTheGame) {
@@ -201,6 +202,7 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
                  [&](std::string& text) { text = std::regex_replace(text, std::regex(pattern), with); });
         };
     };
+    TempFolder memory("/dev/shm");  // another volume than the installation's
     const auto changed = [&](bool build) {
         Publish(Version(1), rebuilt, "2", nullptr);
         Install(modded, "1");
@@ -226,6 +228,14 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
          "9000000000000 MB of free space is required.", "1", false, false, 0},
         {"changed, the build taken", [&] { changed(true); }, "2", "y\ny\nn\n", "Download size: ", "2", false, true, -1},
         {"changed, the build declined", [&] { changed(true); }, "2", "y\nn\n", corrupt, "1", false, true, -1},
+        {"changed over a conflicting tree, the build taken",
+         [&] {
+             Publish(Version(1), Tree(rebuilt).File("cfg/x.ini", "a folder now"), "2", nullptr);
+             Install(Tree(modded).File("cfg", "a file"), "1");
+         },
+         "2", "y\ny\nn\n", "Download size: ", "2", false, true, -1},
+        {"the temporary folder on another volume, the complete build",
+         [&] { tmp = memory.Path(), Install(Version(2), "-1"); }, "2", "n\n", "", "2", false, false, -1},
         {"changed, no build to offer", [&] { changed(false); }, "2", "y\n", "Failed to apply delta file", "1", false,
          false, -1},
         {"plain, a description without the new elements",
@@ -252,6 +262,7 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
+        tmp = temp / "tmp";
         DeleteDirectory(temp / "server", true);
         Publish(Version(1), Version(2), "2", &signer);
         Install(Version(1), "1");
@@ -306,27 +317,38 @@ TEST_F(UpdateRun, ResumesAnInterruptedPatchOnlyFromItsOwnCheckedState) {
          "keyed_updater", false},
         {"an unsigned description", [&] { RemoveFile(PathJoin(install, "tempPatch/patchinfo.xml.sig")); },
          "keyed_updater", false},
+        // No move has run yet: prepared again (its archives fetched again), then resumed.
+        {"the prepared files lost", [&] { DeleteDirectory(PathJoin(install, "tempPatch/patched"), true); },
+         "served_updater", false},
     };
     Publish(Version(1), Version(2), "2", &signer);
-    std::string added;  // a file the patch adds: an immutable one in its way stops the moves
-    for (const auto& file : Version(2).files) {
-        if (Version(1).files.count(file.first) == 0) added = PathJoin(install, file.first);
+    std::string removed;  // a file the patch deletes: while it cannot be deleted, stage two asks and stops
+    for (const auto& file : Version(1).files) {
+        if (Version(2).files.count(file.first) == 0) removed = PathJoin(install, file.first);
     }
+    ASSERT_FALSE(removed.empty());
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         Install(Version(1), "1");
-        WriteTextFile(added, "in the way");
-        SetImmutable(added, true);
-        Run("y\nc\n", {"-latestVersion", "2"}, c.program);  // Cancel at the retry question
-        SetImmutable(added, false);
+        SetImmutable(removed, true);
+        const std::string output = Run("y\nc\n", {"-latestVersion", "2"}, c.program);  // Cancel at the question
+        SetImmutable(removed, false);
+        EXPECT_NE(output.find("Failed to delete the file:"), std::string::npos) << output;
         ASSERT_EQ(InstalledVersion(), "-1");
-        RemoveFile(added);
         WriteTree(documents, TreeOf("letter.txt=mine|saves/slot1.sav=progress"));
         if (c.tamper) c.tamper();
         const size_t requests = server.Requests().size();
         Run("n\n", {"-latestVersion", "2"}, c.program);
         EXPECT_EQ(InstalledVersion(), "2");
-        EXPECT_EQ(Game(), Version(2));
+        // The complete build leaves what it does not name, the files the patch had yet to delete among them.
+        Tree game = Game();
+        if (!c.resumed) {
+            for (const auto& file : Version(1).files) {
+                if (Version(2).files.count(file.first) == 0) game.files.erase(file.first);
+            }
+            game.folders = Version(2).folders;
+        }
+        EXPECT_EQ(game, Version(2));
         EXPECT_EQ(ReadTree(documents), TreeOf("letter.txt=mine|saves/slot1.sav=progress"));
         EXPECT_EQ(ArchiveRequests(requests) == 0, c.resumed);  // the complete build fetches its archives
         ExpectNoLeftovers();
@@ -389,7 +411,10 @@ TEST_F(UpdateRun, UninstallerModesStayInsideTheInstallationAndTheDocuments) {
                       "\" /></DirectoryChanges><RegistryHive>HKEY_LOCAL_MACHINE</RegistryHive></IronvaleWestPatch>");
     WriteTextFile(PathJoin(install, "GL.ini"), "settings");
     RemoveFile(PathJoin(install, "InstallationData.xml"));  // the removal goes on without it
+    ASSERT_EQ(symlink((temp / "documents").c_str(), PathJoin(install, "pb").c_str()),
+              0);  // goes itself, not its target
     Run("", {"-doUninstallCleanup", "true"});
+    EXPECT_TRUE(PathExists(temp / "documents/keep.txt"));
     EXPECT_FALSE(PathExists(PathJoin(install, recorded)));
     EXPECT_FALSE(PathExists(PathJoin(install, "GL.ini")));
     EXPECT_EQ(ReadTextFile(temp / "beside.txt"), "beside the game");
