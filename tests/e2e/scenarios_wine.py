@@ -318,6 +318,36 @@ def scenario_reinstall(s, run):
     run.install_version(dict(sorted(version_tree(2).items())[1:]), "-1")  # one file missing
     run.play(["-latestVersion", "2"], [("", NO)], version_tree(2), "2")
     check("build_2" in s.run_log(), "the complete build was not fetched")
+    # Again with the temporary folder on another drive: the build's description is written, not moved, from there.
+    drive = Path(tempfile.mkdtemp(dir="/dev/shm"))
+    (s.build / "wineprefix/dosdevices/t:").symlink_to(drive)
+    try:
+        run.install_version(dict(sorted(version_tree(2).items())[1:]), "-1")
+        run.env.update(TEMP="T:\\", TMP="T:\\")
+        run.play(["-latestVersion", "2"], [("", NO)], version_tree(2), "2")
+    finally:
+        (s.build / "wineprefix/dosdevices/t:").unlink()
+        shutil.rmtree(drive)
+
+
+def scenario_repair(s, run):
+    # A changed file fails its delta, and the installation holds files where the build has folders: Yes to the
+    # complete build finishes it (what the build does not name stays), and the next start finds nothing to do.
+    new = {**{k: v + b" in 2" for k, v in version_tree(1).items() if k != "maps"}, "maps/level.map": b"level two",
+           "cfg/x.ini": b"a folder now"}  # each file a delta away from 1
+    s.publish(version_tree(1), new, "2", s.work / "server")
+    old = {**version_tree(1), "cfg": b"a file", "data1/file1.bin": b"changed by the player"}
+    run.install_version(old, "1")
+    new = {**{k: v for k, v in old.items() if not any(p.startswith(k + "/") for p in new)}, **new}
+    run.play(["-latestVersion", "2"], [("", YES), ("INSTALLER_REPAIR_DOWNLOAD_BUILD", YES), ("", NO)], new, "2")
+    run.play(["-latestVersion", "2"], [], new, "2", game="+webSiteHostName")
+    # Read-only files the patch replaces and deletes are the patch's to change; dotted versions order by number.
+    s.publish(version_tree(1), version_tree(2), "1.10", s.work / "server")
+    run.install_version(version_tree(1), "1.9")
+    for path in ("data1/file1.bin", "data2/file5.bin"):  # replaced, deleted
+        (run.install / path).chmod(0o444)
+    run.play(["-latestVersion", "1.10"], [("1.10", YES), ("", NO)], version_tree(2), "1.10")
+    run.play(["-latestVersion", "1.9"], [], version_tree(2), "1.10", game="+webSiteHostName")
 
 
 def cancel_in_window(s, run, line):
@@ -392,6 +422,11 @@ def described(items):
 
 
 HOSTILE = [  # the published patch's file, its new content from the old, what the error box says
+    # The program's own names by the 8.3 aliases Wine's GetShortPathNameW gives them.
+    ("patchinfo.xml", described('<DirectoryChanges><delete Path="TEMP~MPE" /></DirectoryChanges>'), "Unsafe path"),
+    ("patchinfo.xml", described('<FileChanges><delete Path="INST~MQ5.XML" /></FileChanges>'), "Unsafe path"),
+    ("patchinfo.xml", described('<FileChanges><delete Path="UNIN~L2I.XML" /></FileChanges>'), "Unsafe path"),
+    ("patchinfo.xml", described('<FileChanges><delete Path="linked\\keep.txt" /></FileChanges>'), "through the link"),
     ("patchinfo.xml", described('<FileChanges><delete Path="..\\outside.txt" /></FileChanges>'), "Unsafe path"),
     ("patchinfo.xml", described('<DirectoryChanges><delete Path=".\\" /></DirectoryChanges>'), "Unsafe path"),
     ("patchinfo.xml", described('<FileChanges><delete Path="*.*" /></FileChanges>'), "Unsafe path"),
@@ -402,10 +437,16 @@ HOSTILE = [  # the published patch's file, its new content from the old, what th
 
 
 def scenario_hostile(s, run):
+    elsewhere = run.folder / "elsewhere"
     for name, damage, expected in HOSTILE:
         file = run.ready() / name
         file.write_bytes(damage(file.read_bytes()))
+        (run.install / "Uninstall.xml").write_text("<IronvaleWestPatch />")
+        write_tree(elsewhere, {"keep.txt": b"the player's"})
+        (run.install / "linked").symlink_to(elsewhere)
         run.play(["-latestVersion", "2"], [("", YES), (expected, OK)], version_tree(1), "1")
+        check((elsewhere / "keep.txt").exists() and (run.install / "Uninstall.xml").exists(), "a protected file went")
+        (run.install / "linked").unlink()
 
 
 def scenario_up_to_date(s, run):
@@ -448,6 +489,13 @@ def scenario_uninstall_cleanup(s, run):
     left = read_tree(run.install)
     check(not any(p in left for p in listed + ["corvid.dll", "GL.ini", "pb/pb.dll"]) and len(left) >= 3 and
           run.outside.read_text() == "beside the game", "only what the record lists inside the installation may go")
+    # Without installation data the record's files go all the same; a linked "pb" never takes its target along.
+    write_tree(run.folder / "elsewhere", {"pb.dll": b"not the game's"})
+    (run.install / "pb").symlink_to(run.folder / "elsewhere")
+    (run.install / "InstallationData.xml").unlink()
+    (run.install / listed[0]).write_bytes(b"back")
+    run.finish(run.start("-doUninstallCleanup", "true"))
+    check(not (run.install / listed[0]).exists() and (run.folder / "elsewhere/pb.dll").exists(), "mode 3 without data")
 
 
 def scenario_elevated_copy(s, run):
@@ -607,7 +655,8 @@ SCENARIOS = [
     ("start-up", start_up),  # no game: the language dialog, the not-installed box, the log's exact format
     ("patch over HTTP", patch_1_to_2),  # signed addresses, both questions in the registry's language, the game started
     ("killed", scenario_killed),  # SIGKILL (as TerminateProcess) at seeded moments of stage two, a chain 1 to 3
-    ("reinstall", scenario_reinstall),  # -1 without a record: the complete build
+    ("reinstall", scenario_reinstall),  # -1 without a record: the complete build, also with the temporary folder on T:
+    ("repair", scenario_repair),  # the complete build over a conflicting tree; read-only files; dotted versions
     ("cancel download", scenario_cancel_download),  # "Cancel" then Yes while an archive arrives
     ("cancel preparation", scenario_cancel_preparation),  # ... while a large file is unpacked
     ("missing patch", scenario_missing_patch),  # the play-old question; Yes starts the game
