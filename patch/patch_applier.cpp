@@ -275,8 +275,8 @@ void PatchApplier::WritePreparedList() {
     std::string list;
     for (const std::string& item : PreparedItems()) {
         const std::string prepared = PathJoin(batch.patchedFilesFolder, item);
-        list += std::to_string(FileSizeOf(prepared)) + "\t" + std::to_string(ChecksumOfFile(prepared)) + "\t" + item +
-                "\n";
+        list +=
+            std::to_string(FileSizeOf(prepared)) + "\t" + std::to_string(ChecksumOfFile(prepared)) + "\t" + item + "\n";
     }
     const std::string path = PathJoin(batch.patchFolder, kPreparedListName);
     if (!ReplaceFileAtomically(path, list)) throw Exception("Failed to write " + path, ErrorCode::StepFailed);
