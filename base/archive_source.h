@@ -17,6 +17,9 @@ public:
     // Blocks until the archive whose local file name is fileName has an
     // outcome. Cancelled when a stop was requested.
     virtual ArchiveState WaitForArchive(const std::string& fileName) = 0;
+    // The stage needs no more archives (it failed): a wait in progress
+    // ends at once. Nothing to do for a source that never waits long.
+    virtual void Abandon() {}
 
 protected:
     IArchiveSource() = default;

@@ -1,12 +1,14 @@
 #!/usr/bin/env bash
 # Both patch stages against a plain pipeline doing the same work, in the
 # same run: a generated installation (SIZE_MIB, default 1024, in FILES
-# files, default 300) and a patch rebuilding 20% of them from xdelta3
-# deltas (about 5% of each changed file edited). Ours: ironvale-patch apply
-# (archives copied by the downloader from file:// locations, deltas
-# unpacked and decoded, files moved in). The pipeline, per changed file:
-# xz --format=lzma -dc | xdelta3 -d, then mv. Prints both medians, the
-# ratio (ours / pipeline; at most 1.0 is the goal) and our peak RSS.
+# files, default 300) and a patch in 8 archives rebuilding 20% of them
+# from xdelta3 deltas (about 5% of each changed file edited). Ours:
+# ironvale-patch apply (archives copied by the downloader from file://
+# locations, deltas unpacked and decoded, files moved in), with stage one
+# on one worker and on the default (the cores). The pipeline, per changed
+# file: xz --format=lzma -dc | xdelta3 -d, then mv. Prints the medians,
+# the ratios (default / one worker: at most 0.6 on two cores is the goal;
+# ours / pipeline: at most 1.0) and each peak RSS.
 #   bench/apply.sh ROOT BUILD_DIR   (ROUNDS=N default 5, SIZE_MIB, FILES)
 set -euo pipefail
 root=$1
@@ -52,7 +54,7 @@ PY
     flat=${name//\//_}
     xdelta3 -e -f -A -S none -s "pristine/$name" "target/$name" "deltas/$flat"
     xz --format=lzma -k -c "deltas/$flat" >"lzma/$flat.lzma"
-    archive="archive$((i % 4)).dat"
+    archive="archive$((i % 8)).dat"
     items+="        <diff Path=\"${name//\//\\}\" File=\"$archive\" />"$'\n'
     echo "${name//\//\\}=deltas/$flat" >>"members.$archive"
     i=$((i + 1))
@@ -89,12 +91,14 @@ check_installation() {
   while read -r name; do cmp -s "install/$name" "target/$name" || { echo "apply.sh: $1 left $name wrong" >&2; exit 1; }; done <changed.txt
 }
 
-measure() {  # NAME FUNCTION: appends "seconds kilobytes" to NAME.times
+measure() {  # NAME: appends "seconds kilobytes" to NAME.times
   local name=$1
   reset_installation
   sync
   if [ "$name" = ours ]; then
     /usr/bin/time -f "%e %M" -o "time.$name" "$tool" apply patch install
+  elif [ "$name" = one ]; then
+    /usr/bin/time -f "%e %M" -o "time.$name" "$tool" apply --workers 1 patch install
   else
     /usr/bin/time -f "%e %M" -o "time.$name" bash -c "$(declare -f run_pipeline); run_pipeline"
   fi
@@ -102,13 +106,15 @@ measure() {  # NAME FUNCTION: appends "seconds kilobytes" to NAME.times
   check_installation "$name"
 }
 
-rm -f ours.times pipeline.times
+rm -f ours.times one.times pipeline.times
 for ((i = 0; i < rounds; i++)); do
   if ((i % 2 == 0)); then
     measure ours
+    measure one
     measure pipeline
   else
     measure pipeline
+    measure one
     measure ours
   fi
 done
@@ -117,8 +123,12 @@ rm -rf install
 median() { sort -n | awk '{v[NR] = $1} END {print (NR % 2) ? v[(NR + 1) / 2] : (v[NR / 2] + v[NR / 2 + 1]) / 2}'; }
 ours=$(cut -d' ' -f1 ours.times | median)
 theirs=$(cut -d' ' -f1 pipeline.times | median)
+one=$(cut -d' ' -f1 one.times | median)
 ours_kb=$(cut -d' ' -f2 ours.times | sort -n | tail -1)
+one_kb=$(cut -d' ' -f2 one.times | sort -n | tail -1)
 echo "rounds:                    $rounds"
-echo "ironvale-patch apply:      median ${ours} s, peak RSS $((ours_kb / 1024)) MiB"
+echo "ironvale-patch apply:      median ${ours} s, peak RSS $((ours_kb / 1024)) MiB ($(nproc) workers at most)"
+echo "  --workers 1:             median ${one} s, peak RSS $((one_kb / 1024)) MiB"
 echo "xz -dc | xdelta3 -d; mv:   median ${theirs} s"
+awk -v a="$ours" -v b="$one" 'BEGIN {printf "ratio (default / one):     %.2f\n", a / b}'
 awk -v a="$ours" -v b="$theirs" 'BEGIN {printf "ratio (ours / pipeline):   %.2f\n", a / b}'

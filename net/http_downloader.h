@@ -45,6 +45,7 @@ public:
     DownloadStatus WaitForFile(const std::string& fileName);
     // WaitForFile as the patch applier sees it.
     ArchiveState WaitForArchive(const std::string& fileName) override;
+    void Abandon() override { RequestStop(); }
 
     // Ends the transfer in progress and the rest of the list, and wakes a
     // caller blocked in WaitForFile. Safe from any thread.

@@ -9,6 +9,7 @@
 #include "base/cancellation.h"
 #include "base/exception.h"
 #include "base/file_stream.h"
+#include "base/memory_budget.h"
 
 namespace {
 
@@ -78,7 +79,7 @@ const char* LzmaResultText(int result) {
     }
 }
 
-void DecodeLzma(FileStream& input, FileStream& output, const CancellationToken* cancel) {
+void DecodeLzma(FileStream& input, FileStream& output, const CancellationToken* cancel, MemoryBudget* budget) {
     uint8_t header[kHeaderSize];
     // A stream too short to hold its own header is missing data, not a
     // header of zeros.
@@ -91,9 +92,15 @@ void DecodeLzma(FileStream& input, FileStream& output, const CancellationToken* 
         unpackedSize |= static_cast<uint64_t>(byte) << (8 * i);
     }
 
+    if (!LimitDictionary(header, sizeKnown, unpackedSize)) {
+        throw Exception("Failed to allocate LZMA structures while decoding.");
+    }
+    const uint32_t dictionary =
+        uint32_t{header[1]} | uint32_t{header[2]} << 8 | uint32_t{header[3]} << 16 | uint32_t{header[4]} << 24;
+    // The dictionary, the two buffers and the decoder's probability tables.
+    const MemoryBudget::Reservation memory(budget, uint64_t{dictionary} + 2 * kBufferSize + (1 << 20));
     DecoderState state;
-    if (!LimitDictionary(header, sizeKnown, unpackedSize) ||
-        LzmaDec_Allocate(state.get(), header, LZMA_PROPS_SIZE, &heapAllocator) != SZ_OK) {
+    if (LzmaDec_Allocate(state.get(), header, LZMA_PROPS_SIZE, &heapAllocator) != SZ_OK) {
         throw Exception("Failed to allocate LZMA structures while decoding.");
     }
     LzmaDec_Init(state.get());

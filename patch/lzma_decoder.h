@@ -4,6 +4,7 @@
 
 class CancellationToken;
 class FileStream;
+class MemoryBudget;
 
 // The largest dictionary a stream may make us allocate: 1.5 GiB, the most
 // the xz tools write into a stand-alone LZMA header (the SDK encoder stops
@@ -20,8 +21,10 @@ constexpr uint32_t kMaximumLzmaDictionarySize = (1u << 30) + (1u << 29);
 // dictionary, whatever the size of the data. Throws Exception on failure;
 // what was decoded before the failure stays written. A cancel (cancel may
 // be null) is noticed at every step and ends with UserCancelled, leaving
-// the output incomplete.
-void DecodeLzma(FileStream& input, FileStream& output, const CancellationToken* cancel = nullptr);
+// the output incomplete. With a budget (may be null), the dictionary and
+// buffers are reserved from it before they are allocated.
+void DecodeLzma(FileStream& input, FileStream& output, const CancellationToken* cancel = nullptr,
+                MemoryBudget* budget = nullptr);
 
 // The text shown for an LZMA SDK result code.
 const char* LzmaResultText(int result);

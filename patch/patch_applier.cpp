@@ -1,6 +1,11 @@
 #include "patch/patch_applier.h"
 
 #include <algorithm>
+#include <condition_variable>
+#include <deque>
+#include <exception>
+#include <mutex>
+#include <thread>
 
 #include "base/archive_source.h"
 #include "base/atomic_file.h"
@@ -10,10 +15,12 @@
 #include "base/file_stream.h"
 #include "base/item_path.h"
 #include "base/log.h"
+#include "base/memory_budget.h"
 #include "base/path_kind.h"
 #include "base/paths.h"
 #include "base/record_names.h"
 #include "base/status_interfaces.h"
+#include "base/string_helpers.h"
 #include "patch/checksum.h"
 #include "patch/patch_archive.h"
 #include "patch/patch_info_file.h"
@@ -50,6 +57,8 @@ void FlushToDisk(const std::string& path) {
 
 }  // namespace
 
+size_t DefaultStageOneWorkers() { return std::max(1u, std::thread::hardware_concurrency()); }
+
 const char* const kDeltaFileName = "diffTempFile.dz";
 const char* const kPreparedListName = "patchedfiles.lst";
 
@@ -57,6 +66,10 @@ const std::vector<std::string>& WorkFileNames() {
     static const std::vector<std::string> names{kDeltaFileName, kPreparedListName, "patchinfo.xml",
                                                 "patchinfo.xml.sig"};
     return names;
+}
+
+bool IsUsableArchiveName(const std::string& name) {
+    return IsSafeItemPath(name, WorkFileNames()) && !StartsWithIgnoringCase(name, kDeltaFileName);
 }
 
 PatchApplier::PatchApplier(const PatchBatch& work, PatchInfoFile& description, PatchProgressFile& progress,
@@ -87,6 +100,10 @@ void PatchApplier::WaitForArchive(IArchiveSource& archives, const std::string& a
             break;
     }
     throw Exception("Failed to download patch file.", ErrorCode::FileNotFound);
+}
+
+void PatchApplier::RequireArchiveName(const std::string& name) const {
+    if (!IsUsableArchiveName(name)) throw Exception("Unsafe path in patch description: \"" + name + "\"");
 }
 
 void PatchApplier::RequireSafe(const std::string& path, const std::vector<std::string>& ownNames) const {
@@ -148,11 +165,11 @@ void PatchApplier::CheckItemPaths() {
     std::string archive;
     while (patchInfo.NextDiffFile(path, archive)) {
         RequireInside(path, ownNames, linkFree);
-        RequireSafe(archive, WorkFileNames());
+        RequireArchiveName(archive);
     }
     while (patchInfo.NextNewFile(path, archive)) {
         RequireInside(path, ownNames, linkFree);
-        RequireSafe(archive, WorkFileNames());
+        RequireArchiveName(archive);
     }
     while (patchInfo.NextDeletedFile(path)) RequireInside(path, ownNames, linkFree);
     while (patchInfo.NextDeletedDirectory(path)) RequireInside(path, ownNames, linkFree);
@@ -163,21 +180,12 @@ void PatchApplier::CheckItemPaths() {
 void PatchApplier::PreparePatch(IArchiveSource& archives) {
     LogEntry(LogLevel::Trace, kLogSource, 55).Stream() << "PreparePatch Start";
     CheckItemPaths();
-    LogEntry(LogLevel::Trace, kLogSource, 66).Stream() << "Applying diff files";
-    std::string path;
-    std::string archive;
-    while (patchInfo.NextDiffFile(path, archive)) {
-        CheckCancel();
-        ++filesDone;
-        ReportProgress(path);
-        PrepareDiffFile(archives, path, archive);
-    }
-    LogEntry(LogLevel::Trace, kLogSource, 132).Stream() << "Adding new files";
-    while (patchInfo.NextNewFile(path, archive)) {
-        CheckCancel();
-        ++filesDone;
-        ReportProgress(path);
-        PrepareNewFile(archives, path, archive);
+    const std::vector<PreparationJob> jobs = JobsByArchive();
+    const size_t workers = std::min<size_t>(services.workers, jobs.size());
+    if (workers <= 1) {
+        PrepareInOrder(archives);
+    } else {
+        PrepareOnWorkers(archives, jobs, workers);
     }
     // A cancel during the last extraction must not pass for a finished
     // stage: stage two would move a cut-off file in.
@@ -186,11 +194,139 @@ void PatchApplier::PreparePatch(IArchiveSource& archives) {
     MakePreparedFilesDurable();
 }
 
-void PatchApplier::PrepareDiffFile(IArchiveSource& archives, const std::string& path, const std::string& archive) {
-    WaitForArchive(archives, archive);
-    const std::string deltaPath = PathJoin(batch.patchFolder, kDeltaFileName);
-    PatchArchive(PathJoin(batch.patchFolder, archive)).DecodeFile(path, deltaPath, services.cancel);
-    CheckCancel();
+// One after the other in the description's order, each file as soon as its
+// archive has arrived.
+void PatchApplier::PrepareInOrder(IArchiveSource& archives) {
+    LogEntry(LogLevel::Trace, kLogSource, 66).Stream() << "Applying diff files";
+    std::string path;
+    std::string archive;
+    while (patchInfo.NextDiffFile(path, archive)) {
+        CheckCancel();
+        Advance(path);
+        WaitForArchive(archives, archive);
+        PrepareDiffFile(path, archive, kDeltaFileName, services.cancel, nullptr);
+    }
+    LogEntry(LogLevel::Trace, kLogSource, 132).Stream() << "Adding new files";
+    while (patchInfo.NextNewFile(path, archive)) {
+        CheckCancel();
+        Advance(path);
+        WaitForArchive(archives, archive);
+        PrepareNewFile(path, archive, services.cancel, nullptr);
+    }
+}
+
+// The items of each archive, the archives in the order they are fetched
+// (the order of their first item); empty when a path is prepared twice,
+// where only the description's order says which one stays.
+std::vector<PatchApplier::PreparationJob> PatchApplier::JobsByArchive() {
+    std::vector<PreparationJob> jobs;
+    std::map<std::string, size_t> jobOf;
+    std::set<std::string> paths;
+    bool twice = false;
+    const auto add = [&](const std::string& path, const std::string& archive, bool delta) {
+        twice = twice || !paths.insert(path).second;
+        const auto found = jobOf.emplace(archive, jobs.size());
+        if (found.second) jobs.push_back({archive, {}});
+        jobs[found.first->second].items.emplace_back(path, delta);
+    };
+    std::string path;
+    std::string archive;
+    patchInfo.ResetIterators();
+    while (patchInfo.NextDiffFile(path, archive)) add(path, archive, true);
+    while (patchInfo.NextNewFile(path, archive)) add(path, archive, false);
+    patchInfo.ResetIterators();
+    return twice ? std::vector<PreparationJob>() : jobs;
+}
+
+// Each arrived archive's files on whichever worker is free, the archives
+// handed out as they arrive, memory held within the budget. The first
+// failure (or the player's cancel) stops every worker and any wait for an
+// archive, and is what the stage ends with.
+void PatchApplier::PrepareOnWorkers(IArchiveSource& archives, const std::vector<PreparationJob>& jobs, size_t workers) {
+    LogEntry(LogLevel::Trace, kLogSource, 66).Stream() << "Preparing files on " << workers << " workers";
+    CancellationToken stop(services.cancel);
+    MemoryBudget budget(services.memoryBudget);
+    std::mutex mutex;
+    std::condition_variable changed;
+    std::deque<const PreparationJob*> arrived;
+    bool allHandedOut = false;
+    std::exception_ptr failure;
+    const auto fail = [&] {
+        {
+            std::lock_guard<std::mutex> lock(mutex);
+            if (!failure) failure = std::current_exception();
+        }
+        stop.Cancel();
+        archives.Abandon();
+        changed.notify_all();
+    };
+    std::vector<std::thread> threads;
+    for (size_t worker = 0; worker < workers; ++worker) {
+        // Each worker unpacks its deltas into a file of its own.
+        const std::string deltaName = worker == 0 ? kDeltaFileName : kDeltaFileName + ("." + std::to_string(worker));
+        threads.emplace_back([&, deltaName] {
+            for (;;) {
+                const PreparationJob* job = nullptr;
+                {
+                    std::unique_lock<std::mutex> lock(mutex);
+                    changed.wait(lock, [&] { return !arrived.empty() || allHandedOut || stop.IsCancelled(); });
+                    if (arrived.empty() || stop.IsCancelled()) return;
+                    job = arrived.front();
+                    arrived.pop_front();
+                }
+                try {
+                    for (const auto& [path, delta] : job->items) {
+                        stop.ThrowIfCancelled("");
+                        Advance(path);
+                        if (delta) {
+                            PrepareDiffFile(path, job->archive, deltaName, &stop, &budget);
+                        } else {
+                            PrepareNewFile(path, job->archive, &stop, &budget);
+                        }
+                    }
+                } catch (...) {
+                    fail();
+                    return;
+                }
+            }
+        });
+    }
+    for (const PreparationJob& job : jobs) {
+        try {
+            WaitForArchive(archives, job.archive);
+        } catch (...) {
+            fail();
+            break;
+        }
+        if (stop.IsCancelled()) break;
+        {
+            std::lock_guard<std::mutex> lock(mutex);
+            arrived.push_back(&job);
+        }
+        changed.notify_one();
+    }
+    {
+        std::lock_guard<std::mutex> lock(mutex);
+        allHandedOut = true;
+    }
+    changed.notify_all();
+    for (std::thread& thread : threads) thread.join();
+    if (failure) std::rethrow_exception(failure);
+}
+
+// The progress of the batch goes up one file at a time, whichever worker
+// reports it.
+void PatchApplier::Advance(const std::string& path) {
+    std::lock_guard<std::mutex> lock(progressMutex);
+    ++filesDone;
+    ReportProgress(path);
+}
+
+void PatchApplier::PrepareDiffFile(const std::string& path, const std::string& archive, const std::string& deltaName,
+                                   const CancellationToken* cancel, MemoryBudget* budget) {
+    const std::string deltaPath = PathJoin(batch.patchFolder, deltaName);
+    PatchArchive(PathJoin(batch.patchFolder, archive)).DecodeFile(path, deltaPath, cancel, budget);
+    if (IsCancelled(cancel)) throw Exception("", ErrorCode::UserCancelled);
     const std::string folder = PathJoin(batch.patchedFilesFolder, GetParentDirectory(path));
     if (!FileExists(folder)) MakeDirectories(folder);
 
@@ -206,7 +342,8 @@ void PatchApplier::PrepareDiffFile(IArchiveSource& archives, const std::string& 
         target.Create(PathJoin(batch.patchedFilesFolder, path));
         LogEntry(LogLevel::Trace, kLogSource, 107).Stream()
             << "Patching file " << path << ". Size: " << source.GetLength();
-        VcdiffDecoder::Decode(&source, &delta, &target, services.cancel);
+        const MemoryBudget::Reservation windows(budget, VcdiffDecoder::MemoryNeed(&source, &delta));
+        VcdiffDecoder::Decode(&source, &delta, &target, cancel);
         target.Flush();
     } catch (const Exception& error) {
         if (error.Code() == ErrorCode::UserCancelled) throw;
@@ -217,12 +354,12 @@ void PatchApplier::PrepareDiffFile(IArchiveSource& archives, const std::string& 
     RemoveFile(deltaPath);
 }
 
-void PatchApplier::PrepareNewFile(IArchiveSource& archives, const std::string& path, const std::string& archive) {
+void PatchApplier::PrepareNewFile(const std::string& path, const std::string& archive, const CancellationToken* cancel,
+                                  MemoryBudget* budget) {
     const std::string folder = PathJoin(batch.patchedFilesFolder, GetParentDirectory(path));
     if (!FileExists(folder)) MakeDirectories(folder);
-    WaitForArchive(archives, archive);
     const std::string target = PathJoin(batch.patchedFilesFolder, path);
-    PatchArchive(PathJoin(batch.patchFolder, archive)).DecodeFile(path, target, services.cancel);
+    PatchArchive(PathJoin(batch.patchFolder, archive)).DecodeFile(path, target, cancel, budget);
     FlushToDisk(target);
 }
 

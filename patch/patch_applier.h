@@ -2,6 +2,7 @@
 
 #include <cstdint>
 #include <map>
+#include <mutex>
 #include <optional>
 #include <set>
 #include <string>
@@ -12,6 +13,7 @@
 
 class CancellationToken;
 class IArchiveSource;
+class MemoryBudget;
 class IStatusView;
 class PatchInfoFile;
 class PatchProgressFile;
@@ -38,6 +40,13 @@ protected:
 extern const char* const kDeltaFileName;
 extern const char* const kPreparedListName;
 const std::vector<std::string>& WorkFileNames();
+// Whether an archive may be called name: a plain relative name that is
+// none of the work files (nor a worker's delta, the delta's name with a
+// suffix).
+bool IsUsableArchiveName(const std::string& name);
+
+// The processor's cores: stage one's default number of workers.
+size_t DefaultStageOneWorkers();
 
 // Who the stages talk to while they work; none is owned, each may be null.
 struct StageServices {
@@ -46,6 +55,12 @@ struct StageServices {
     IRetryQuestion* retryQuestion = nullptr;
     // Stage one stops at its next check once it is cancelled.
     const CancellationToken* cancel = nullptr;
+    // Stage one prepares the files of different archives on up to this many
+    // workers at once (1: one file after the other, in the description's
+    // order), holding at most memoryBudget bytes of dictionaries and delta
+    // windows between them (a larger single need runs alone).
+    size_t workers = DefaultStageOneWorkers();
+    uint64_t memoryBudget = 256ull * 1024 * 1024;
 };
 
 // Carries out one patch in two stages, so the installation is touched only
@@ -97,6 +112,7 @@ private:
     void RemoveWithRetry(const std::string& target);
     void ClearWay(const std::string& target, PathKind needed);
     void RequireSafe(const std::string& path, const std::vector<std::string>& ownNames) const;
+    void RequireArchiveName(const std::string& name) const;
     void RequireInside(const std::string& item, const std::vector<std::string>& ownNames,
                        std::set<std::string>& linkFreeFolders) const;
     std::vector<std::string> PreparedItems();
@@ -108,8 +124,20 @@ private:
     std::map<std::string, PreparedFile> ReadPreparedList() const;
     void MakePreparedFilesDurable();
     void NoteChanged(const std::string& path);
-    void PrepareDiffFile(IArchiveSource& archives, const std::string& path, const std::string& archive);
-    void PrepareNewFile(IArchiveSource& archives, const std::string& path, const std::string& archive);
+    // An archive and what stage one prepares from it: paths, each with
+    // whether it is a delta.
+    struct PreparationJob {
+        std::string archive;
+        std::vector<std::pair<std::string, bool>> items;
+    };
+    void PrepareInOrder(IArchiveSource& archives);
+    std::vector<PreparationJob> JobsByArchive();
+    void PrepareOnWorkers(IArchiveSource& archives, const std::vector<PreparationJob>& jobs, size_t workers);
+    void Advance(const std::string& path);
+    void PrepareDiffFile(const std::string& path, const std::string& archive, const std::string& deltaName,
+                         const CancellationToken* cancel, MemoryBudget* budget);
+    void PrepareNewFile(const std::string& path, const std::string& archive, const CancellationToken* cancel,
+                        MemoryBudget* budget);
 
     const PatchBatch batch;
     PatchInfoFile& patchInfo;
@@ -119,6 +147,7 @@ private:
     std::optional<ResumePoint> resumeAt;
     // Folders the moves changed, synced before stage two returns.
     std::set<std::string> changedFolders;
+    std::mutex progressMutex;  // stage one's workers report one at a time
     int32_t filesDone = 0;
     int32_t filesTotal = 0;
     int32_t actionCounter = 0;

@@ -33,7 +33,7 @@ bool ReadArchiveMember(FileStream& archive, int64_t offset, int64_t length, Arch
 PatchArchive::PatchArchive(const std::string& path) : archivePath(path) {}
 
 void PatchArchive::DecodeFile(const std::string& memberName, const std::string& destinationPath,
-                              const CancellationToken* cancel) {
+                              const CancellationToken* cancel, MemoryBudget* budget) {
     FileStream destination;
     destination.Create(destinationPath);
     archive.Open(archivePath);
@@ -46,7 +46,7 @@ void PatchArchive::DecodeFile(const std::string& memberName, const std::string& 
     if (!FindMember(memberName)) throw Exception("Failed to find file in patch archive. File: " + memberName);
     // The line number is part of the log format support staff grep for.
     LogEntry(LogLevel::Trace, "PatchArchive", 28).Stream() << "Decoding file: " << memberName;
-    DecodeLzma(archive, destination, cancel);
+    DecodeLzma(archive, destination, cancel, budget);
 }
 
 bool PatchArchive::FindMember(const std::string& memberName) {

@@ -6,6 +6,7 @@
 #include "base/file_stream.h"
 
 class CancellationToken;
+class MemoryBudget;
 
 // One member of a patch archive as its header describes it. An archive is
 // nothing but members back to back: a name length byte, the name, the data
@@ -35,7 +36,7 @@ public:
     // cancel, when cancel is given, is one); a member that is not found
     // leaves the destination empty.
     void DecodeFile(const std::string& memberName, const std::string& destinationPath,
-                    const CancellationToken* cancel = nullptr);
+                    const CancellationToken* cancel = nullptr, MemoryBudget* budget = nullptr);
 
     // Scans the open archive from its start for the first member named
     // memberName (byte for byte, case counts) and leaves the stream at its

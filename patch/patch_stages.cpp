@@ -16,7 +16,7 @@ std::vector<std::string> ArchivesInFetchOrder(PatchInfoFile& info) {
     const auto add = [&](const std::string& archive) {
         // The name becomes a file name in the patch folder before the
         // applier ever sees the description.
-        if (!IsSafeItemPath(archive, WorkFileNames())) {
+        if (!IsUsableArchiveName(archive)) {
             throw Exception("Unsafe archive name in patch description: \"" + archive + "\"");
         }
         if (seen.insert(archive).second) names.push_back(archive);

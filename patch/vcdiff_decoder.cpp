@@ -86,6 +86,27 @@ void VcdiffDecoder::Decode(FileStream* source, FileStream* delta, FileStream* ta
     } while (decoder.DecodeWindow());
 }
 
+uint64_t VcdiffDecoder::MemoryNeed(FileStream* source, FileStream* delta) {
+    MemoryStream noTarget;
+    VcdiffDecoder scan(source, delta, &noTarget);
+    uint64_t most[5] = {};
+    try {
+        scan.ReadHeader();
+        for (int32_t indicator; (indicator = delta->ReadByte()) >= 0;) {
+            Window window;
+            scan.ReadWindowHeader(static_cast<uint8_t>(indicator), window);
+            const uint32_t sizes[5] = {window.segmentLength, window.targetLength, window.dataLength,
+                                       window.instructionsLength, window.addressesLength};
+            for (int kind = 0; kind < 5; ++kind) most[kind] = std::max<uint64_t>(most[kind], sizes[kind]);
+            delta->Seek(int64_t{window.dataLength} + window.instructionsLength + window.addressesLength, 1);
+        }
+    } catch (const Exception&) {
+        most[1] = kMaxTargetWindowLength;
+    }
+    delta->Seek(0, 0);
+    return most[0] + most[1] + most[2] + most[3] + most[4];
+}
+
 void VcdiffDecoder::ReadHeader() {
     uint8_t magic[4];
     CheckedReadBytes(delta, magic, 4);

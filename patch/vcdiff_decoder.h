@@ -48,6 +48,11 @@ public:
     // cancel (cancel may be null) is noticed before each window.
     static void Decode(FileStream* source, FileStream* delta, FileStream* target,
                        const CancellationToken* cancel = nullptr);
+    // The bytes decoding the delta will hold at most (its largest window of
+    // each kind), read from the window headers alone; the delta is left at
+    // its start. A delta the headers do not describe well gets the largest
+    // window added: the decode itself reports what is wrong with it.
+    static uint64_t MemoryNeed(FileStream* source, FileStream* delta);
 
     void ReadHeader();
     void ReadCodeTable();

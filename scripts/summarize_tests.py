@@ -44,15 +44,17 @@ def main(results, build):
                 else:
                     failed += 1
                     notes.append(f"FAILED [{preset}] {name}")
-    fuzz = os.path.join(results, "fuzz.txt")
-    if os.path.exists(fuzz):
-        for line in open(fuzz):
+    for kind in ("fuzz", "checks"):  # one line per fuzz target or extra check: "PASS name" or "FAIL name"
+        listing = os.path.join(results, kind + ".txt")
+        if not os.path.exists(listing):
+            continue
+        for line in open(listing):
             status, name = line.split()
             if status == "PASS":
                 passed += 1
             else:
                 failed += 1
-                notes.append(f"FAILED [fuzz] {name}")
+                notes.append(f"FAILED [{kind}] {name}")
     for note in notes:
         print(note)
     print(passed, failed)

@@ -32,10 +32,10 @@ if ! git ls-files '*.c' '*.cpp' '*.h' | xargs clang-format --dry-run --Werror >"
   build_failures=$((build_failures + 1))
 fi
 
-build() {  # PRESET
+build() {  # PRESET [TARGET]
   echo "== building $1"
   if ! { cmake --preset "$1" >"$results/configure-$1.log" 2>&1 &&
-         cmake --build --preset "$1" -j "$jobs" >"$results/build-$1.log" 2>&1; }; then
+         cmake --build --preset "$1" -j "$jobs" ${2:+--target "$2"} >"$results/build-$1.log" 2>&1; }; then
     echo "FAILED: build of $1 (see below)"
     tail -40 "$results/configure-$1.log" "$results/build-$1.log"
     build_failures=$((build_failures + 1))
@@ -52,6 +52,16 @@ run_ctest() {  # PRESET
 }
 
 build native-asan && run_ctest native-asan
+# Stage one's workers under ThreadSanitizer: the stage-one table, where several of them fail, cancel and finish.
+if build native-tsan patch_tests; then
+  echo "== testing stage one's workers with ThreadSanitizer"
+  if "$root/build/native-tsan/tests/patch_tests" --gtest_filter='StageOne*' >"$results/tsan.log" 2>&1; then
+    echo "PASS stage-one-threads" >>"$results/checks.txt"
+  else
+    echo "FAIL stage-one-threads" >>"$results/checks.txt"
+    echo "FAILED: ThreadSanitizer run"; tail -40 "$results/tsan.log"
+  fi
+fi
 build windows && run_ctest windows
 
 if build fuzz; then

@@ -11,6 +11,7 @@
 #include <filesystem>
 #include <functional>
 #include <map>
+#include <mutex>
 #include <random>
 #include <vector>
 
@@ -106,6 +107,7 @@ public:
         });
     }
     void Moved(const std::string& from, const std::string& to) override {
+        std::lock_guard<std::recursive_mutex> lock(recording);
         std::string target = to;
         if (!Relative(target)) return;
         Record(from, [this, target](const std::string& source) {
@@ -181,7 +183,10 @@ private:
         return inside;
     }
 
+    // Stage one's workers write side by side: their operations are recorded one at a time, in the order they
+    // happen.
     void Record(std::string path, std::function<void(const std::string&)> operation) {
+        std::lock_guard<std::recursive_mutex> lock(recording);
         if (Relative(path)) operations.push_back([operation, path] { operation(path); });
     }
 
@@ -208,6 +213,7 @@ private:
     Names durable;
     std::map<std::string, std::vector<Names>> history;  // folder -> its entries after each unsynced change
     std::vector<std::function<void()>> operations;
+    std::recursive_mutex recording;
 };
 
 struct Arrived final : IArchiveSource {
@@ -254,7 +260,7 @@ public:
         InstallationData data;
         data.Load(game);
         InstallationRecords records(data, {"SOFTWARE\\Halvard\\Ironvale", "{guid}", true, ""});
-        PatchStages stages(batch, info, progress, {});
+        PatchStages stages(batch, info, progress, StageServices{nullptr, nullptr, nullptr, 3});  // workers side by side
         const auto prepare = [&] {
             for (const auto& entry : fs::directory_iterator(batch.location)) {
                 fs::copy_file(entry.path(), PathJoin(batch.patchFolder, entry.path().filename()),

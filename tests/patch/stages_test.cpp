@@ -47,21 +47,34 @@ TEST(StageOne, EndsEarlyWithAClearErrorAndTheInstallationUntouched) {
          "Failed to apply delta file "},
     };
     for (const auto& [cause, code, message] : cases) {  // message: how it starts
-        SCOPED_TRACE(static_cast<int>(code));
+        for (const size_t workers : {1, 3}) {
+            SCOPED_TRACE(std::to_string(static_cast<int>(code)) + " on " + std::to_string(workers) + " workers");
+            TestBatch batch(kInstalled, kTarget);
+            BatchRun run(batch);
+            run.workers = workers;
+            cause(run);
+            const Tree before = ReadTree(batch.Installation());
+            try {
+                run.Prepare();
+                ADD_FAILURE() << "no error";
+            } catch (const Exception& error) {
+                EXPECT_EQ(error.Code(), code);
+                EXPECT_EQ(error.message.substr(0, message.size()), message);
+                EXPECT_EQ(error.message.empty(), message.empty());
+            }
+            EXPECT_EQ(ReadTree(batch.Installation()), before);
+        }
+    }
+    // Prepared on one worker or on several, the files are the same, byte for byte.
+    Tree prepared[2];
+    for (const size_t workers : {1, 3}) {
         TestBatch batch(kInstalled, kTarget);
         BatchRun run(batch);
-        cause(run);
-        const Tree before = ReadTree(batch.Installation());
-        try {
-            run.Prepare();
-            ADD_FAILURE() << "no error";
-        } catch (const Exception& error) {
-            EXPECT_EQ(error.Code(), code);
-            EXPECT_EQ(error.message.substr(0, message.size()), message);
-            EXPECT_EQ(error.message.empty(), message.empty());
-        }
-        EXPECT_EQ(ReadTree(batch.Installation()), before);
+        run.workers = workers;
+        run.Prepare();
+        prepared[workers > 1] = ReadTree(batch.PatchedFiles());
     }
+    EXPECT_EQ(prepared[0], prepared[1]);
 }
 
 // Stage two ends after its last action, as a crash would. "cfg" is deleted

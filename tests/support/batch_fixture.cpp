@@ -196,7 +196,7 @@ BatchRun::BatchRun(const std::string& root)
 }
 
 PatchStages& BatchRun::Stages() {
-    if (!stages) stages.emplace(work, info, progress, StageServices{this, retryQuestion, &cancel});
+    if (!stages) stages.emplace(work, info, progress, StageServices{this, retryQuestion, &cancel, workers});
     return *stages;
 }
 

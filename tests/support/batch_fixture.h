@@ -86,6 +86,7 @@ public:
     PatchProgressFile progress;
     CancellationToken cancel;
     IRetryQuestion* retryQuestion = nullptr;
+    size_t workers = DefaultStageOneWorkers();
     ArchiveState state = ArchiveState::Arrived;
     std::function<void(const std::string& fileName)> onReport;
     std::vector<std::pair<std::string, int32_t>> reports;

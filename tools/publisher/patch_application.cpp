@@ -12,7 +12,7 @@
 #include "patch/patch_stages.h"
 #include "tools/publisher/tree_listing.h"
 
-void ApplyPatchFolder(const std::string& patchDir, const std::string& installDir) {
+void ApplyPatchFolder(const std::string& patchDir, const std::string& installDir, size_t workers) {
     PatchBatch batch;
     batch.installationFolder = installDir;
     batch.patchFolder = PathJoin(installDir, "tempPatch");
@@ -24,7 +24,9 @@ void ApplyPatchFolder(const std::string& patchDir, const std::string& installDir
     info.Load(PathJoin(patchDir, "patchinfo.xml"));
     PatchProgressFile progress;
     progress.SetDirectory(installDir);
-    PatchStages stages(batch, info, progress, StageServices{});
+    StageServices services;
+    services.workers = workers;
+    PatchStages stages(batch, info, progress, services);
 
     HttpDownloader downloader;
     const auto list = MakeDownloadList(ArchivesInFetchOrder(info), batch.location, batch.patchFolder);
