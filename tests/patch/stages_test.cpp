@@ -1,13 +1,9 @@
-// Batches run through both stages on real folders: early ends, the resume
-// of a stage two cut short or killed, and hostile items, which either stage
-// refuses before anything changes, even what the items before them would do.
+// Batches run through both stages on real folders: early ends, the resume of a stage two cut short, and hostile items,
+// which either stage refuses before anything changes, even what the items before them would do.
 #include <gtest/gtest.h>
 
-#include <chrono>
 #include <functional>
-#include <random>
 #include <stdexcept>
-#include <thread>
 #include <tuple>
 #include <vector>
 
@@ -15,7 +11,6 @@
 #include "base/file_operations.h"
 #include "base/paths.h"
 #include "tests/support/batch_fixture.h"
-#include "tests/support/child_process.h"
 #include "tools/publisher/archive_writer.h"
 #include "tools/publisher/lzma_encoder.h"
 
@@ -115,40 +110,6 @@ TEST(Resume, NoActionRunsWithoutItsRecord) {
     }
     EXPECT_EQ(trees[1], trees[0]);
     EXPECT_FALSE(trees[1] == kInstalled);
-}
-
-// Stage two in a process of its own, run whole once, then killed at seeded
-// moments (SIGKILL natively, TerminateProcess under Wine): the next start
-// finishes it to exactly the target, or it had not begun and nothing changed.
-TEST(Kill, StageTwoKilledAtSeededMomentsIsFinishedByTheNextStart) {
-    std::mt19937 random(20261206);
-    long long fullRun = 0;  // microseconds, measured on the first run, which is not killed
-    int killed = 0;
-    for (int trial = 0; trial <= 6; ++trial) {
-        TestBatch batch(kInstalled, kTarget);
-        // A longer file left by an earlier attempt must not keep its tail.
-        WriteTree(batch.PatchedFiles(), Tree().File("a.bin", SeededBytes(100000, 3)));
-        BatchRun(batch).Prepare();
-        const auto start = std::chrono::steady_clock::now();
-        ChildProcess child(TestProgramPath("stage_two_child"), {batch.Root()});
-        if (trial > 0) {
-            std::this_thread::sleep_for(std::chrono::microseconds(random() % fullRun));
-            child.Kill();
-        }
-        const int code = child.Wait();
-        if (trial == 0) {
-            ASSERT_EQ(code, 0);
-            fullRun =
-                std::chrono::duration_cast<std::chrono::microseconds>(std::chrono::steady_clock::now() - start).count();
-        }
-        killed += code == 0 ? 0 : 1;
-        BatchRun(batch).Resume();
-        const std::string version = ReadTextFile(batch.VersionFile());
-        const Tree now = ReadTree(batch.Installation());
-        EXPECT_TRUE((version == "2" && now == kTarget) || (version == "1" && now == kInstalled)) << "trial " << trial;
-        EXPECT_FALSE(PathExists(PathJoin(batch.Root(), "PPF.xml")) || PathExists(PathJoin(batch.Root(), "_PPF.xml")));
-    }
-    EXPECT_GT(killed, 0);
 }
 
 // One name of every kind the check refuses.
