@@ -75,8 +75,10 @@ protected:
         return data.currentVersion;
     }
 
-    // The patch from tree from to tree to, the complete build of to, version.txt; signed with key when given.
-    std::string Publish(const Tree& from, const Tree& to, const std::string& version, const P256PrivateKey* key) {
+    // The patch from tree from (version fromVersion) to tree to, the complete build of to, version.txt; signed with
+    // key when given.
+    std::string Publish(const Tree& from, const Tree& to, const std::string& version, const P256PrivateKey* key,
+                        const std::string& fromVersion = "1") {
         WriteTree(temp / "old", from);
         WriteTree(temp / "new", to);
         BuildOptions options;
@@ -86,8 +88,10 @@ protected:
         options.outDir = temp / "server";
         options.maxArchiveSize = 4000;
         options.signingKey = key;
+        options.fromVersion = fromVersion;
         const std::string patch = BuildPatch(options);
         options.fromDir.clear();
+        options.fromVersion.clear();
         BuildPatch(options);
         WriteTextFile(temp / "server/version.txt", "  " + version + " and more words\n");
         DeleteDirectory(temp / "old", true);
