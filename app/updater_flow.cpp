@@ -25,6 +25,7 @@ void Updater::RunUpdate() {
         const UpdateFacts facts = ReadFacts();
         const UpdateLayout layout = MakeUpdateLayout(configuration, installDir);
         const UpdatePlan plan = PlanUpdate(facts, layout);
+        RefuseOlderLatest(facts);
         if (plan.road != Road::Resume) {
             // Work folders of a run that ended before its stage two began,
             // or after it was done, hold nothing to resume; nor do the
