@@ -11,7 +11,7 @@ struct FailureRow {
     LogLevel level;
     FailureNotice notice;
     const char* textKey;
-    const char* secondKey;  // the next paragraph, when there is one; a question asks it for the connection advice
+    const char* secondKey;  // the next paragraph, if any (in a question, it replaces the connection advice)
     bool atEntryPoint;      // the entry point tells it in these words too
 };
 

@@ -30,11 +30,11 @@ public:
 
     // Parses the file and reads the hive, registry path and space
     // requirement, and the elements older readers skip: the versions the
-    // patch starts from and leads to and the archives' sizes and SHA-256. Throws "Failed to
-    // load patch info file." when it cannot be read, "Hive not recognized"
-    // for an unknown hive name, and CorruptData for an archive list that
-    // is not well formed. The cursors are left at their ends until
-    // ResetIterators.
+    // patch starts from and leads to and the archives' sizes and SHA-256.
+    // Throws "Failed to load patch info file." when it cannot be read,
+    // "Hive not recognized" for an unknown hive name, and CorruptData for an
+    // archive list that is not well formed. The cursors are left at their
+    // ends until ResetIterators.
     void Load(const std::string& path);
     // Load from the text of a description (the very bytes that were
     // checked), with the same outcomes.

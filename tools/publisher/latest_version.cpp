@@ -48,6 +48,11 @@ void PublishLatestVersion(const std::string& site, const std::string& version, i
         ParseVersionStatement(present, previous, signedText, signature)) {
         statement.serial = std::max(statement.serial, previous.serial + 1);
     }
+    // Updaters refuse a serial more than a day ahead of their clock.
+    if (statement.serial > now + 24 * 60 * 60) {
+        throw Exception(statementPath + " has serial " + std::to_string(previous.serial) +
+                        ", more than a day ahead of this machine's clock: check the clock, or remove the statement.");
+    }
     // The statement first: a keyed updater that reads the two files between
     // the writes cannot confirm the version and asks its player to try later.
     if (!ReplaceFileAtomically(statementPath, SignVersionStatement(statement, key))) {
