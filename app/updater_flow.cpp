@@ -23,9 +23,9 @@ void Updater::RunUpdate() {
     didWork = false;
     for (;;) {
         const UpdateFacts facts = ReadFacts();
+        RefuseOlderLatest(facts);
         const UpdateLayout layout = MakeUpdateLayout(configuration, installDir);
         const UpdatePlan plan = PlanUpdate(facts, layout);
-        RefuseOlderLatest(facts);
         if (plan.road != Road::Resume) {
             // Work folders of a run that ended before its stage two began,
             // or after it was done, hold nothing to resume; nor do the
