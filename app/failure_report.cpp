@@ -11,7 +11,7 @@ struct FailureRow {
     LogLevel level;
     FailureNotice notice;
     const char* textKey;
-    const char* secondKey;  // the next paragraph, when there is one
+    const char* secondKey;  // the next paragraph, if any (in a question, it replaces the connection advice)
     bool atEntryPoint;      // the entry point tells it in these words too
 };
 
@@ -21,6 +21,8 @@ const FailureRow kFailures[] = {
      "INSTALLER_ERROR_NO_PATCH_FOUND", nullptr, false},
     {ErrorCode::FileNotFound, "File not found.", LogLevel::Error, FailureNotice::PlayOldQuestion,
      "INSTALLER_ERROR_FILE_NOT_FOUND", nullptr, false},
+    {ErrorCode::VersionUnconfirmed, "Latest version unconfirmed.", LogLevel::Error, FailureNotice::PlayOldQuestion,
+     "INSTALLER_ERROR_LATEST_VERSION_UNCONFIRMED", "INSTALLER_ERROR_TRY_LATER", false},
     {ErrorCode::CorruptData, "Corrupt data.", LogLevel::Error, FailureNotice::ErrorBox, "INSTALLER_ERROR_CORRUPT_DATA",
      "INSTALLER_ERROR_REINSTALL", true},
     {ErrorCode::CorruptInstallation, "Corrupt installation.", LogLevel::Error, FailureNotice::ErrorBox,
@@ -43,8 +45,8 @@ FailureReport DescribeFailure(const Exception& error, FailureSite site) {
         if (row.textKey != nullptr) report.text = Localize(row.textKey);
         if (row.secondKey != nullptr) report.text += L"\n\n" + Localize(row.secondKey);
         if (row.notice == FailureNotice::PlayOldQuestion) {
-            report.text += L"\n\n" + Localize("INSTALLER_ERROR_CONNECTION") + L"\n\n" +
-                           Localize("INSTALLER_ERROR_PLAY_OLD_VERSION");
+            if (row.secondKey == nullptr) report.text += L"\n\n" + Localize("INSTALLER_ERROR_CONNECTION");
+            report.text += L"\n\n" + Localize("INSTALLER_ERROR_PLAY_OLD_VERSION");
         }
         return report;
     }

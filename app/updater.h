@@ -75,9 +75,19 @@ private:
 
     // The version and the descriptions (updater_version_check.cpp).
     std::string CheckLatestVersion();
+    // Throws VersionUnconfirmed unless the publisher's statement beside
+    // "version.txt" confirms latest; keeps its serial in the game's key.
+    void ConfirmLatestVersion(const std::string& latest);
+    // Logs, in a program with a key, a latest version older than the
+    // installed one: refused.
+    void RefuseOlderLatest(const UpdateFacts& facts) const;
+    // Fetches a patch's description as FetchCheckedDescription does; a
+    // program with a key also refuses one that does not start from the
+    // installed version (DeltaFailed: the complete build is offered).
+    void FetchDescription(const PatchBatch& batch, CheckedDescription& fetched, PatchInfoFile& description);
     // Fetches the batch's description (and its signature in a program with
     // a key), checks it and parses it into description.
-    void FetchDescription(const PatchBatch& batch, CheckedDescription& fetched, PatchInfoFile& description);
+    void FetchCheckedDescription(const PatchBatch& batch, CheckedDescription& fetched, PatchInfoFile& description);
     // The same for a complete build; a missing one is BuildNotFound.
     void FetchBuildDescription(const PatchBatch& build, CheckedDescription& fetched, PatchInfoFile& description);
     // The bytes at url, at most limit of them, through the run's downloader
@@ -123,7 +133,8 @@ private:
     std::string displayName;
     std::string webSiteHostName;
     UpdaterArguments arguments;
-    // PEM; empty when descriptions need no signature.
+    // The publisher's public keys (PEM, one or more); empty when nothing
+    // needs a signature.
     const std::string publisherKey;
     // Asks the player to close files in the way of a move.
     RetryBox retryBox;

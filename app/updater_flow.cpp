@@ -23,6 +23,7 @@ void Updater::RunUpdate() {
     didWork = false;
     for (;;) {
         const UpdateFacts facts = ReadFacts();
+        RefuseOlderLatest(facts);
         const UpdateLayout layout = MakeUpdateLayout(configuration, installDir);
         const UpdatePlan plan = PlanUpdate(facts, layout);
         // Work folders of a run that ended before its stage two began, or

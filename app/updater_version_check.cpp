@@ -1,6 +1,7 @@
-// Which version is the latest, and fetching the description of the patch
-// or build that leads to it: read once, checked, and parsed from the very
-// bytes that were checked.
+// Which version is the latest (confirmed by the publisher's signed
+// statement in a program with a key), and fetching the description of the
+// patch or build that leads to it: read once, checked, and parsed from the
+// very bytes that were checked.
 #include <algorithm>
 #include <chrono>
 #include <thread>
@@ -10,10 +11,13 @@
 #include "base/exception.h"
 #include "base/file_operations.h"
 #include "base/file_stream.h"
+#include "base/log.h"
 #include "base/paths.h"
 #include "base/version_order.h"
 #include "net/location.h"
+#include "net/sign_url.h"
 #include "net/signature_check.h"
+#include "net/version_statement.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_stages.h"
 #include "text/localization.h"
@@ -23,6 +27,10 @@ namespace {
 // Its first word is all that counts: a hostile file cannot make us read
 // more.
 constexpr int64_t kLatestVersionFileLimit = 1024;
+
+// The highest serial of a statement this installation has accepted, kept
+// in the game's key: a statement older than one already seen is a replay.
+const char kStatementSerialValue[] = "Latest Version Serial";
 
 }  // namespace
 
@@ -58,10 +66,59 @@ std::string Updater::CheckLatestVersion() {
     if (!read) throw Exception("Failed to open latest version file.", ErrorCode::FileNotFound);
     const std::string latest = FirstWord(text);
     if (latest.empty()) throw Exception("Failed to read latest version file.", ErrorCode::FileNotFound);
+    if (!publisherKey.empty()) ConfirmLatestVersion(latest);
     return latest;
 }
 
+// "version.txt" stays unsigned for every reader that knows nothing else;
+// the statement beside it says the same with the publisher's signature, a
+// serial and an end.
+void Updater::ConfirmLatestVersion(const std::string& latest) {
+    std::string statement;
+    if (!FetchBytes(configuration.GetLatestVersionUrl() + ".sig", kMaximumStatementFileSize, false, statement)) {
+        LOG_AS("Updater", Error) << "The statement of the latest version could not be downloaded.";
+        throw Exception("The statement of the latest version could not be downloaded.", ErrorCode::VersionUnconfirmed);
+    }
+    int64_t highest = 0;
+    std::string stored;
+    if (registry.ReadString(kStatementSerialValue, stored) && !ParseStatementNumber(stored, highest)) {
+        LOG_AS("Updater", Error) << "The accepted serial \"" << stored << "\" cannot be read; taken as 0.";
+    }
+    const VersionStatement confirmed = CheckVersionStatement(statement, publisherKey, latest, ServerTimeNow(), highest);
+    if (confirmed.serial <= highest) return;
+    try {
+        registry.WriteString(kStatementSerialValue, std::to_string(confirmed.serial));
+    } catch (const Exception& error) {
+        // Without the rights to the game's key (a run not yet elevated) the
+        // serial is kept by the next run that has them.
+        LOG_AS("Updater", Error) << error.message;
+    }
+}
+
+void Updater::RefuseOlderLatest(const UpdateFacts& facts) const {
+    // The plan never patches back; a keyed program says so. An installation
+    // in change ("-1") has no version to compare with.
+    if (publisherKey.empty() || facts.installedVersion == "-1" ||
+        !IsOlderVersion(facts.latestVersion, facts.installedVersion)) {
+        return;
+    }
+    LOG_AS("Updater", Error) << "Version " << facts.latestVersion << " is older than the installed "
+                             << facts.installedVersion << ": refused, the installation stays as it is.";
+}
+
 void Updater::FetchDescription(const PatchBatch& batch, CheckedDescription& fetched, PatchInfoFile& description) {
+    FetchCheckedDescription(batch, fetched, description);
+    // Signed pieces of two releases mixed: a patch made for another
+    // installed version. The complete build fits any installation.
+    if (!publisherKey.empty() && description.GetFromVersion() != installationData.currentVersion) {
+        throw Exception("The patch starts from version \"" + description.GetFromVersion() +
+                            "\", not from the installed " + installationData.currentVersion + ".",
+                        ErrorCode::DeltaFailed);
+    }
+}
+
+void Updater::FetchCheckedDescription(const PatchBatch& batch, CheckedDescription& fetched,
+                                      PatchInfoFile& description) {
     const std::string name = configuration.GetPatchInfoFilename();
     if (!FetchBytes(JoinLocation(batch.location, name), kMaximumSignedFileSize, true, fetched.text)) {
         throw Exception("Failed to download patch info file.", ErrorCode::PatchNotFound);
@@ -77,7 +134,7 @@ void Updater::FetchDescription(const PatchBatch& batch, CheckedDescription& fetc
 
 void Updater::FetchBuildDescription(const PatchBatch& build, CheckedDescription& fetched, PatchInfoFile& description) {
     try {
-        FetchDescription(build, fetched, description);
+        FetchCheckedDescription(build, fetched, description);
     } catch (const Exception& error) {
         if (error.Code() == ErrorCode::PatchNotFound)
             throw Exception("Could not find build.", ErrorCode::BuildNotFound);

@@ -20,6 +20,7 @@ enum class ErrorCode : int32_t {
     CorruptInstallation = 13,
     SteamIncompatible = 14,
     PreparedFilesMissing = 15,  // stage one must run again before stage two may
+    VersionUnconfirmed = 16,    // no valid signed statement names the latest version
 };
 
 // The program's one error type, thrown by value and caught by reference.

@@ -32,28 +32,30 @@ if(WIN32)
   set(CMAKE_RC_FLAGS "${CMAKE_RC_FLAGS} -I${CMAKE_CURRENT_BINARY_DIR}/resources -I${PROJECT_SOURCE_DIR}/resources")
 endif()
 
-# ironvale_resource_library(NAME [PUBLIC_KEY_PEM]): the resources as an
-# object library. Every resource the program reads by name on both
-# platforms is listed here as name, type, file; the pictures, the font and
-# the dialog serve only the window of the Windows program and go into its
-# .rc alone. With a key file, the publisher's public key goes in as
-# IDR_PUBLIC_KEY, and the program then requires signed descriptions.
+# ironvale_resource_library(NAME [PUBLIC_KEYS]): the resources as an object
+# library. Every resource the program reads by name on both platforms is
+# listed here as name, type, file; the pictures, the font and the dialog
+# serve only the window of the Windows program and go into its .rc alone.
+# With key files (a list: a signature by any of them counts, so a publisher
+# can replace a key), the publisher's public keys go in, one after the
+# other, as IDR_PUBLIC_KEY, and the program then requires signatures.
 function(ironvale_resource_library name)
-  set(key "${ARGV1}")
+  set(keys "${ARGV1}")
   set(named IDS_STRINGS CSV "${IRONVALE_STRING_TABLE}")
-  if(key)
-    list(APPEND named IDR_PUBLIC_KEY PEM "${key}")
+  # windres loses the quotes of a file name passed in a definition, so the
+  # keys are joined into a fixed name in a folder of this library.
+  set(key_dir "${CMAKE_CURRENT_BINARY_DIR}/${name}")
+  if(keys)
+    add_custom_command(
+      OUTPUT "${key_dir}/public_key.pem"
+      COMMAND ${CMAKE_COMMAND} -P "${PROJECT_SOURCE_DIR}/cmake/join_keys.cmake" "${key_dir}/public_key.pem" ${keys}
+      DEPENDS ${keys} "${PROJECT_SOURCE_DIR}/cmake/join_keys.cmake"
+      COMMENT "Joining the publisher keys for ${name}")
+    list(APPEND named IDR_PUBLIC_KEY PEM "${key_dir}/public_key.pem")
   endif()
   if(WIN32)
     add_library(${name} OBJECT "${IRONVALE_RC_FILE}")
-    if(key)
-      # windres loses the quotes of a file name passed in a definition, so
-      # the key is copied to a fixed name in a folder of this library.
-      set(key_dir "${CMAKE_CURRENT_BINARY_DIR}/${name}")
-      add_custom_command(
-        OUTPUT "${key_dir}/public_key.pem"
-        COMMAND ${CMAKE_COMMAND} -E copy "${key}" "${key_dir}/public_key.pem"
-        DEPENDS "${key}")
+    if(keys)
       set_property(SOURCE "${IRONVALE_RC_FILE}" APPEND PROPERTY OBJECT_DEPENDS "${key_dir}/public_key.pem")
       target_compile_definitions(${name} PRIVATE IRONVALE_PUBLIC_KEY)
       target_include_directories(${name} BEFORE PRIVATE "${key_dir}")
@@ -83,13 +85,15 @@ endfunction()
 # so the tests' own servers need not sign.
 ironvale_resource_library(ironvale_resources)
 if(IRONVALE_PUBLIC_KEY)
-  if(NOT EXISTS "${IRONVALE_PUBLIC_KEY}")
-    message(FATAL_ERROR "IRONVALE_PUBLIC_KEY: no file ${IRONVALE_PUBLIC_KEY} (make one with ironvale-patch keygen)")
-  endif()
-  file(READ "${IRONVALE_PUBLIC_KEY}" public_key_text)
-  if(NOT public_key_text MATCHES "-----BEGIN PUBLIC KEY-----")
-    message(FATAL_ERROR "IRONVALE_PUBLIC_KEY: ${IRONVALE_PUBLIC_KEY} holds no PEM public key")
-  endif()
+  foreach(key IN LISTS IRONVALE_PUBLIC_KEY)
+    if(NOT EXISTS "${key}")
+      message(FATAL_ERROR "IRONVALE_PUBLIC_KEY: no file ${key} (make one with ironvale-patch keygen)")
+    endif()
+    file(READ "${key}" public_key_text)
+    if(NOT public_key_text MATCHES "-----BEGIN PUBLIC KEY-----")
+      message(FATAL_ERROR "IRONVALE_PUBLIC_KEY: ${key} holds no PEM public key")
+    endif()
+  endforeach()
   ironvale_resource_library(ironvale_product_resources "${IRONVALE_PUBLIC_KEY}")
 else()
   add_library(ironvale_product_resources ALIAS ironvale_resources)

@@ -19,8 +19,10 @@ void SetServerClockOffset(int64_t seconds) { serverClockOffset = seconds; }
 
 int64_t GetServerClockOffset() { return serverClockOffset; }
 
+int64_t ServerTimeNow() { return static_cast<int64_t>(std::time(nullptr)) + serverClockOffset; }
+
 std::string SignUrl(const std::string& url) {
-    const int64_t expiry = static_cast<int64_t>(std::time(nullptr)) + serverClockOffset + 3600;
+    const int64_t expiry = ServerTimeNow() + 3600;
     const char* separator = url.find('?') == std::string::npos ? "?" : "&";
     const std::string signedUrl = url + separator + "e=" + std::to_string(expiry);
     return signedUrl + "&h=" + Md5Hex(kSharedSecret + signedUrl);

@@ -22,6 +22,8 @@ int Base64Value(char c) {
     return found == nullptr ? -1 : static_cast<int>(found - kBase64Digits);
 }
 
+}  // namespace
+
 bool DecodeBase64(const std::string& text, std::string& bytes) {
     std::string digits;
     for (const char c : text) {
@@ -71,6 +73,8 @@ std::string EncodeBase64(const std::string& bytes) {
     }
     return text;
 }
+
+namespace {
 
 // One DER INTEGER at der[at]: a positive number of at most 32 bytes in its
 // shortest form, copied right-aligned into value.
@@ -127,6 +131,20 @@ std::string EncodePem(const std::string& label, const std::string& der) {
     std::string text = "-----BEGIN " + label + "-----\n";
     for (size_t i = 0; i < digits.size(); i += 64) text += digits.substr(i, 64) + "\n";
     return text + "-----END " + label + "-----\n";
+}
+
+bool ParsePublicKeysPem(const std::string& text, std::vector<P256PublicKey>& keys) {
+    keys.clear();
+    if (text.size() > kMaximumPemSize) return false;
+    const std::string end = "-----END PUBLIC KEY-----";
+    for (size_t at = 0; text.find("-----BEGIN PUBLIC KEY-----", at) != std::string::npos;) {
+        const size_t stop = text.find(end, at);
+        P256PublicKey key{};
+        if (stop == std::string::npos || !ParsePublicKeyPem(text.substr(at, stop + end.size() - at), key)) return false;
+        keys.push_back(key);
+        at = stop + end.size();
+    }
+    return !keys.empty();
 }
 
 bool ParsePublicKeyPem(const std::string& text, P256PublicKey& key) {

@@ -3,6 +3,7 @@
 #include <array>
 #include <cstdint>
 #include <string>
+#include <vector>
 
 // The publisher's ECDSA P-256 keys and signatures in the forms OpenSSL and
 // other tools exchange them: PEM text around DER bytes. Only this one curve
@@ -25,10 +26,19 @@ constexpr size_t kMaximumPemSize = 16 * 1024;
 bool DecodePem(const std::string& text, const std::string& label, std::string& der);
 // Base64 in lines of 64 between the two frame lines, each line ended by LF.
 std::string EncodePem(const std::string& label, const std::string& der);
+// Base64 with padding; decoding allows blanks and line breaks between the
+// digits and refuses bits beyond the last byte, so each text has one
+// decoding.
+std::string EncodeBase64(const std::string& bytes);
+bool DecodeBase64(const std::string& text, std::string& bytes);
 
 // A SubjectPublicKeyInfo of an EC key on P-256 with an uncompressed point,
 // in PEM ("PUBLIC KEY"), as `openssl pkey -pubout` writes it.
 bool ParsePublicKeyPem(const std::string& text, P256PublicKey& key);
+// Every "PUBLIC KEY" block of text in turn (a program may trust several
+// keys while one replaces another); false when there is none or one of
+// them is not such a key.
+bool ParsePublicKeysPem(const std::string& text, std::vector<P256PublicKey>& keys);
 std::string PublicKeyDer(const P256PublicKey& key);
 std::string PublicKeyPem(const P256PublicKey& key);
 

@@ -79,6 +79,7 @@ void PatchInfoFile::Parse(std::string text) {
     registryPath.clear();
     spaceRequirement = -1;
     version.clear();
+    fromVersion.clear();
     declaredArchives.clear();
 
     if (!ParseXml(std::move(text), document)) throw Exception("Failed to load patch info file.");
@@ -92,6 +93,7 @@ void PatchInfoFile::Parse(std::string text) {
         if (number >> value) spaceRequirement = value;
     }
     if (ReadElementText(root, "Version", text)) version = text;
+    if (ReadElementText(root, "FromVersion", text)) fromVersion = text;
     ReadDeclaredArchives();
 }
 

@@ -29,12 +29,12 @@ public:
     virtual ~PatchInfoFile() = default;
 
     // Parses the file and reads the hive, registry path and space
-    // requirement, and the elements older readers skip: the version the
-    // patch leads to and the archives' sizes and SHA-256. Throws "Failed to
-    // load patch info file." when it cannot be read, "Hive not recognized"
-    // for an unknown hive name, and CorruptData for an archive list that
-    // is not well formed. The cursors are left at their ends until
-    // ResetIterators.
+    // requirement, and the elements older readers skip: the versions the
+    // patch starts from and leads to and the archives' sizes and SHA-256.
+    // Throws "Failed to load patch info file." when it cannot be read,
+    // "Hive not recognized" for an unknown hive name, and CorruptData for an
+    // archive list that is not well formed. The cursors are left at their
+    // ends until ResetIterators.
     void Load(const std::string& path);
     // Load from the text of a description (the very bytes that were
     // checked), with the same outcomes.
@@ -62,6 +62,9 @@ public:
     int64_t GetSpaceRequirement() const { return spaceRequirement; }
     // The version the patch leads to; empty when the description does not say.
     const std::string& GetVersion() const { return version; }
+    // The installed version the patch was made for; empty when the
+    // description does not say (as a complete build never does).
+    const std::string& GetFromVersion() const { return fromVersion; }
     // The declared archives by file name; empty without an "Archives" list.
     const std::map<std::string, DeclaredArchive>& GetDeclaredArchives() const { return declaredArchives; }
 
@@ -102,5 +105,6 @@ private:
     std::string registryPath;
     int64_t spaceRequirement = -1;
     std::string version;
+    std::string fromVersion;
     std::map<std::string, DeclaredArchive> declaredArchives;
 };

@@ -39,8 +39,8 @@ rm -r "$demo/v2/data/old_voices" "$demo/v2/docs/changes_1.txt"
 
 # A throw-away signing key, made on the first demo and kept beside the
 # builds (never in the repository). The program run below is built with its
-# public half, in a build folder of its own, and takes only descriptions
-# signed with it.
+# public half, in a build folder of its own, and takes only a latest version
+# and descriptions signed with it.
 keys=$root/build/demo-keys
 [ -f "$keys/private.pem" ] || "$tool" keygen --out "$keys" >/dev/null
 under_wine=
@@ -52,10 +52,10 @@ cmake -S "$root" -B "$keyed" -G Ninja -DCMAKE_BUILD_TYPE=Release -DIRONVALE_TEST
   ${under_wine:+-DCMAKE_TOOLCHAIN_FILE="$root/cmake/mingw-w64.cmake"} -DIRONVALE_PUBLIC_KEY="$keys/public.pem" >/dev/null
 cmake --build "$keyed" --target IronvaleUpdater -j2 >/dev/null
 
-echo "== ironvale-patch version, build (patch), build --complete, both signed with $keys/private.pem"
-"$tool" version --out "$demo/server" 2
-"$tool" build --from "$demo/v1" --to "$demo/v2" --version 2 --out "$demo/server" --max-archive-size 100000 \
-  --sign-key "$keys/private.pem"
+echo "== ironvale-patch publish-version, build (patch), build --complete, all signed with $keys/private.pem"
+"$tool" publish-version --key "$keys/private.pem" --version 2 --expires-in 7 "$demo/server" >/dev/null
+"$tool" build --from "$demo/v1" --from-version 1 --to "$demo/v2" --version 2 --out "$demo/server" \
+  --max-archive-size 100000 --sign-key "$keys/private.pem"
 "$tool" build --complete --to "$demo/v2" --version 2 --out "$demo/server" --sign-key "$keys/private.pem"
 echo "== $demo/server"
 (cd "$demo/server" && find . -type f | sort | xargs ls -l | awk '{print $5, $9}')

@@ -8,6 +8,7 @@
 
 #include <algorithm>
 #include <chrono>
+#include <ctime>
 #include <functional>
 #include <random>
 #include <regex>
@@ -20,6 +21,7 @@
 #include "tests/support/batch_fixture.h"
 #include "tests/support/child_process.h"
 #include "tests/support/http_test_server.h"
+#include "tools/publisher/latest_version.h"
 #include "tools/publisher/patch_builder.h"
 #include "tools/publisher/signing_key.h"
 
@@ -76,8 +78,10 @@ protected:
         return data.currentVersion;
     }
 
-    // The patch from tree from to tree to, the complete build of to, version.txt; signed with key when given.
-    std::string Publish(const Tree& from, const Tree& to, const std::string& version, const P256PrivateKey* key) {
+    // The patch from tree from (version fromVersion) to tree to, the complete build of to, version.txt; signed with
+    // key when given.
+    std::string Publish(const Tree& from, const Tree& to, const std::string& version, const P256PrivateKey* key,
+                        const std::string& fromVersion = "1") {
         WriteTree(temp / "old", from);
         WriteTree(temp / "new", to);
         BuildOptions options;
@@ -87,8 +91,10 @@ protected:
         options.outDir = temp / "server";
         options.maxArchiveSize = 4000;
         options.signingKey = key;
+        options.fromVersion = fromVersion;
         const std::string patch = BuildPatch(options);
         options.fromDir.clear();
+        options.fromVersion.clear();
         BuildPatch(options);
         WriteTextFile(temp / "server/version.txt", "  " + version + " and more words\n");
         DeleteDirectory(temp / "old", true);
@@ -450,6 +456,70 @@ TEST_F(UpdateRun, StartsAndKeepsASecondCopyOut) {
     }
     Start("", {}, updater).Wait();
     EXPECT_EQ(ReadTextFile(temp / "victim.txt"), "another user's");
+}
+
+// The keyed program takes the latest version only as the publisher's signed, unexpired statement beside version.txt
+// names it, by either of its keys, with a serial not below the one it accepted before; it never goes back, and takes
+// a signed patch only for the version it starts from. The plain program and a server without statements go on as
+// before.
+TEST_F(UpdateRun, TakesOnlyAConfirmedLatestVersionAndNeverGoesBack) {
+    const P256PrivateKey first = LoadSigningKey(IRONVALE_BINARY_DIR "/test-key/private.pem");
+    const P256PrivateKey second = LoadSigningKey(IRONVALE_BINARY_DIR "/test-key-2/private.pem");
+    const P256PrivateKey unknown = GenerateSigningKey();
+    const RegistryManager game(RegistryHive::LocalMachine, "SOFTWARE\\Halvard\\Ironvale");
+    // Every run is told that the server's clock is two hours ahead of ours.
+    const int64_t inOneHour = std::time(nullptr) + 3600, inThree = inOneHour + 7200;
+    const auto installed3 = [&] { SetVersion("3"); };
+    const auto startsAt7 = [&] { Publish(Version(1), Version(2), "2", &first, "7"); };
+    const std::string unconfirmed = "The latest version of the game could not be confirmed.";
+    const struct {
+        const char* what;
+        VersionStatement statement;  // beside version.txt "2" (none without a version), signed as the patch by key
+        const P256PrivateKey* key;
+        std::function<void()> prepare;  // after version 1 installed and the patch to 2 published
+        std::string answers, shown;     // shown: in the output or the run's log
+        std::string version, serial;    // after the run; the serial accepted before is 100
+        bool started;
+        const char* program = "keyed_updater";
+    } cases[] = {
+        {"valid", {"2", 200, inThree}, &first, nullptr, "y\nn\n", "", "2", "200", false},
+        {"by the second key, the same serial", {"2", 100, inThree}, &second, nullptr, "y\nn\n", "", "2", "100", false},
+        {"expired by the server's clock", {"2", 200, inOneHour}, &first, nullptr, "y\n", unconfirmed, "1", "100", true},
+        {"an older serial", {"2", 99, inThree}, &first, nullptr, "y\n", unconfirmed, "1", "100", true},
+        {"a future serial", {"2", inThree + 86400, inThree}, &first, nullptr, "y\n", unconfirmed, "1", "100", true},
+        {"unlike version.txt", {"3", 200, inThree}, &first, nullptr, "n\n", unconfirmed, "1", "100", false},
+        {"by an unknown key", {"2", 200, inThree}, &unknown, nullptr, "y\n", unconfirmed, "1", "100", true},
+        {"no statement", {}, &first, nullptr, "y\n", unconfirmed, "1", "100", true},
+        {"older than installed", {"2", 200, inThree}, &first, installed3, "", "installed 3: refused", "3", "200", true},
+        {"a patch made for 7", {"2", 200, inThree}, &first, startsAt7, "y\nn\n", "complete game", "1", "200", false},
+        {"plain, no statement", {}, nullptr, nullptr, "y\nn\n", "", "2", "100", false, "served_updater"},
+    };
+    const std::string log = temp / "tmp/IronvaleUpdater.log";
+    WriteTextFile(log, "");
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        DeleteDirectory(temp / "server", true);
+        Publish(Version(1), Version(2), "2", c.key);
+        Install(Version(1), "1");
+        game.WriteString("Latest Version Serial", "100");
+        if (!c.statement.version.empty()) {
+            WriteTextFile(temp / "server/version.txt.sig", SignVersionStatement(c.statement, *c.key));
+        }
+        if (c.prepare) c.prepare();
+        const Tree before = Game();
+        RemoveFile(temp / "tmp/started.txt");
+        const size_t logged = ReadTextFile(log).size();
+        std::string output = Run(c.answers, {"-serverDeltaTime", "7200"}, c.program);
+        output += ReadTextFile(log).substr(logged);
+        EXPECT_NE(output.find(c.shown), std::string::npos) << output;
+        EXPECT_EQ(InstalledVersion(), c.version);
+        EXPECT_EQ(Game(), c.version == "2" ? published : before);
+        std::string serial;
+        EXPECT_TRUE(game.ReadString("Latest Version Serial", serial));
+        EXPECT_EQ(serial, c.serial);
+        EXPECT_EQ(GameStarted(), c.started);
+        ExpectNoLeftovers();
+    }
 }
 
 }  // namespace

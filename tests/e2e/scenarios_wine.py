@@ -88,7 +88,7 @@ class Session:
         os.close(read)
         self.nginx, self.port = self.start_nginx()
         # Without a window manager Wine waits for one after every closed box.
-        for program in ("IronvaleUpdater.exe", "served_updater.exe", "window_driver.exe"):
+        for program in ("IronvaleUpdater.exe", "served_updater.exe", "keyed_updater.exe", "window_driver.exe"):
             self.wine("reg", "add", f"HKCU\\Software\\Wine\\AppDefaults\\{program}\\X11 Driver", "/v", "Managed",
                       "/d", "N", "/f")
         rows = (line.split("\t") for line in (ROOT / "resources/strings.tsv").read_text("utf-8").splitlines())
@@ -161,16 +161,21 @@ class Session:
     def windows_path(self, path):
         return "Z:" + str(path).replace("/", "\\")
 
-    def publish(self, old, new, version, out):
-        # The patch from tree old to new, the complete build of new, version.txt.
+    def publish(self, old, new, version, out, key=None, start="1"):
+        # The patch from tree old (version start) to new, the complete build of new, version.txt; with key, all signed
+        # and the statement of the latest version beside.
         trees = self.work / "trees"
-        (out / "version.txt").unlink(missing_ok=True)  # each scenario's site starts afresh, at any version
+        for stale in ("version.txt", "version.txt.sig"):  # each scenario's site starts afresh, at any version
+            (out / stale).unlink(missing_ok=True)
         write_tree(trees / "old", old)
         write_tree(trees / "new", new)
-        for how in (["--from", trees / "old", "--max-archive-size", "3000"], ["--complete"]):
-            subprocess.run([self.tool, "build", *how, "--to", trees / "new", "--version", version, "--out", out],
-                           check=True, **QUIET)
-        subprocess.run([self.tool, "version", "--out", out, version], check=True, **QUIET)
+        signed = ["--sign-key", key] if key else []
+        for how in (["--from", trees / "old", "--from-version", start, "--max-archive-size", "3000"], ["--complete"]):
+            subprocess.run([self.tool, "build", *how, *signed, "--to", trees / "new", "--version", version, "--out",
+                            out], check=True, **QUIET)
+        latest = ["publish-version", "--key", key, "--version", version, "--expires-in", "1", out] if key else \
+            ["version", "--out", out, version]
+        subprocess.run([self.tool, *latest], check=True, **QUIET)
         return out / f"patch_515195_{version}"
 
     def run_log(self):
@@ -449,6 +454,39 @@ def scenario_hostile(s, run):
         (run.install / "linked").unlink()
 
 
+def scenario_trust(s, run):
+    # The updater trusting the two test keys (one replacing the other) on sites that ironvale-patch signed with a row's
+    # key; the plain program on an unsigned site is "patch over HTTP". What the run's log must say, and the boxes.
+    keys = [s.build / "test-key/private.pem", s.build / "test-key-2/private.pem", s.work / "unknown/private.pem"]
+    subprocess.run([s.tool, "keygen", "--out", keys[2].parent], check=True, **QUIET)
+    patch = [("INSTALLER_PATCH_CONFIRM_UPADATE", YES), ("INSTALLER_SUCCESS_PATCH", NO)]
+    play = [("INSTALLER_ERROR_LATEST_VERSION_UNCONFIRMED", YES)]
+    ahead = str(int(time.time()) + 3600)  # the serial accepted before, beyond the one publish-version takes
+    rows = [  # logged, key, start of the patch, arguments, serial accepted before, change, boxes, version after
+        ("publisher key 1 of 2", 0, "1", [], "0", None, patch, "2"),
+        ("publisher key 2 of 2", 1, "1", [], "0", None, patch, "2"),
+        ("expired at", 0, "1", ["-serverDeltaTime", "172800"], "0", None, play, "1"),
+        ("accepted before", 0, "1", [], ahead, None, play, "1"),
+        ("version.txt names 3", 0, "1", [], "0", lambda: (s.work / "server/version.txt").write_text("3\n"), play, "1"),
+        ("does not match it and any publisher key", 2, "1", [], "0", None, play, "1"),
+        ("older than the installed 3: refused", 0, "1", [], "0", lambda: run.install_version(version_tree(1), "3"),
+         [], "3"),
+        ('starts from version "7"', 0, "7", [], "0", None, [("", YES), ("INSTALLER_REPAIR_FILES_CHANGED", NO),
+                                                            ("INSTALLER_ERROR_CORRUPT_DATA", OK)], "1"),
+    ]
+    for logged, key, start, args, serial, change, boxes, version in rows:
+        run.install_version(version_tree(1), "1")
+        s.wine("reg", "add", "HKLM\\Software\\Halvard\\Ironvale", "/v", "Latest Version Serial", "/d", serial,
+               "/reg:32", "/f")
+        s.publish(version_tree(1), version_tree(2), "2", s.work / "server", keys[key], start)
+        if change:
+            change()
+        game = "+webSiteHostName" if boxes in (play, []) else None
+        run.play(args, boxes, version_tree(2 if version == "2" else 1), version, game,
+                 program=s.programs / "keyed_updater.exe")
+        check(logged in s.run_log(), f"'{logged}' not in the log")
+
+
 def scenario_up_to_date(s, run):
     run.install_version(version_tree(2), "2")
     run.play(["-latestVersion", "2", "-hostname", "play.example.com"], [], version_tree(2), "2",
@@ -662,6 +700,7 @@ SCENARIOS = [
     ("missing patch", scenario_missing_patch),  # the play-old question; Yes starts the game
     ("locked file", scenario_locked_file),  # the retry question: Retry, then Cancel
     ("hostile", scenario_hostile),  # refused patches leave everything as it was
+    ("trust", scenario_trust),  # the latest version's statement, two keys, never back, a patch made for another version
     ("German", lambda s, run: patch_1_to_2(s, run, GERMAN)),
     ("Japanese", lambda s, run: patch_1_to_2(s, run, JAPANESE)),
     ("up to date", scenario_up_to_date),  # no question, the game started

@@ -14,8 +14,9 @@
 namespace {
 
 const char kUsage[] =
-    "build (--from OLD_DIR | --complete) --to NEW_DIR --version V --out DIR [--max-archive-size BYTES] "
-    "[--registry-path KEY] [--registry-hive HIVE] [--xdelta3 PROGRAM] [--sign-key PRIVATE.pem]";
+    "build (--from OLD_DIR [--from-version V0] | --complete) --to NEW_DIR --version V --out DIR "
+    "[--max-archive-size BYTES] [--registry-path KEY] [--registry-hive HIVE] [--xdelta3 PROGRAM] "
+    "[--sign-key PRIVATE.pem]    a signed patch needs --from-version";
 
 bool ParseSize(const std::string& text, int64_t& value) {
     if (text.empty() || text.size() > 18 || text.find_first_not_of("0123456789") != std::string::npos) return false;
@@ -38,6 +39,8 @@ int Run(const std::vector<std::string>& args) {
         const std::string& value = args[++i];
         if (option == "--from") {
             options.fromDir = value;
+        } else if (option == "--from-version") {
+            options.fromVersion = value;
         } else if (option == "--to") {
             options.toDir = value;
         } else if (option == "--version") {

@@ -163,6 +163,7 @@ void BuildInto(const BuildOptions& options, const std::string& folder, const std
     for (const std::string& archive : packer.Archives())
         description.archives.push_back(DescribeArchive(folder, archive));
     description.version = options.version;
+    description.fromVersion = options.fromVersion;
 
     for (const auto& file : oldTree.files) {
         if (newTree.files.count(file.first) == 0) description.deletedFiles.push_back(file.first);
@@ -227,9 +228,15 @@ std::string BuildPatch(const BuildOptions& options) {
     CheckVersionText(options.version);
     CheckVersionFollows(options.outDir, options.version);
     if (options.maxArchiveSize <= 0) throw Exception("The maximum archive size must be positive.");
+    const bool complete = options.fromDir.empty();
+    if (!options.fromVersion.empty()) {
+        if (complete) throw Exception("A complete build starts from no version.");
+        CheckVersionText(options.fromVersion);
+    } else if (!complete && options.signingKey != nullptr) {
+        throw Exception("A signed patch names the version it starts from (--from-version).");
+    }
     CheckOutsideTree(options.outDir, options.fromDir);
     CheckOutsideTree(options.outDir, options.toDir);
-    const bool complete = options.fromDir.empty();
     const std::string name = complete ? BuildFolderName(options.version) : PatchFolderName(options.version);
     const std::string finalFolder = PathJoin(options.outDir, name);
     const std::string folder = finalFolder + ".partial";

@@ -24,6 +24,10 @@ struct BuildOptions {
     std::ostream* progress = nullptr;  // one line per file when set
     // Signs the description ("patchinfo.xml.sig") when set; not owned.
     const P256PrivateKey* signingKey = nullptr;
+    // The version of the old tree, recorded in a patch's description: an
+    // updater with a key takes a patch only for the version it starts from,
+    // so a signed patch must name it.
+    std::string fromVersion{};
 };
 
 // The folder names the updater asks for.

@@ -37,6 +37,7 @@ void WritePatchDescription(const PatchDescription& description, const std::strin
         AppendTextElement(root, "SpaceRequirement", std::to_string(description.spaceRequirement));
     }
     if (!description.version.empty()) AppendTextElement(root, "Version", description.version);
+    if (!description.fromVersion.empty()) AppendTextElement(root, "FromVersion", description.fromVersion);
     if (!description.archives.empty()) {
         TiXmlElement* archives = AppendElement(root, "Archives");
         for (const ArchiveRecord& archive : description.archives) {

@@ -28,9 +28,11 @@ struct PatchDescription {
     std::string registryPath;
     int64_t spaceRequirement = -1;  // -1: not written
     // Elements the updater's older readers skip: the version the patch
-    // leads to (a signed description cannot be replayed for another) and
-    // the archives.
-    std::string version;  // empty: not written
+    // leads to (a signed description cannot be replayed for another), the
+    // one it starts from (nor taken for a patch of another installation)
+    // and the archives.
+    std::string version;      // empty: not written
+    std::string fromVersion;  // empty: not written
     std::vector<ArchiveRecord> archives;
 };
 
