@@ -8,7 +8,6 @@
 #include <thread>
 
 #include "base/archive_source.h"
-#include "base/atomic_file.h"
 #include "base/cancellation.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
@@ -25,6 +24,7 @@
 #include "patch/patch_archive.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"
+#include "patch/prepared_list.h"
 #include "patch/vcdiff_decoder.h"
 
 namespace {
@@ -190,7 +190,7 @@ void PatchApplier::PreparePatch(IArchiveSource& archives) {
     // A cancel during the last extraction must not pass for a finished
     // stage: stage two would move a cut-off file in.
     CheckCancel();
-    WritePreparedList();
+    WritePreparedList(batch.patchFolder, batch.patchedFilesFolder, PreparedItems());
     MakePreparedFilesDurable();
 }
 
@@ -403,51 +403,6 @@ std::vector<std::string> PatchApplier::PreparedItems() {
     return items;
 }
 
-// What stage one prepared, how large each file came out and its Adler-32,
-// so that stage two, perhaps in a later process, can tell a complete set
-// from one that lost files, and a moved file from the old one of the same
-// size. One line per file: size, checksum, the item's path, tab-separated
-// (item paths hold no control characters).
-void PatchApplier::WritePreparedList() {
-    std::string list;
-    for (const std::string& item : PreparedItems()) {
-        const std::string prepared = PathJoin(batch.patchedFilesFolder, item);
-        list +=
-            std::to_string(FileSizeOf(prepared)) + "\t" + std::to_string(ChecksumOfFile(prepared)) + "\t" + item + "\n";
-    }
-    const std::string path = PathJoin(batch.patchFolder, kPreparedListName);
-    if (!ReplaceFileAtomically(path, list)) throw Exception("Failed to write " + path, ErrorCode::StepFailed);
-}
-
-std::map<std::string, PatchApplier::PreparedFile> PatchApplier::ReadPreparedList() const {
-    std::map<std::string, PreparedFile> files;
-    std::string text;
-    if (!ReadFileBytes(PathJoin(batch.patchFolder, kPreparedListName), 64 * 1024 * 1024, text)) return files;
-    const auto number = [](const std::string& digits, int64_t& value) {
-        if (digits.empty() || digits.size() > 18 || digits.find_first_not_of("0123456789") != std::string::npos) {
-            return false;
-        }
-        value = std::stoll(digits);
-        return true;
-    };
-    for (size_t start = 0; start < text.size();) {
-        const size_t end = std::min(text.find('\n', start), text.size());
-        const std::string line = text.substr(start, end - start);
-        const size_t first = line.find('\t');
-        const size_t second = first == std::string::npos ? first : line.find('\t', first + 1);
-        PreparedFile file;
-        int64_t checksum = 0;
-        if (second == std::string::npos || !number(line.substr(0, first), file.size) ||
-            !number(line.substr(first + 1, second - first - 1), checksum)) {
-            return {};  // not the program's own list
-        }
-        file.checksum = static_cast<uint32_t>(checksum);
-        files[line.substr(second + 1)] = file;
-        start = end + 1;
-    }
-    return files;
-}
-
 // Every prepared file must be there, as large as stage one made it, before
 // the installation starts to depend on them; once the moves have begun, a
 // file may already stand at its destination instead, which its checksum
@@ -455,7 +410,7 @@ std::map<std::string, PatchApplier::PreparedFile> PatchApplier::ReadPreparedList
 void PatchApplier::CheckPreparedFiles(const std::optional<ResumePoint>& recordedAction) {
     // The record that marks the start of the moves names no path.
     const bool movesBegun = recordedAction && recordedAction->actionIndex >= 0 && recordedAction->file.empty();
-    const std::map<std::string, PreparedFile> listed = ReadPreparedList();
+    const std::map<std::string, PreparedFile> listed = ReadPreparedList(batch.patchFolder);
     for (const std::string& item : PreparedItems()) {
         const auto found = listed.find(item);
         if (found != listed.end()) {

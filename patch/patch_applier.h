@@ -116,12 +116,6 @@ private:
     void RequireInside(const std::string& item, const std::vector<std::string>& ownNames,
                        std::set<std::string>& linkFreeFolders) const;
     std::vector<std::string> PreparedItems();
-    void WritePreparedList();
-    struct PreparedFile {
-        int64_t size = -1;
-        uint32_t checksum = 0;
-    };
-    std::map<std::string, PreparedFile> ReadPreparedList() const;
     void MakePreparedFilesDurable();
     void NoteChanged(const std::string& path);
     // An archive and what stage one prepares from it: paths, each with
