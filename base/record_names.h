@@ -13,3 +13,8 @@ extern const char* const kSpareProgressRecordName;   // its replacement while it
 
 // The four names above.
 const std::vector<std::string>& InstallationRecordNames();
+
+// The folder in a batch's work folder where the downloader notes, for each
+// archive it keeps between runs, what the archive must be and how to
+// continue it. No archive may be named into it.
+extern const char* const kDownloadRecordsFolderName;

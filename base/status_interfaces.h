@@ -15,6 +15,10 @@ public:
     virtual void OnFileProgress(const std::string& localPath, uint32_t bytesDone, uint32_t bytesTotal) = 0;
     // Called on the downloader's thread after each transfer, whatever its outcome.
     virtual void OnFileDone(const std::string& localPath) = 0;
+    // Called on the downloader's thread when a transfer that broke off is
+    // about to be tried again; the next OnFileProgress tells that data flows
+    // again. A view without a status line may ignore it.
+    virtual void OnFileRetrying(const std::string& localPath) { static_cast<void>(localPath); }
 
 protected:
     IStatusView() = default;

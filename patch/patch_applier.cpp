@@ -53,8 +53,8 @@ const char* const kDeltaFileName = "diffTempFile.dz";
 const char* const kPreparedListName = "patchedfiles.lst";
 
 const std::vector<std::string>& WorkFileNames() {
-    static const std::vector<std::string> names{kDeltaFileName, kPreparedListName, "patchinfo.xml",
-                                                "patchinfo.xml.sig"};
+    static const std::vector<std::string> names{kDeltaFileName, kPreparedListName, "patchinfo.xml", "patchinfo.xml.sig",
+                                                kDownloadRecordsFolderName};
     return names;
 }
 

@@ -34,7 +34,8 @@ protected:
 
 // The files the stages keep in a batch's patch folder besides the
 // archives: the delta being applied, and the list of what stage one
-// prepared. No archive may take their names, nor the description's.
+// prepared. No archive may take their names, nor the description's, nor
+// the downloader's records folder.
 extern const char* const kDeltaFileName;
 extern const char* const kPreparedListName;
 const std::vector<std::string>& WorkFileNames();

@@ -10,6 +10,7 @@
 #include "base/file_operations.h"
 #include "base/paths.h"
 #include "net/http_downloader.h"
+#include "net/kept_download.h"
 #include "net/location.h"
 #include "net/md5.h"
 #include "net/sign_url.h"
@@ -47,6 +48,17 @@ protected:
         finished.push_back(path);
         server.Serve("/heals", {200, body});  // the next copy is sound
     }
+    void OnFileRetrying(const std::string&) override { ++retries; }
+    // Fetches list to its end with the given retries, at once and stalls cut after a second.
+    DownloadStatus Fetch(const std::list<DownloadEntry>& list, int attempts, HttpDownloader* downloader = nullptr) {
+        HttpDownloader own;
+        downloader = downloader != nullptr ? downloader : &own;
+        downloader->SetStatusView(this);
+        downloader->SetRetryPolicy({attempts, 1ms, 1s});
+        downloader->Start(list, false);
+        downloader->WaitForWorker();
+        return downloader->Entries().back().status;
+    }
 
     HttpTestServer server;
     TempFolder folder;
@@ -57,6 +69,8 @@ protected:
     HttpDownloader* stopper = nullptr;                   // asked to stop at the first report
     std::vector<std::pair<uint32_t, uint32_t>> reports;  // bytes done, of total
     std::vector<std::string> finished;
+    int retries = 0;
+    const std::string sha256 = "8b194882fd4c9ac21acde9b27f7fcc891f2e2a65844ecea7eceea46fd3c19142";  // of body
 };
 
 // A file whose size and SHA-256 are declared arrives as declared or not at all: damaged, it is fetched once more, then
@@ -104,8 +118,8 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         {server.Url("/missing"), DownloadStatus::NotFound, old, 0, 0},
         {server.Url("/failing"), failed, old, 0, 0},
         {"http://127.0.0.1:" + std::to_string(closedPort) + "/a.bin", failed, old, 0, 0},
-        // A short body must not pass for a complete file.
-        {server.Url("/broken"), DownloadStatus::Pending, none, 0, 1},
+        // A short body must not pass for a complete file; one that breaks off at the same byte again is given up.
+        {server.Url("/broken"), DownloadStatus::Pending, none, 0, 3},
         {server.Url("/slow"), cancelled, none, 0, 1, kStopped},
         {"file://" + source, copyReports ? cancelled : done, copyReports ? none : body, 0, 1, kStopped},
         {"File://" + source, done, body, 150000, 1},  // any letter case
@@ -130,12 +144,13 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         DownloadEntry entry(item.location, target);
         if (item.how == kDeclared) {
             entry.declaredSize = static_cast<int64_t>(body.size());
-            entry.declaredSha256 = "8b194882fd4c9ac21acde9b27f7fcc891f2e2a65844ecea7eceea46fd3c19142";  // of body
+            entry.declaredSha256 = sha256;
         }
         SetServerClockOffset(item.serverClockOffset);
         HttpDownloader downloader;
         stopper = item.how == kStopped ? &downloader : nullptr;
         downloader.SetStatusView(this);
+        downloader.SetRetryPolicy({2, 1ms, 30s});
         downloader.Start({entry}, item.how == kSigned);
         downloader.WaitForWorker();
         EXPECT_EQ(downloader.Entries().front().status, item.status);
@@ -155,6 +170,73 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
     downloader.Download("file://" + source, source, false);
     EXPECT_EQ(downloader.WaitForFile("source.bin"), failed);
     EXPECT_TRUE(ReadTextFile(source) == body);
+}
+
+// A declared file that an earlier run left: a part is continued only where the server proves it is the same file
+// (the range asked for, under the same validator), else fetched from its start; a complete one is checked, not
+// fetched; a transfer that breaks off or stalls is continued in the same run; nothing undeclared is kept.
+TEST_F(DownloadTest, AKeptFileIsContinuedOnlyWhereTheServerProvesIt) {
+    const auto served = [&](const char* etag, bool ranges = true, size_t skew = 0, size_t cut = std::string::npos,
+                            bool stall = false) {
+        HttpTestResponse response{200, body, true, cut};
+        response.etag = etag;
+        response.ranges = ranges;
+        response.rangeSkew = skew;
+        response.stallAtBreak = stall;
+        return response;
+    };
+    const struct {
+        const char* what;
+        HttpTestResponse next;  // the server of the next run; the first got 60000 bytes of "v1", or all of it
+        bool complete, declared;
+        size_t requests;  // in the next run
+        uint32_t from;    // its first progress report
+        int retries = 0;
+        std::string location{};  // of the next run; empty: the server's
+    } cases[] = {
+        {"continued", served("\"v1\""), false, true, 1, 60000},
+        {"a server that ignores ranges", served("\"v1\"", false), false, true, 1, 0},
+        {"a 206 from elsewhere", served("\"v1\"", true, 1000), false, true, 2, 0},
+        {"changed on the server", served("\"v2\""), false, true, 1, 0},
+        {"complete", served("\"v1\""), true, true, 0, 150000},
+        {"complete, damaged since", served("\"v1\""), true, true, 1, 0},
+        {"not declared", served("\"v1\""), false, false, 1, 0},
+        {"cut again", served("\"v1\"", true, 0, 50000), false, true, 2, 60000, 1},
+        {"stalled", served("\"v1\"", true, 0, 80000, true), false, true, 2, 60000, 1},
+        {"continued from a copy", served("\"v1\""), false, true, 0, 60000, 0, "file://" + source},
+    };
+    for (const auto& item : cases) {
+        SCOPED_TRACE(item.what);
+        RemoveFile(target);
+        std::list<DownloadEntry> list{DownloadEntry(server.Url("/kept"), target)};
+        if (item.declared) {
+            list.front().declaredSize = static_cast<int64_t>(body.size());
+            list.front().declaredSha256 = sha256;
+        }
+        KeepDeclaredDownloads(list, folder.Path());
+        server.Serve("/kept", served("\"v1\"", true, 0, item.complete ? std::string::npos : 60000));
+        Fetch(list, 0);
+        if (item.what == std::string("complete, damaged since")) WriteTextFile(target, "x" + body.substr(1));
+        server.Serve("/kept", item.next);
+        if (!item.location.empty()) list.front().url = item.location;
+        KeepDeclaredDownloads(list, folder.Path());
+        const size_t before = server.Requests().size();
+        reports.clear();
+        retries = 0;
+        EXPECT_EQ(Fetch(list, 3), DownloadStatus::Done);
+        EXPECT_TRUE(ReadTextFile(target) == body);
+        const std::vector<std::string> requests = server.Requests();
+        ASSERT_EQ(requests.size() - before, item.requests);
+        if (item.requests != 0) {
+            const std::string& head = requests[before];
+            const bool ranged = head.find("\r\nRange: bytes=60000-\r\n") != std::string::npos &&
+                                head.find("\r\nIf-Range: \"v1\"\r\n") != std::string::npos;
+            EXPECT_EQ(ranged, !item.complete && item.declared) << head;
+        }
+        ASSERT_FALSE(reports.empty());
+        EXPECT_EQ(reports.front().first, item.from);
+        EXPECT_EQ(retries, item.retries);
+    }
 }
 
 TEST_F(DownloadTest, AListEndsAtTheFirstFailureAndOneRunsAtATimeUntilStoppedOrDestroyed) {
