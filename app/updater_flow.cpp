@@ -28,8 +28,9 @@ void Updater::RunUpdate() {
         if (plan.road != Road::Resume) {
             // Work folders of a run that ended before its stage two began,
             // or after it was done, hold nothing to resume; nor do the
-            // records' half-written replacements.
-            CleanTemporaryFiles(layout.patchFolder, layout.patchedFilesFolder);
+            // records' half-written replacements. Only the archives it kept
+            // may serve a batch still to come.
+            CleanTemporaryFiles(layout.patchFolder, layout.patchedFilesFolder, plan.road != Road::UpToDate);
             for (const char* record : {kInstallationDataFileName, kUninstallRecordName}) {
                 RemoveLeftoverReplacement(PathJoin(installDir, record));
             }
