@@ -313,6 +313,24 @@ def scenario_killed(s, run):
     check(chained, "no kill left a record")
 
 
+def scenario_killed_download(s, run):
+    # Killed while nginx sends an archive at 64 KiB/s: the next start asks for exactly the rest and finishes the batch.
+    tree = {**version_tree(2), "noise.bin": random.Random(5).randbytes(400000)}
+    archive = max(s.publish(version_tree(1), tree, "2", s.work / "server").glob("*.lzma"), key=lambda a: a.stat().st_size)
+    run.install_version(version_tree(1), "1")
+    run.env["IRONVALE_TEST_UPDATE_LOCATION"] = f"http://127.0.0.1:{s.port}/slow/"
+    process = run.start("-latestVersion", "2")
+    s.answer(YES)
+    part = run.install / "tempPatch" / archive.name
+    check(wait_until(lambda: part.exists() and part.stat().st_size > 100000, 60), "the archive did not begin to arrive")
+    process.kill()
+    process.wait()
+    kept = part.stat().st_size
+    run.play(["-latestVersion", "2"], [("", YES), ("", NO)], tree, "2")
+    sent = re.findall(rf'"GET /slow/patch_515195_2/{archive.name}\?[^"]*" (\d+) (\d+)', (s.work / "access.log").read_text())
+    check(sent[-1] == ("206", str(archive.stat().st_size - kept)), f"kept {kept} bytes, then: {sent}")
+
+
 def scenario_reinstall(s, run):
     s.publish(version_tree(1), version_tree(2), "2", s.work / "server")
     run.install_version(dict(sorted(version_tree(2).items())[1:]), "-1")  # one file missing
@@ -607,6 +625,7 @@ SCENARIOS = [
     ("start-up", start_up),  # no game: the language dialog, the not-installed box, the log's exact format
     ("patch over HTTP", patch_1_to_2),  # signed addresses, both questions in the registry's language, the game started
     ("killed", scenario_killed),  # SIGKILL (as TerminateProcess) at seeded moments of stage two, a chain 1 to 3
+    ("killed download", scenario_killed_download),  # SIGKILL in stage one: the next start fetches only the rest
     ("reinstall", scenario_reinstall),  # -1 without a record: the complete build
     ("cancel download", scenario_cancel_download),  # "Cancel" then Yes while an archive arrives
     ("cancel preparation", scenario_cancel_preparation),  # ... while a large file is unpacked
