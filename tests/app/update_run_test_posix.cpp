@@ -116,10 +116,14 @@ protected:
         return output;
     }
 
-    // The installation without the updater's records.
+    // The installation without the updater's records and work folder.
     Tree Game() {
         Tree tree = ReadTree(install);
         for (const char* own : {"InstallationData.xml", "Uninstall.xml", "UpdateHistory.log"}) tree.files.erase(own);
+        for (auto file = tree.files.begin(); file != tree.files.end();) {
+            file = file->first.rfind("tempPatch/", 0) == 0 ? tree.files.erase(file) : std::next(file);
+        }
+        tree.folders.erase(tree.folders.lower_bound("tempPatch"), tree.folders.upper_bound("tempPatch/~"));
         return tree;
     }
 
@@ -216,11 +220,20 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
         bool started, offered;  // the game, the complete build
         int archives;           // requested; -1: some
         const char* program = "served_updater";
+        bool kept = false;  // the first archive, for a later run
     } cases[] = {
         {"up to date", [&] { SetVersion("2"); }, "2", "", "", "2", true, false, 0},
-        {"9 to 10, declined", [&] { SetVersion("9"); }, "10", "n\n", "Latest version: 10", "9", false, false, 0},
+        {"9 to 10, declined: what an earlier run kept goes too",
+         [&] {
+             SetVersion("9");
+             WriteTree(PathJoin(install, "tempPatch"), TreeOf("patch0.lzma=part|download-records/patch0.lzma=x"));
+         },
+         "10", "n\n", "Latest version: 10", "9", false, false, 0},
         {"missing, play", nullptr, "5", "y\ny\n", "play the installed version instead", "1", true, false, 0},
         {"missing, quit", nullptr, "5", "y\nn\n", "play the installed version instead", "1", false, false, 0},
+        // What arrived before the missing archive is kept for the next start.
+        {"an archive missing", [&] { RemoveFile(PathJoin(patch, "patch1.lzma")); }, "2", "y\nn\n",
+         "could not be downloaded", "1", false, false, 2, "served_updater", true},
         {"no room", replace("<SpaceRequirement>\\d+", "<SpaceRequirement>9000000000000000000"), "2", "y\n",
          "9000000000000 MB of free space is required.", "1", false, false, 0},
         {"changed, the build taken", [&] { changed(true); }, "2", "y\ny\nn\n", "Download size: ", "2", false, true, -1},
@@ -267,7 +280,8 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
         EXPECT_EQ(GameStarted(), c.started);
         const long archives = ArchiveRequests(requests);
         EXPECT_TRUE(c.archives < 0 ? archives > 0 : archives == c.archives) << archives;
-        ExpectNoLeftovers();
+        EXPECT_EQ(PathExists(PathJoin(install, "tempPatch/patch0.lzma")), c.kept);
+        if (!c.kept) ExpectNoLeftovers();
     }
 }
 
