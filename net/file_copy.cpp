@@ -55,7 +55,7 @@ TransferResult FileCopyTransfer(const DownloadEntry& entry, KeptDownload& kept, 
         result.status = DownloadStatus::Failed;
     }
     if (result.status == DownloadStatus::Failed) LOG(Error) << "Undefined error while downloading. URL: " << entry.url;
-    if (context.statusView != nullptr) context.statusView->OnFileDone(localPath);
+    result.reported = true;
     return result;
 }
 

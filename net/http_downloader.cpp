@@ -163,13 +163,16 @@ DownloadStatus HttpDownloader::FetchPatiently(DownloadEntry& entry) {
         const TransferResult result = Fetch(entry);
         idle = result.arrived > furthest ? 0 : idle + 1;
         furthest = std::max(furthest, result.arrived);
-        if (!result.interrupted || furthest == 0 || idle >= retryPolicy.attempts || stop.IsCancelled()) {
-            return result.status;
+        const bool retry = result.interrupted && furthest > 0 && idle < retryPolicy.attempts && !stop.IsCancelled();
+        if (retry) {
+            const auto pause = retryPolicy.firstPause * (1 << std::min(idle, 10));
+            LOG(Error) << "The transfer of " << entry.url << " broke off; trying again in " << pause.count() << " ms.";
+            if (statusView != nullptr) statusView->OnFileRetrying(entry.localPath);
+            if (Pause(pause)) continue;
         }
-        const auto pause = retryPolicy.firstPause * (1 << std::min(idle, 10));
-        LOG(Error) << "The transfer of " << entry.url << " broke off; trying again in " << pause.count() << " ms.";
-        if (statusView != nullptr) statusView->OnFileRetrying(entry.localPath);
-        if (!Pause(pause)) return DownloadStatus::Cancelled;
+        // The view hears of the file once, however many tries it took.
+        if (result.reported && statusView != nullptr) statusView->OnFileDone(entry.localPath);
+        return retry ? DownloadStatus::Cancelled : result.status;
     }
 }
 

@@ -181,7 +181,7 @@ TransferResult HttpTransfer(const std::string& address, const DownloadEntry& ent
             std::remove(entry.localPath.c_str());
             if (kept.Allowed()) kept.Forget();
         }
-        if (context.statusView != nullptr) context.statusView->OnFileDone(entry.localPath);
+        result.reported = true;
         return result;
     }
 }

@@ -18,6 +18,9 @@ struct TransferResult {
     // The bytes of the file there when the attempt ended, kept ones
     // included: an attempt that got further than any before made progress.
     uint64_t arrived = 0;
+    // The view is owed OnFileDone: the transfer got as far as its file (an
+    // HTTP answer that was taken, any copy).
+    bool reported = false;
 };
 
 // What every attempt is given besides its entry.
