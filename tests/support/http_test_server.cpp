@@ -89,11 +89,10 @@ void HttpTestServer::Answer(const TestSocket& connection) {
     if (response.status == 200 && response.ranges && std::regex_search(head, asked, range) &&
         (!std::regex_search(head, condition, ifRange) || condition[1].str() == response.etag)) {
         const size_t from = std::stoull(asked[1].str()) + response.rangeSkew, size = response.body.size();
-        response.status = from < size ? 206 : 416;
-        headers += from < size ? "Content-Range: bytes " + std::to_string(from) + "-" + std::to_string(size - 1) + "/" +
-                                     std::to_string(size) + "\r\n"
-                               : "";
-        response.body = response.body.substr(std::min(from, size));
+        response.status = 206;
+        headers += "Content-Range: bytes " + std::to_string(from) + "-" + std::to_string(size - 1) + "/" +
+                   std::to_string(size) + "\r\n";
+        response.body.erase(0, std::min(from, size));
     }
     std::string reply = "HTTP/1.1 " + std::to_string(response.status) + " Test\r\nConnection: close\r\n" + headers;
     if (response.sendLength) reply += "Content-Length: " + std::to_string(response.body.size()) + "\r\n";

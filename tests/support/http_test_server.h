@@ -20,8 +20,8 @@ struct HttpTestResponse {
     std::chrono::milliseconds pause{0};
     bool requireSignature = false;  // answer 403 unless the address is signed
     std::string etag{};             // sent as the ETag when not empty
-    // "Range: bytes=N-" gets 206 and the rest from N (416 past the end), unless If-Range names another ETag; a broken
-    // server's rest starts rangeSkew bytes later than asked.
+    // "Range: bytes=N-" gets 206 and the rest from N, unless If-Range names another ETag; a broken server's rest
+    // starts rangeSkew bytes later than asked.
     bool ranges = true;
     size_t rangeSkew = 0;
     bool stallAtBreak = false;  // at breakOffAfter, hold the connection without a byte until the client hangs up
