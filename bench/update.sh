@@ -47,7 +47,7 @@ for i in range(count):
     data = rng.randbytes(length)
     open("v1/" + name, "wb").write(data)
     if i % 5 == 0:
-        data = edit(rng, data, max(1, length // 1300), 128, ["replace", "insert", "delete"])
+        data = edit(rng, data, max(1, length // 1300), 128)
     open("v2/" + name, "wb").write(data)
     if i % 10 == 3:
         # New files, a tenth of the size: what the archives mostly carry.
