@@ -5,14 +5,16 @@
 #include "base/paths.h"
 #include "base/record_names.h"
 #include "base/string_helpers.h"
-#include "patch/patch_applier.h"
+#include "net/kept_download.h"
 
-void CleanTemporaryFiles(const std::string& patchDir, const std::string& patchedDir) {
+void CleanTemporaryFiles(const std::string& patchDir, const std::string& patchedDir, bool keepDownloads) {
     DeleteDirectory(patchedDir, true);
     if (patchDir.empty()) return;
+    if (!keepDownloads) DeleteDirectory(PathJoin(patchDir, kDownloadRecordsFolderName), true);
     // The names the system wildcards "diff*.*", "patch*.*" and "tmp_*.*"
     // match: the dot is optional there, and Windows ignores letter case.
     for (const std::string& name : ListFileNames(patchDir)) {
+        if (keepDownloads && IsKeptDownload(patchDir, name)) continue;
         for (const char* prefix : {"diff", "patch", "tmp_"}) {
             if (StartsWithIgnoringCase(name, prefix)) {
                 RemoveFile(PathJoin(patchDir, name));
@@ -26,7 +28,8 @@ void CleanTemporaryFiles(const std::string& patchDir, const std::string& patched
     DeleteDirectory(patchDir, false);
 }
 
-void RemoveLeftovers(const std::string& installDir, const std::string& patchDir, const std::string& patchedDir) {
-    CleanTemporaryFiles(patchDir, patchedDir);
+void RemoveLeftovers(const std::string& installDir, const std::string& patchDir, const std::string& patchedDir,
+                     bool keepDownloads) {
+    CleanTemporaryFiles(patchDir, patchedDir, keepDownloads);
     for (const std::string& record : InstallationRecordNames()) RemoveLeftoverReplacement(PathJoin(installDir, record));
 }

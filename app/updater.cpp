@@ -4,6 +4,7 @@
 #include "app/language.h"
 #include "app/overall_progress.h"
 #include "app/publisher_key.h"
+#include "app/temporary_files.h"
 #include "base/encoding.h"
 #include "base/exception.h"
 #include "base/file_operations.h"
@@ -100,8 +101,10 @@ bool Updater::HandleUpdateFailure(const Exception& error) {
     LogEntry(report.level, kLogSource, __LINE__).Stream() << report.logLine;
     switch (report.notice) {
         case FailureNotice::None:
-            // Whatever the player declined or cancelled, nothing more runs.
+            // Whatever the player declined or cancelled, nothing more runs,
+            // and nothing downloaded for it stays.
             quitRequested.Cancel();
+            DiscardDownloads();
             return false;
         case FailureNotice::PlayOldQuestion:
             return gui.AskYesNo(report.text);
@@ -110,6 +113,14 @@ bool Updater::HandleUpdateFailure(const Exception& error) {
             return false;
     }
     return false;
+}
+
+void Updater::DiscardDownloads() {
+    // An installation in change keeps its work folders for the next start.
+    if (installDir.empty() || installationData.currentVersion == "-1") return;
+    downloader.WaitForWorker();
+    const UpdateLayout layout = MakeUpdateLayout(configuration, installDir);
+    CleanTemporaryFiles(layout.patchFolder, layout.patchedFilesFolder);
 }
 
 void Updater::StartGame() {
@@ -125,10 +136,17 @@ void Updater::OnApplyProgress(const std::string& fileName, int32_t permille) {
 }
 
 void Updater::OnFileProgress(const std::string&, uint32_t bytesDone, uint32_t bytesTotal) {
+    // Data flows again: the status line says what it said before.
+    if (retrying.exchange(false)) gui.SetStatusText(statusBeforeRetry);
     gui.SetOverallProgress(OverallProgress(doneFiles, totalFiles, bytesDone, bytesTotal));
 }
 
 void Updater::OnFileDone(const std::string&) { ++doneFiles; }
+
+void Updater::OnFileRetrying(const std::string&) {
+    if (!retrying.exchange(true)) statusBeforeRetry = gui.GetStatusText();
+    gui.SetStatusText(Localize("INSTALLER_DOWNLOAD_RETRYING_STATUS"));
+}
 
 void Updater::Cancel() {
     quitRequested.Cancel();

@@ -41,6 +41,7 @@ public:
     void OnApplyProgress(const std::string& fileName, int32_t permille) override;
     void OnFileProgress(const std::string& localPath, uint32_t bytesDone, uint32_t bytesTotal) override;
     void OnFileDone(const std::string& localPath) override;
+    void OnFileRetrying(const std::string& localPath) override;
     void Cancel() override;
 
 private:
@@ -52,6 +53,9 @@ private:
     // Shows what went wrong; true when the player chose to play the
     // installed version.
     bool HandleUpdateFailure(const Exception& error);
+    // Removes the work folders, kept archives included, unless the
+    // installation is in change.
+    void DiscardDownloads();
     void StartGame();
 
     // The checks before an update (updater_checks.cpp).
@@ -107,8 +111,9 @@ private:
     void StageTwo(PatchStages& stages, const PatchBatch& batch, const std::optional<ResumePoint>& resumeAt);
     // Stops the downloads and, unless the installation is in change (an
     // interrupted stage two keeps its files for the next start), removes
-    // what the batch downloaded and prepared: an archive may be gigabytes.
-    void AbandonBatch(const PatchBatch& batch);
+    // what the batch prepared and, unless failure is a download that did not
+    // arrive, what it downloaded: an archive may be gigabytes.
+    void AbandonBatch(const PatchBatch& batch, const Exception& failure);
     bool CheckDiskSpace(const std::string& folder, int64_t required, const std::wstring& message, bool quiet);
     std::list<DownloadEntry> BuildDownloadList(const PatchBatch& batch, PatchInfoFile& description);
     StageServices Services();
@@ -126,6 +131,10 @@ private:
     OsInfo osInfo;
     int32_t totalFiles = 0;
     std::atomic<int32_t> doneFiles{0};
+    // A transfer is being tried again; the status line it replaced (both
+    // are the downloader thread's).
+    std::atomic<bool> retrying{false};
+    std::wstring statusBeforeRetry;
     bool didWork = false;
     bool firstVersionCheck = true;
     std::string registryKeyPath;

@@ -27,8 +27,11 @@ void Updater::RunUpdate() {
         const UpdateLayout layout = MakeUpdateLayout(configuration, installDir);
         const UpdatePlan plan = PlanUpdate(facts, layout);
         // Work folders of a run that ended before its stage two began, or
-        // after it was done, hold nothing to resume.
-        if (plan.road != Road::Resume) RemoveLeftovers(installDir, layout.patchFolder, layout.patchedFilesFolder);
+        // after it was done, hold nothing to resume; only the archives it
+        // kept may serve a batch still to come.
+        if (plan.road != Road::Resume) {
+            RemoveLeftovers(installDir, layout.patchFolder, layout.patchedFilesFolder, plan.road != Road::UpToDate);
+        }
         switch (plan.road) {
             case Road::UpToDate:
                 return;

@@ -9,6 +9,7 @@
 #include "base/file_operations.h"
 #include "base/log.h"
 #include "base/paths.h"
+#include "net/kept_download.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_stages.h"
 #include "text/localization.h"
@@ -31,8 +32,8 @@ void Updater::InstallBatch(const PatchBatch& batch, const CheckedDescription& ch
         // two begin.
         quitRequested.ThrowIfCancelled("User cancelled before the installation was changed.");
         StageTwo(stages, batch, std::nullopt);
-    } catch (const Exception&) {
-        AbandonBatch(batch);
+    } catch (const Exception& error) {
+        AbandonBatch(batch, error);
         throw;
     }
 }
@@ -65,10 +66,15 @@ void Updater::ResumeBatch(const PatchBatch& batch, const ResumePoint& resumeAt, 
     }
 }
 
-void Updater::AbandonBatch(const PatchBatch& batch) {
+void Updater::AbandonBatch(const PatchBatch& batch, const Exception& failure) {
     downloader.RequestStop();
     downloader.WaitForWorker();
-    if (installationData.currentVersion != "-1") CleanTemporaryFiles(batch.patchFolder, batch.patchedFilesFolder);
+    // An archive that did not arrive (the line, the server) is the one
+    // failure the next start may get past with what arrived so far.
+    const bool keepDownloads = failure.Code() == ErrorCode::FileNotFound;
+    if (installationData.currentVersion != "-1") {
+        CleanTemporaryFiles(batch.patchFolder, batch.patchedFilesFolder, keepDownloads);
+    }
 }
 
 StageServices Updater::Services() { return StageServices{this, &retryBox, &quitRequested}; }
@@ -115,7 +121,8 @@ bool Updater::CheckDiskSpace(const std::string& folder, int64_t required, const 
     return false;
 }
 
-// Each archive the description declares must arrive as declared.
+// Each archive the description declares must arrive as declared; what an
+// earlier run kept of those is used or continued, and nothing else of it stays.
 std::list<DownloadEntry> Updater::BuildDownloadList(const PatchBatch& batch, PatchInfoFile& description) {
     const std::vector<std::string> names = ArchivesInFetchOrder(description);
     std::list<DownloadEntry> list = MakeDownloadList(names, batch.location, batch.patchFolder);
@@ -126,5 +133,6 @@ std::list<DownloadEntry> Updater::BuildDownloadList(const PatchBatch& batch, Pat
         entry.declaredSize = declared->second.size;
         entry.declaredSha256 = declared->second.sha256;
     }
+    KeepDeclaredDownloads(list, batch.patchFolder);
     return list;
 }

@@ -96,3 +96,13 @@ bool ReadFileBytes(const std::string& path, int64_t limit, std::string& bytes) {
         return false;
     }
 }
+
+int64_t GetFileLength(const std::string& path) {
+    try {
+        FileStream file;
+        file.Open(path);
+        return file.GetLength();
+    } catch (const Exception&) {
+        return -1;
+    }
+}

@@ -13,3 +13,16 @@ extern const char* const kSpareProgressRecordName;   // its replacement while it
 
 // The four names above.
 const std::vector<std::string>& InstallationRecordNames();
+
+// The files a batch's work folder holds besides its archives: the delta
+// being applied (a worker's own with a suffix), the list of what stage one
+// prepared, the description and its signature, and the folder where the
+// downloader notes, for each archive it keeps between runs, what the
+// archive must be and how to continue it.
+extern const char* const kDeltaFileName;
+extern const char* const kPreparedListName;
+extern const char* const kDownloadRecordsFolderName;
+const std::vector<std::string>& WorkFileNames();
+// Whether an archive may be called name: a plain relative name that is
+// none of the work files (nor a worker's delta).
+bool IsUsableArchiveName(const std::string& name);

@@ -13,8 +13,13 @@ public:
     virtual void OnApplyProgress(const std::string& fileName, int32_t permille) = 0;
     // Called on the downloader's thread during a transfer.
     virtual void OnFileProgress(const std::string& localPath, uint32_t bytesDone, uint32_t bytesTotal) = 0;
-    // Called on the downloader's thread after each transfer, whatever its outcome.
+    // Called on the downloader's thread after each transfer, whatever its
+    // outcome; once for all the tries of a transfer that broke off.
     virtual void OnFileDone(const std::string& localPath) = 0;
+    // Called on the downloader's thread when a transfer that broke off is
+    // about to be tried again; the next OnFileProgress tells that data flows
+    // again. A view without a status line may ignore it.
+    virtual void OnFileRetrying(const std::string& localPath) { static_cast<void>(localPath); }
 
 protected:
     IStatusView() = default;

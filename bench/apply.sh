@@ -42,7 +42,7 @@ for i in range(count):
     open("pristine/" + name, "wb").write(data)
     if i % 5 == 0:
         # About 5% of the bytes edited, in runs of up to 128.
-        data = edit(rng, data, max(1, length // 1300), 128, ["replace", "insert", "delete"])
+        data = edit(rng, data, max(1, length // 1300), 128)
         changed.append(name)
     open("target/" + name, "wb").write(data)
 open("changed.txt", "w").write("\n".join(changed) + "\n")

@@ -47,7 +47,7 @@ for i in range(count):
     data = rng.randbytes(length)
     open("v1/" + name, "wb").write(data)
     if i % 5 == 0:
-        data = edit(rng, data, max(1, length // 1300), 128, ["replace", "insert", "delete"])
+        data = edit(rng, data, max(1, length // 1300), 128)
     open("v2/" + name, "wb").write(data)
     if i % 10 == 3:
         # New files, a tenth of the size: what the archives mostly carry.
@@ -64,26 +64,10 @@ source "$root/bench/support/loopback_nginx.sh"
 start_nginx "$work" version.txt
 location=http://127.0.0.1:$port
 
-# The program with this server built in, in a build folder of its own.
-program_build=$root/build/bench-update
-cmake -S "$root" -B "$program_build" -G Ninja -DCMAKE_BUILD_TYPE=Release -DIRONVALE_TESTS=OFF \
-  -DIRONVALE_UPDATE_LOCATION="$location" >/dev/null
-cmake --build "$program_build" --target IronvaleUpdater >/dev/null
-program=$program_build/IronvaleUpdater
-
-export IRONVALE_REGISTRY_ROOT=$work/registry TMPDIR=$work/tmp
-game_key=$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Halvard/Ironvale
-directx_key=$IRONVALE_REGISTRY_ROOT/HKEY_LOCAL_MACHINE/SOFTWARE/Microsoft/DirectX
-mkdir -p "$TMPDIR" "$game_key" "$directx_key"
-printf 'Install Dir\t%s\nLanguage\tEnglish\n' "$work/install" >"$game_key/.values"
-printf 'Version\t4.09.00.0904\n' >"$directx_key/.values"
-
-reset_installation() {
-  rm -rf install download "$TMPDIR"/*
-  cp -a v1 install
-  printf '<?xml version="1.0" ?>\n<InstallationData>\n    <CurrentVersion>1</CurrentVersion>\n    <PatcherVersion>3</PatcherVersion>\n</InstallationData>\n' \
-    >install/InstallationData.xml
-}
+# The program with this server built in.
+source "$root/bench/support/installed_game.sh"
+build_updater "$location" IronvaleUpdater
+use_registry "$work/install"
 
 check_installation() {  # NAME
   diff -r -q -x InstallationData.xml -x Uninstall.xml -x UpdateHistory.log install v2 >/dev/null ||
@@ -92,7 +76,8 @@ check_installation() {  # NAME
 
 measure() {  # NAME: appends "seconds kilobytes" to NAME.times
   local name=$1
-  reset_installation
+  rm -rf download
+  reset_installation v1 install
   case $name in
     download)
       local arguments=()

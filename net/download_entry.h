@@ -29,6 +29,7 @@ struct DownloadEntry {
           declaredSize(other.declaredSize),
           declaredSha256(other.declaredSha256),
           sizeLimit(other.sizeLimit),
+          recordPath(other.recordPath),
           status(other.status.load()) {}
     DownloadEntry& operator=(const DownloadEntry& other) {
         url = other.url;
@@ -36,6 +37,7 @@ struct DownloadEntry {
         declaredSize = other.declaredSize;
         declaredSha256 = other.declaredSha256;
         sizeLimit = other.sizeLimit;
+        recordPath = other.recordPath;
         status = other.status.load();
         return *this;
     }
@@ -53,6 +55,10 @@ struct DownloadEntry {
     // The limit a transfer of this entry stops at: the declared size, else
     // sizeLimit (-1: none).
     int64_t TransferLimit() const { return declaredSize >= 0 ? declaredSize : sizeLimit; }
+    // Where the downloader notes how to continue this file in a later run
+    // (KeepDeclaredDownloads sets it). Empty: the file is never kept, and
+    // nothing of a transfer that does not finish stays.
+    std::string recordPath;
     std::atomic<DownloadStatus> status{DownloadStatus::Pending};
 };
 

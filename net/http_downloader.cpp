@@ -1,5 +1,6 @@
 #include "net/http_downloader.h"
 
+#include <algorithm>
 #include <chrono>
 
 #include "base/exception.h"
@@ -8,6 +9,7 @@
 #include "base/paths.h"
 #include "net/file_copy.h"
 #include "net/http_transfer.h"
+#include "net/kept_download.h"
 #include "net/location.h"
 #include "net/sha256.h"
 #include "net/sign_url.h"
@@ -99,8 +101,17 @@ ArchiveState HttpDownloader::WaitForArchive(const std::string& fileName) {
 }
 
 void HttpDownloader::Run() {
+    // What an earlier run completed is handed over first: work on it starts
+    // before the missing files arrive.
     for (DownloadEntry& entry : entries) {
         if (stop.IsCancelled()) break;
+        if (!TakeKept(entry)) continue;
+        entry.status = DownloadStatus::Done;
+        wakeEvent.Signal();
+    }
+    for (DownloadEntry& entry : entries) {
+        if (stop.IsCancelled()) break;
+        if (entry.status == DownloadStatus::Done) continue;
         entry.status = FetchChecked(entry);
         wakeEvent.Signal();
         if (entry.status != DownloadStatus::Done) break;
@@ -113,37 +124,83 @@ void HttpDownloader::Run() {
     wakeEvent.Signal();
 }
 
+bool HttpDownloader::TakeKept(const DownloadEntry& entry) {
+    KeptDownload kept(entry);
+    if (!kept.Complete()) return false;
+    if (Check(entry) != DownloadStatus::Done) {
+        if (!stop.IsCancelled()) kept.Forget();
+        return false;
+    }
+    LOG(Info) << "Taking " << entry.localPath << " as an earlier run left it.";
+    const auto size = static_cast<uint64_t>(entry.declaredSize);
+    ReportFileProgress(statusView, entry.localPath, size, size);
+    if (statusView != nullptr) statusView->OnFileDone(entry.localPath);
+    return true;
+}
+
 DownloadStatus HttpDownloader::FetchChecked(DownloadEntry& entry) {
     const std::string source = entry.url;  // a relative one is resolved by the first fetch
-    DownloadStatus status = Fetch(entry);
+    DownloadStatus status = FetchPatiently(entry);
     if (status != DownloadStatus::Done) return status;
     status = Check(entry);
     if (status != DownloadStatus::Corrupt) return status;
-    // Damaged on the way (a flaky proxy, a cache holding a cut-off copy):
-    // one more try from the source, then the file is given up.
+    // Damaged on the way (a flaky proxy, a cache holding a cut-off copy, a
+    // part kept from a file that has changed since): one more try from the
+    // source, from its start, then the file is given up.
     LOG(Error) << "Fetching " << source << " once more.";
     entry.url = source;
-    status = Fetch(entry);
+    status = FetchPatiently(entry);
     if (status == DownloadStatus::Done) status = Check(entry);
     return status;
 }
 
-DownloadStatus HttpDownloader::Fetch(DownloadEntry& entry) {
+DownloadStatus HttpDownloader::FetchPatiently(DownloadEntry& entry) {
+    const std::string source = entry.url;
+    uint64_t furthest = 0;  // of any try
+    int idle = 0;           // tries in a row that got no further
+    for (;;) {
+        entry.url = source;
+        const TransferResult result = Fetch(entry);
+        idle = result.arrived > furthest ? 0 : idle + 1;
+        furthest = std::max(furthest, result.arrived);
+        const bool retry = result.interrupted && furthest > 0 && idle < retryPolicy.attempts && !stop.IsCancelled();
+        if (retry) {
+            const auto pause = retryPolicy.firstPause * (1 << std::min(idle, 10));
+            LOG(Error) << "The transfer of " << entry.url << " broke off; trying again in " << pause.count() << " ms.";
+            if (statusView != nullptr) statusView->OnFileRetrying(entry.localPath);
+            if (Pause(pause)) continue;
+        }
+        // The view hears of the file once, however many tries it took.
+        if (result.reported && statusView != nullptr) statusView->OnFileDone(entry.localPath);
+        return retry ? DownloadStatus::Cancelled : result.status;
+    }
+}
+
+bool HttpDownloader::Pause(std::chrono::milliseconds pause) {
+    const auto end = std::chrono::steady_clock::now() + pause;
+    while (!stop.IsCancelled() && std::chrono::steady_clock::now() < end) {
+        std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    }
+    return !stop.IsCancelled();
+}
+
+TransferResult HttpDownloader::Fetch(DownloadEntry& entry) {
     LOG(Trace) << "Downloading file: " << entry.url;
+    KeptDownload kept(entry);
+    const TransferContext context{stop, statusView, retryPolicy.stallTimeout};
     switch (ClassifyLocation(entry.url)) {
         case LocationKind::Http:
-            return HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry.localPath, entry.TransferLimit(), stop,
-                                statusView);
+            return HttpTransfer(signUrls ? SignUrl(entry.url) : entry.url, entry, kept, context);
         case LocationKind::Relative:
             entry.url = PathJoin(GetProgramFolder(), entry.url);
-            return FileCopyTransfer(entry.url, entry.localPath, entry.TransferLimit(), stop, statusView);
+            return FileCopyTransfer(entry, kept, context);
         case LocationKind::FileCopy:
-            return FileCopyTransfer(entry.url, entry.localPath, entry.TransferLimit(), stop, statusView);
+            return FileCopyTransfer(entry, kept, context);
         case LocationKind::Unsupported:
             break;
     }
     LOG(Error) << "Download error, protocol not supported. URL: " << entry.url;
-    return DownloadStatus::Unsupported;
+    return TransferResult{DownloadStatus::Unsupported};
 }
 
 DownloadStatus HttpDownloader::Check(const DownloadEntry& entry) {
@@ -166,7 +223,10 @@ DownloadStatus HttpDownloader::Check(const DownloadEntry& entry) {
         status = DownloadStatus::Done;
     }
     // Only a file that matches stays: nothing may take a damaged one for
-    // the real thing.
-    if (status != DownloadStatus::Done) RemoveFile(entry.localPath);
+    // the real thing. One that may be kept stays when a stop cut its check
+    // short.
+    if (status == DownloadStatus::Corrupt || (status != DownloadStatus::Done && entry.recordPath.empty())) {
+        RemoveFile(entry.localPath);
+    }
     return status;
 }

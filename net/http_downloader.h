@@ -1,6 +1,7 @@
 #pragma once
 
 #include <atomic>
+#include <chrono>
 #include <condition_variable>
 #include <list>
 #include <mutex>
@@ -12,13 +13,26 @@
 #include "base/status_interfaces.h"
 #include "net/auto_reset_event.h"
 #include "net/download_entry.h"
+#include "net/transfer.h"
+
+// How a transfer that breaks off is tried again: after a pause that
+// doubles with each try that brings nothing, continuing from what arrived.
+// Only a file that has sent bytes in this run is tried again, so a server
+// that cannot be reached at all fails at once.
+struct RetryPolicy {
+    int attempts = 5;  // tries in a row that may bring nothing before the file is given up
+    std::chrono::milliseconds firstPause{1000};
+    std::chrono::seconds stallTimeout{30};  // a transfer without a byte this long breaks off
+};
 
 // Fetches an ordered list of files on a worker thread of its own, so the
 // caller can work on each file as soon as it has arrived. A location is an
 // "http://" address, a "file://" address, a UNC path or a path relative to
 // the program's folder. The first file that does not arrive ends the list.
 // A file is reported only once it is checked against what its entry
-// declares (size, SHA-256).
+// declares (size, SHA-256). Files an earlier run kept (KeepDeclaredDownloads)
+// are checked and handed over before anything is fetched, and a partial one
+// is continued.
 class HttpDownloader : public IArchiveSource {
 public:
     // A cancel of runCancel (may be null) stops the downloader too, and
@@ -61,16 +75,25 @@ public:
     // Receives progress from the worker thread; not owned, may be null.
     // Set it before Start.
     void SetStatusView(IStatusView* view) { statusView = view; }
+    // Set it before Start.
+    void SetRetryPolicy(const RetryPolicy& policy) { retryPolicy = policy; }
 
 private:
     void Run();
+    // True when an earlier run left the entry's file complete and it
+    // passes the check.
+    bool TakeKept(const DownloadEntry& entry);
     // The entry's final outcome: fetched, checked, and fetched once more
     // when it does not match its declaration.
     DownloadStatus FetchChecked(DownloadEntry& entry);
-    DownloadStatus Fetch(DownloadEntry& entry);
+    // Fetches, and tries again as the retry policy allows.
+    DownloadStatus FetchPatiently(DownloadEntry& entry);
+    TransferResult Fetch(DownloadEntry& entry);
     // Done when the file at the entry's path matches what the entry
     // declares, Corrupt when it does not, Cancelled on a stop.
     DownloadStatus Check(const DownloadEntry& entry);
+    // Waits unless a stop comes first; false on a stop.
+    bool Pause(std::chrono::milliseconds pause);
     bool WorkerEnded();
 
     bool signUrls = false;
@@ -79,6 +102,7 @@ private:
     AutoResetEvent wakeEvent;
     std::list<DownloadEntry> entries;
     IStatusView* statusView = nullptr;
+    RetryPolicy retryPolicy;
 
     // Whether the worker of the last Start is still running.
     std::mutex workerMutex;

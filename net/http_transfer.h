@@ -1,17 +1,19 @@
 #pragma once
 
-#include <cstdint>
 #include <string>
 
-#include "base/status_interfaces.h"
 #include "net/download_entry.h"
+#include "net/transfer.h"
 
-class CancellationToken;
+class KeptDownload;
 
-// Fetches address into localPath over HTTP, reporting progress after every
-// piece to statusView (may be null) and checking stop before each
-// read. Only 200 is accepted. A body that would run past sizeLimit bytes
-// (unless it is -1) is stopped as Failed. Anything but Done leaves no file
-// at localPath.
-DownloadStatus HttpTransfer(const std::string& address, const std::string& localPath, int64_t sizeLimit,
-                            const CancellationToken& stop, IStatusView* statusView);
+// Fetches address (the entry's location, signed when asked) into the
+// entry's localPath over HTTP. A part kept from an earlier attempt is
+// continued with "Range" and "If-Range"; a 206 counts only when it
+// continues exactly there, up to the declared size, under the same
+// validator, and anything else fetches the file from its start. Only 200
+// is accepted otherwise. A body that would run past the entry's
+// TransferLimit() is stopped as Failed. Anything but Done leaves no file at
+// localPath unless kept may continue it.
+TransferResult HttpTransfer(const std::string& address, const DownloadEntry& entry, KeptDownload& kept,
+                            const TransferContext& context);

@@ -1,5 +1,7 @@
 #include <curl/curl.h>
+#include <curl/header.h>
 
+#include <chrono>
 #include <cstdint>
 
 #include "base/unique_handle.h"
@@ -35,23 +37,35 @@ void Append(UniqueHandle<CurlListTraits>& list, const char* line) {
 struct Transfer {
     CURL* curl;
     HttpResponseSink& sink;
+    std::chrono::steady_clock::duration stallTimeout;
+    std::chrono::steady_clock::time_point lastByte = std::chrono::steady_clock::now();
+    curl_off_t received = 0;
     bool responded = false;
     bool abandoned = false;
     bool stopped = false;
+    bool stalled = false;
 };
 
-// Hands the status and length to the sink once the headers are in.
+// The value of the last answer's header name; empty when it has none.
+std::string Header(CURL* curl, const char* name) {
+    curl_header* header = nullptr;
+    if (curl_easy_header(curl, name, 0, CURLH_HEADER, -1, &header) != CURLHE_OK) return "";
+    return header->value;
+}
+
+// Hands the head to the sink once it is in.
 bool Respond(Transfer& transfer) {
     transfer.responded = true;
     long code = 0;
-    std::string statusText;
+    HttpResponseHead head;
     if (curl_easy_getinfo(transfer.curl, CURLINFO_RESPONSE_CODE, &code) == CURLE_OK && code != 0) {
-        statusText = std::to_string(code);
+        head.status = std::to_string(code);
     }
-    curl_off_t length = -1;
-    if (curl_easy_getinfo(transfer.curl, CURLINFO_CONTENT_LENGTH_DOWNLOAD_T, &length) != CURLE_OK) length = -1;
-    const bool lengthKnown = length >= 0 && length <= static_cast<curl_off_t>(UINT32_MAX);
-    if (!transfer.sink.OnResponse(statusText, lengthKnown, lengthKnown ? static_cast<uint32_t>(length) : 0)) {
+    head.contentLength = Header(transfer.curl, "Content-Length");
+    head.contentRange = Header(transfer.curl, "Content-Range");
+    head.etag = Header(transfer.curl, "ETag");
+    head.lastModified = Header(transfer.curl, "Last-Modified");
+    if (!transfer.sink.OnResponse(head)) {
         transfer.abandoned = true;
         return false;
     }
@@ -73,12 +87,19 @@ size_t OnBody(char* data, size_t, size_t count, void* context) {
     return count;
 }
 
-// Also called while no data arrives, so a stop does not wait for the server.
-int OnTick(void* context, curl_off_t, curl_off_t, curl_off_t, curl_off_t) {
+// Also called while no data arrives, so a stop does not wait for the
+// server, and a line that has gone quiet (from the connection on) ends the
+// transfer instead of holding it for ever: the caller may try again.
+int OnTick(void* context, curl_off_t, curl_off_t received, curl_off_t, curl_off_t) {
     Transfer& transfer = *static_cast<Transfer*>(context);
-    if (transfer.sink.KeepReading()) return 0;
-    transfer.stopped = true;
-    return 1;
+    const auto now = std::chrono::steady_clock::now();
+    if (received != transfer.received) {
+        transfer.received = received;
+        transfer.lastByte = now;
+    }
+    transfer.stalled = now - transfer.lastByte > transfer.stallTimeout;
+    transfer.stopped = !transfer.sink.KeepReading();
+    return transfer.stalled || transfer.stopped ? 1 : 0;
 }
 
 void InitializeLibraryOnce() {
@@ -88,15 +109,17 @@ void InitializeLibraryOnce() {
 
 }  // namespace
 
-HttpOutcome HttpGet(const std::string& address, HttpResponseSink& sink) {
+HttpOutcome HttpGet(const std::string& address, const std::vector<std::string>& extraHeaders,
+                    std::chrono::seconds stallTimeout, HttpResponseSink& sink) {
     InitializeLibraryOnce();
     const UniqueHandle<CurlTraits> curl(curl_easy_init());
     if (!curl) return HttpOutcome::NoSession;
-    Transfer transfer{curl.Get(), sink};
+    Transfer transfer{curl.Get(), sink, stallTimeout};
     UniqueHandle<CurlListTraits> headers;
     Append(headers, "Accept: */*");
     Append(headers, "Cache-Control: no-cache");
     Append(headers, "Pragma: no-cache");
+    for (const std::string& line : extraHeaders) Append(headers, line.c_str());
 
     CURL* handle = curl.Get();
     curl_easy_setopt(handle, CURLOPT_URL, address.c_str());
@@ -116,6 +139,7 @@ HttpOutcome HttpGet(const std::string& address, HttpResponseSink& sink) {
     const CURLcode result = curl_easy_perform(handle);
     if (transfer.abandoned) return HttpOutcome::Abandoned;
     if (transfer.stopped) return HttpOutcome::Stopped;
+    if (transfer.stalled) return transfer.responded ? HttpOutcome::ReadFailed : HttpOutcome::NoResponse;
     if (!transfer.responded) {
         // Headers without a body piece: an empty body, or one that broke
         // off before its first byte.

@@ -59,19 +59,6 @@ void FlushToDisk(const std::string& path) {
 
 size_t DefaultStageOneWorkers() { return std::max(1u, std::thread::hardware_concurrency()); }
 
-const char* const kDeltaFileName = "diffTempFile.dz";
-const char* const kPreparedListName = "patchedfiles.lst";
-
-const std::vector<std::string>& WorkFileNames() {
-    static const std::vector<std::string> names{kDeltaFileName, kPreparedListName, "patchinfo.xml",
-                                                "patchinfo.xml.sig"};
-    return names;
-}
-
-bool IsUsableArchiveName(const std::string& name) {
-    return IsSafeItemPath(name, WorkFileNames()) && !StartsWithIgnoringCase(name, kDeltaFileName);
-}
-
 PatchApplier::PatchApplier(const PatchBatch& work, PatchInfoFile& description, PatchProgressFile& progress,
                            const StageServices& stageServices)
     : batch(work), patchInfo(description), progressFile(progress), services(stageServices) {

@@ -34,17 +34,6 @@ protected:
     ~IRetryQuestion() = default;
 };
 
-// The files the stages keep in a batch's patch folder besides the
-// archives: the delta being applied, and the list of what stage one
-// prepared. No archive may take their names, nor the description's.
-extern const char* const kDeltaFileName;
-extern const char* const kPreparedListName;
-const std::vector<std::string>& WorkFileNames();
-// Whether an archive may be called name: a plain relative name that is
-// none of the work files (nor a worker's delta, the delta's name with a
-// suffix).
-bool IsUsableArchiveName(const std::string& name);
-
 // The processor's cores: stage one's default number of workers.
 size_t DefaultStageOneWorkers();
 

@@ -6,6 +6,7 @@
 #include "base/file_operations.h"
 #include "base/item_path.h"
 #include "base/log.h"
+#include "base/record_names.h"
 #include "patch/patch_applier.h"
 #include "patch/patch_info_file.h"
 #include "patch/patch_progress_file.h"

@@ -7,8 +7,8 @@
 #include "base/file_stream.h"
 #include "base/path_kind.h"
 #include "base/paths.h"
+#include "base/record_names.h"
 #include "patch/checksum.h"
-#include "patch/patch_applier.h"
 
 // One line per file: size, checksum, the item's path, tab-separated (item
 // paths hold no control characters).

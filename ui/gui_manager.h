@@ -54,6 +54,7 @@ public:
     // The bar itself, 0..1000, for the version check's own animation.
     void SetProgressTotal(int32_t permille);
     void SetStatusText(const std::wstring& text);
+    std::wstring GetStatusText() const;
 
     // Returns once the player has answered a confirmation the window put
     // up, if one is open; the bar is repainted meanwhile.
@@ -78,7 +79,6 @@ private:
     // On the UI thread, when the player asks to leave through area: asks
     // for confirmation and, on Yes, cancels the run. True on Yes.
     bool ConfirmCancel(HitArea area);
-    std::wstring GetStatusText() const;
     void InvalidateProgress();
 
     std::unique_ptr<UiThread> ui;

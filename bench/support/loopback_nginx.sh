@@ -1,6 +1,7 @@
 # Sourced by the benchmarks that download. start_nginx WORK PROBE serves
 # WORK/www on a free loopback port and returns once PROBE (a path under it)
-# answers; sets port and nginx_pid, which the caller stops.
+# answers; sets port and nginx_pid, which the caller stops. nginx_extra, when
+# set, goes into the configuration's http block in place of "access_log off;".
 start_nginx() {
   local work=$1
   port=$(python3 -c 'import socket; s = socket.socket(); s.bind(("127.0.0.1", 0)); print(s.getsockname()[1])')
@@ -14,7 +15,7 @@ pid $work/nginx.pid;
 error_log $work/error.log warn;
 events { worker_connections 64; }
 http {
-  access_log off;
+  ${nginx_extra:-access_log off;}
   sendfile on;
   tcp_nopush on;
   client_body_temp_path $work/temp/body;

@@ -300,7 +300,9 @@ public:
                     info.GetVersion().empty() || info.GetVersion() == facts.interrupted.batch.version;
             }
             const UpdatePlan plan = PlanUpdate(facts, layout);
-            if (plan.road != Road::Resume) RemoveLeftovers(game, layout.patchFolder, layout.patchedFilesFolder);
+            if (plan.road != Road::Resume) {
+                RemoveLeftovers(game, layout.patchFolder, layout.patchedFilesFolder, plan.road != Road::UpToDate);
+            }
             if (plan.road == Road::Reinstall) {
                 RemoveFile(progress.GetRecordPath());
                 Install(plan.batch);

@@ -44,11 +44,14 @@ TEST(UpdateHistory, OneLineWithoutLeadingZerosEndedByCrLf) {
               "2011-3-7 9:5:2.40 http://host/patch_515195_2\r\n");
 }
 
+// Archives the downloader keeps for a later run stay until the clean-up is told otherwise.
 TEST(TemporaryFiles, GoWithTheWorkFolderButNothingElse) {
     TempFolder temp;
     const std::string work = temp / "tempPatch";
     WriteTree(work, TreeOf("patched/a/b.bin=x|patch0.lzma=|Patch1.LZMA=|patchinfo.xml=|diffTempFile.dz=|tmp_1=|"
-                           "keep.txt=mine"));
+                           "keep.txt=mine|download-records/Patch1.LZMA=record"));
+    CleanTemporaryFiles(work, PathJoin(work, "patched"), true);
+    EXPECT_EQ(ReadTree(work), TreeOf("Patch1.LZMA=|keep.txt=mine|download-records/Patch1.LZMA=record"));
     CleanTemporaryFiles(work, PathJoin(work, "patched"));
     EXPECT_EQ(ReadTree(work), TreeOf("keep.txt=mine"));
     RemoveFile(PathJoin(work, "keep.txt"));

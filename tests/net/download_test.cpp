@@ -10,6 +10,7 @@
 #include "base/file_operations.h"
 #include "base/paths.h"
 #include "net/http_downloader.h"
+#include "net/kept_download.h"
 #include "net/location.h"
 #include "net/md5.h"
 #include "net/sign_url.h"
@@ -47,6 +48,26 @@ protected:
         finished.push_back(path);
         server.Serve("/heals", {200, body});  // the next copy is sound
     }
+    void OnFileRetrying(const std::string&) override { ++retries; }
+    // An entry that declares body's size and SHA-256, or nothing.
+    DownloadEntry Entry(const std::string& location, bool declared) {
+        DownloadEntry entry(location, target);
+        entry.declaredSize = declared ? static_cast<int64_t>(body.size()) : -1;
+        entry.declaredSha256 = declared ? "8b194882fd4c9ac21acde9b27f7fcc891f2e2a65844ecea7eceea46fd3c19142" : "";
+        return entry;
+    }
+    // Fetches list to its end with the given retries, at once and stalls cut after a second; the last file's status.
+    DownloadStatus Fetch(const std::list<DownloadEntry>& list, int attempts, bool sign = false, bool stop = false) {
+        HttpDownloader downloader;
+        stopper = stop ? &downloader : nullptr;
+        downloader.SetStatusView(this);
+        downloader.SetRetryPolicy({attempts, 1ms, 1s});
+        downloader.Start(list, sign);
+        downloader.WaitForWorker();
+        archive = downloader.WaitForArchive(GetFileName(list.back().localPath));
+        stopper = nullptr;
+        return downloader.Entries().back().status;
+    }
 
     HttpTestServer server;
     TempFolder folder;
@@ -57,6 +78,8 @@ protected:
     HttpDownloader* stopper = nullptr;                   // asked to stop at the first report
     std::vector<std::pair<uint32_t, uint32_t>> reports;  // bytes done, of total
     std::vector<std::string> finished;
+    size_t retries = 0;
+    ArchiveState archive = ArchiveState::Failed;  // of the last file, as the applier would hear
 };
 
 // A file whose size and SHA-256 are declared arrives as declared or not at all: damaged, it is fetched once more, then
@@ -64,7 +87,6 @@ protected:
 TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStays) {
     std::string damaged = body;
     damaged[damaged.size() / 2] ^= 0x01;
-    WriteTextFile(folder / "damaged.bin", damaged);
     server.Serve("/sized", {200, body});
     server.Serve("/unsized", {200, body, false});
     server.Serve("/empty", {200, ""});
@@ -104,7 +126,7 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         {server.Url("/missing"), DownloadStatus::NotFound, old, 0, 0},
         {server.Url("/failing"), failed, old, 0, 0},
         {"http://127.0.0.1:" + std::to_string(closedPort) + "/a.bin", failed, old, 0, 0},
-        // A short body must not pass for a complete file.
+        // A short body must not pass for a complete file; one that breaks off at the same byte again is given up.
         {server.Url("/broken"), DownloadStatus::Pending, none, 0, 1},
         {server.Url("/slow"), cancelled, none, 0, 1, kStopped},
         {"file://" + source, copyReports ? cancelled : done, copyReports ? none : body, 0, 1, kStopped},
@@ -114,12 +136,10 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         {kPathSeparator == '/' ? "/" + source : "\\\\?\\" + source, done, body, 150000, 1},
         {"file://" + (folder / "missing.bin"), failed, old, 0, 1},
         {source, DownloadStatus::Unsupported, old, 0, 0},
-        {server.Url("/sized"), done, body, 0, 1, kDeclared},
         {server.Url("/damaged"), corrupt, none, 0, 2, kDeclared},
         {server.Url("/heals"), done, body, 0, 2, kDeclared},
         {server.Url("/appended-unsized"), failed, none, 0, 1, kDeclared},
         {server.Url("/short-unsized"), corrupt, none, 0, 2, kDeclared},
-        {"file://" + (folder / "damaged.bin"), corrupt, none, 0, 2, kDeclared},
     };
     for (const auto& item : cases) {
         SCOPED_TRACE(item.location);
@@ -127,19 +147,10 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         server.Serve("/heals", {200, damaged});
         reports.clear();
         finished.clear();
-        DownloadEntry entry(item.location, target);
-        if (item.how == kDeclared) {
-            entry.declaredSize = static_cast<int64_t>(body.size());
-            entry.declaredSha256 = "8b194882fd4c9ac21acde9b27f7fcc891f2e2a65844ecea7eceea46fd3c19142";  // of body
-        }
         SetServerClockOffset(item.serverClockOffset);
-        HttpDownloader downloader;
-        stopper = item.how == kStopped ? &downloader : nullptr;
-        downloader.SetStatusView(this);
-        downloader.Start({entry}, item.how == kSigned);
-        downloader.WaitForWorker();
-        EXPECT_EQ(downloader.Entries().front().status, item.status);
-        EXPECT_EQ(downloader.WaitForArchive("target.bin") == ArchiveState::Corrupt, item.status == corrupt);
+        EXPECT_EQ(Fetch({Entry(item.location, item.how == kDeclared)}, 2, item.how == kSigned, item.how == kStopped),
+                  item.status);
+        EXPECT_EQ(archive == ArchiveState::Corrupt, item.status == corrupt);
         const std::string left = PathExists(target) ? ReadTextFile(target) : none;
         EXPECT_TRUE(left == item.left) << left.size() << " bytes: " << left.substr(0, 20);
         EXPECT_EQ(finished, std::vector<std::string>(item.transfers, target));
@@ -155,6 +166,66 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
     downloader.Download("file://" + source, source, false);
     EXPECT_EQ(downloader.WaitForFile("source.bin"), failed);
     EXPECT_TRUE(ReadTextFile(source) == body);
+}
+
+// A declared file that an earlier run left: a part is continued only where the server proves it is the same file
+// (the range asked for, under the same validator), else fetched from its start; a complete one is checked, not
+// fetched; a transfer that breaks off or stalls is continued in the same run; nothing undeclared is kept.
+TEST_F(DownloadTest, AKeptFileIsContinuedOnlyWhereTheServerProvesIt) {
+    const size_t all = std::string::npos;
+    const struct {
+        const char* what;
+        bool complete, declared;  // the earlier run got 60000 bytes under the ETag "v1", or all of it
+        const char* etag;         // the next run's server, which may ignore ranges, stall at a cut, start ranges late
+        bool ranges, stall;
+        size_t cut, skew;
+        size_t requests, retries;  // of the next run
+        uint32_t from;             // its first progress report
+        std::string location{};    // of the next run; empty: the server's
+    } cases[] = {
+        {"continued", false, true, "\"v1\"", true, false, all, 0, 1, 0, 60000},
+        {"a server that ignores ranges", false, true, "\"v1\"", false, false, all, 0, 1, 0, 0},
+        {"a 206 from elsewhere", false, true, "\"v1\"", true, false, all, 1000, 2, 0, 0},
+        {"changed on the server", false, true, "\"v2\"", true, false, all, 0, 1, 0, 0},
+        {"complete", true, true, "\"v1\"", true, false, all, 0, 0, 0, 150000},
+        {"complete, damaged since", true, true, "\"v1\"", true, false, all, 0, 1, 0, 0},
+        {"not declared", false, false, "\"v1\"", true, false, all, 0, 1, 0, 0},
+        {"cut again", false, true, "\"v1\"", true, false, 50000, 0, 2, 1, 60000},
+        {"stalled", false, true, "\"v1\"", true, true, 80000, 0, 2, 1, 60000},
+        {"continued from a copy", false, true, "\"v1\"", true, false, all, 0, 0, 0, 60000, "file://" + source},
+    };
+    for (const auto& item : cases) {
+        SCOPED_TRACE(item.what);
+        RemoveFile(target);
+        std::list<DownloadEntry> list{Entry(server.Url("/kept"), item.declared)};
+        KeepDeclaredDownloads(list, folder.Path());
+        HttpTestResponse served{200, body, true, item.complete ? all : 60000};
+        served.etag = "\"v1\"";
+        server.Serve("/kept", served);
+        Fetch(list, 0);
+        if (item.what == std::string("complete, damaged since")) WriteTextFile(target, "x" + body.substr(1));
+        served = {200, body, true, item.cut};
+        std::tie(served.etag, served.ranges, served.rangeSkew, served.stallAtBreak) =
+            std::make_tuple(item.etag, item.ranges, item.skew, item.stall);
+        server.Serve("/kept", served);
+        if (!item.location.empty()) list.front().url = item.location;
+        KeepDeclaredDownloads(list, folder.Path());
+        const size_t before = server.Requests().size();
+        reports.clear();
+        retries = 0;
+        EXPECT_EQ(Fetch(list, 3), DownloadStatus::Done);
+        EXPECT_TRUE(ReadTextFile(target) == body);
+        const std::vector<std::string> requests = server.Requests();
+        ASSERT_EQ(requests.size() - before, item.requests);
+        const std::string head = item.requests != 0 ? requests[before] : "";
+        EXPECT_EQ(head.find("\r\nRange: bytes=60000-\r\n") != std::string::npos &&
+                      head.find("\r\nIf-Range: \"v1\"\r\n") != std::string::npos,
+                  item.requests != 0 && !item.complete && item.declared)
+            << head;
+        ASSERT_FALSE(reports.empty());
+        EXPECT_EQ(reports.front().first, item.from);
+        EXPECT_EQ(retries, item.retries);
+    }
 }
 
 TEST_F(DownloadTest, AListEndsAtTheFirstFailureAndOneRunsAtATimeUntilStoppedOrDestroyed) {

@@ -83,12 +83,27 @@ void HttpTestServer::Answer(const TestSocket& connection) {
           parts[4].str() == Md5Hex(kSharedSecret + Url(parts[1].str())))) {
         response = HttpTestResponse{403, "bad signature"};
     }
-    std::string reply = "HTTP/1.1 " + std::to_string(response.status) + " Test\r\nConnection: close\r\n";
+    static const std::regex range("\r\nRange: bytes=([0-9]{1,18})-\r\n"), ifRange("\r\nIf-Range: ([^\r]*)\r\n");
+    std::smatch asked, condition;
+    std::string headers = response.etag.empty() ? "" : "ETag: " + response.etag + "\r\n";
+    if (response.status == 200 && response.ranges && std::regex_search(head, asked, range) &&
+        (!std::regex_search(head, condition, ifRange) || condition[1].str() == response.etag)) {
+        const size_t from = std::stoull(asked[1].str()) + response.rangeSkew, size = response.body.size();
+        response.status = 206;
+        headers += "Content-Range: bytes " + std::to_string(from) + "-" + std::to_string(size - 1) + "/" +
+                   std::to_string(size) + "\r\n";
+        response.body.erase(0, std::min(from, size));
+    }
+    std::string reply = "HTTP/1.1 " + std::to_string(response.status) + " Test\r\nConnection: close\r\n" + headers;
     if (response.sendLength) reply += "Content-Length: " + std::to_string(response.body.size()) + "\r\n";
     reply += "\r\n" + response.body.substr(0, response.breakOffAfter);
     const size_t piece = response.pieceSize == 0 ? reply.size() : response.pieceSize;
     for (size_t sent = 0; sent < reply.size() && !stopping; sent += piece) {
         if (!connection.SendAll(reply.data() + sent, std::min(piece, reply.size() - sent))) return;
         std::this_thread::sleep_for(response.pause);
+    }
+    // The client's hang-up makes the connection readable.
+    while (response.stallAtBreak && response.breakOffAfter < response.body.size() && !stopping &&
+           !connection.Readable(kTickMs)) {
     }
 }

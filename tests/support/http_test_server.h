@@ -19,6 +19,12 @@ struct HttpTestResponse {
     size_t pieceSize = 0;                      // with a pause after each (0: all at once), so a stop lands mid-transfer
     std::chrono::milliseconds pause{0};
     bool requireSignature = false;  // answer 403 unless the address is signed
+    std::string etag{};             // sent as the ETag when not empty
+    // "Range: bytes=N-" gets 206 and the rest from N, unless If-Range names another ETag; a broken server's rest
+    // starts rangeSkew bytes later than asked.
+    bool ranges = true;
+    size_t rangeSkew = 0;
+    bool stallAtBreak = false;  // at breakOffAfter, hold the connection without a byte until the client hangs up
 };
 
 // An HTTP/1.1 server on 127.0.0.1 on a thread of the test program, so the same tests run natively and under Wine. One
