@@ -106,7 +106,8 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
     const auto cancelled = DownloadStatus::Cancelled;
     // Wine's CopyFileEx never reports progress, so a copy cannot be stopped there.
     const bool copyReports = PlatformCopyReportsProgress();
-    enum How { kPlain, kSigned, kStopped, kDeclared };  // stopped at the first progress report
+    // Stopped at the first progress report; capped: undeclared, and at most 1000 bytes taken.
+    enum How { kPlain, kSigned, kStopped, kDeclared, kCapped };
     const struct {
         std::string location;
         DownloadStatus status;
@@ -140,6 +141,12 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         {server.Url("/heals"), done, body, 0, 2, kDeclared},
         {server.Url("/appended-unsized"), failed, none, 0, 1, kDeclared},
         {server.Url("/short-unsized"), corrupt, none, 0, 2, kDeclared},
+        // A file nobody declared is capped on every transport: none of a larger one stays, and a size known in advance
+        // touches nothing.
+        {server.Url("/sized"), failed, old, 0, 0, kCapped},
+        {server.Url("/unsized"), failed, none, 0, 1, kCapped},
+        {"file://" + source, failed, old, 0, 1, kCapped},
+        {besideProgram + "\\a.bin", failed, old, 0, 1, kCapped},
     };
     for (const auto& item : cases) {
         SCOPED_TRACE(item.location);
@@ -148,8 +155,9 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
         reports.clear();
         finished.clear();
         SetServerClockOffset(item.serverClockOffset);
-        EXPECT_EQ(Fetch({Entry(item.location, item.how == kDeclared)}, 2, item.how == kSigned, item.how == kStopped),
-                  item.status);
+        DownloadEntry entry = Entry(item.location, item.how == kDeclared);
+        entry.sizeLimit = item.how == kCapped ? 1000 : -1;
+        EXPECT_EQ(Fetch({entry}, 2, item.how == kSigned, item.how == kStopped), item.status);
         EXPECT_EQ(archive == ArchiveState::Corrupt, item.status == corrupt);
         const std::string left = PathExists(target) ? ReadTextFile(target) : none;
         EXPECT_TRUE(left == item.left) << left.size() << " bytes: " << left.substr(0, 20);
