@@ -37,12 +37,16 @@ void InstallationRecords::RecordInstalledBatch(const PatchBatch& batch, PatchInf
         } catch (const Exception& error) {
             LOG_AS("Updater", Error) << "Unreadable uninstall record (" << error.message << "), kept as " << recordPath
                                      << ".bad";
-            MoveFileReplacing(recordPath, recordPath + ".bad");
+            if (!MoveFileReplacing(recordPath, recordPath + ".bad")) {
+                LOG_AS("Updater", Error) << "The unreadable uninstall record could not be kept aside.";
+            }
             record = newRecord(false);
         }
     }
     record->AddChanges(description, true);
     record->AddFile(PathJoin(folder, "UpdateHistory.log"));
-    record->Save();
+    // A courtesy to the game's uninstaller: the batch is never undone for
+    // it, and Save logs what went wrong.
+    static_cast<void>(record->Save());
     AppendUpdateHistory(folder, batch.location);
 }

@@ -11,7 +11,7 @@ class SingleInstance {
 public:
     // True when this process now holds the guard. A guard abandoned by a
     // crashed owner counts as held by another instance.
-    bool Acquire();
+    [[nodiscard]] bool Acquire();
     void Release() { guard.Reset(); }
 
 private:

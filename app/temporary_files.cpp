@@ -8,16 +8,16 @@
 #include "net/kept_download.h"
 
 void CleanTemporaryFiles(const std::string& patchDir, const std::string& patchedDir, bool keepDownloads) {
-    DeleteDirectory(patchedDir, true);
+    DiscardDirectory(patchedDir);
     if (patchDir.empty()) return;
-    if (!keepDownloads) DeleteDirectory(PathJoin(patchDir, kDownloadRecordsFolderName), true);
+    if (!keepDownloads) DiscardDirectory(PathJoin(patchDir, kDownloadRecordsFolderName));
     // The names the system wildcards "diff*.*", "patch*.*" and "tmp_*.*"
     // match: the dot is optional there, and Windows ignores letter case.
     for (const std::string& name : ListFileNames(patchDir)) {
         if (keepDownloads && IsKeptDownload(patchDir, name)) continue;
         for (const char* prefix : {"diff", "patch", "tmp_"}) {
             if (StartsWithIgnoringCase(name, prefix)) {
-                RemoveFile(PathJoin(patchDir, name));
+                DiscardFile(PathJoin(patchDir, name));
                 break;
             }
         }
@@ -25,7 +25,8 @@ void CleanTemporaryFiles(const std::string& patchDir, const std::string& patched
     // A write of the description or the prepared-files list cut short
     // leaves its replacement beside it.
     for (const std::string& name : WorkFileNames()) RemoveLeftoverReplacement(PathJoin(patchDir, name));
-    DeleteDirectory(patchDir, false);
+    // Only when it is empty by now: anything else in it is not ours.
+    static_cast<void>(DeleteDirectory(patchDir, false));
 }
 
 void RemoveLeftovers(const std::string& installDir, const std::string& patchDir, const std::string& patchedDir,

@@ -51,8 +51,9 @@ void Updater::RunUpdate() {
                 FetchBuildDescription(plan.batch, fetched, description);
                 // The build replaces every file, so no record of an earlier
                 // batch may be resumed over it.
-                RemoveFile(progressFile.GetRecordPath());
-                RemoveFile(progressFile.GetAlternativeRecordPath());
+                // (One that cannot go is replaced by the build's first record.)
+                DiscardFile(progressFile.GetRecordPath());
+                DiscardFile(progressFile.GetAlternativeRecordPath());
                 InstallBatch(plan.batch, fetched, description);
                 break;
             }

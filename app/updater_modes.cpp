@@ -32,7 +32,7 @@ int32_t Updater::RunComponentRemoval(const UpdaterArguments& args) {
     if (!FileExists(component)) return 1;
     RunProcess(PathJoin(folder, configuration.GetGameExecutable()),
                args.silent ? "-kdl_gl_remove -silent" : "-kdl_gl_remove", true);
-    if (args.deleteCorvid) RemoveFile(component);
+    if (args.deleteCorvid) DiscardFile(component);
     return 1;
 }
 
@@ -45,7 +45,7 @@ int32_t Updater::RunSettingsRemoval() {
     question.systemModal = true;
     if (ShowMessageBox(question) == MessageAnswer::Yes) {
         const std::string documents = GetDocumentsFolder();
-        if (!documents.empty()) DeleteDirectory(PathJoin(documents, "Ironvale"), true);
+        if (!documents.empty()) DiscardDirectory(PathJoin(documents, "Ironvale"));
     }
     return 1;
 }
@@ -55,9 +55,10 @@ int32_t Updater::RunUninstallCleanup() {
     registry.Locate(registryKeyPath, arguments.sid);
     const std::string folder = registry.GetInstallDir();
     if (folder.empty()) return 1;
-    RemoveFile(PathJoin(folder, "corvid.dll"));
-    RemoveFile(PathJoin(folder, "GL.ini"));
-    DeleteDirectory(PathJoin(folder, "pb"), true);
+    // What cannot go stays: the game's uninstaller goes on regardless.
+    DiscardFile(PathJoin(folder, "corvid.dll"));
+    DiscardFile(PathJoin(folder, "GL.ini"));
+    DiscardDirectory(PathJoin(folder, "pb"));
 
     // Nothing below needs the installation data: without it, the game's
     // uninstaller must still get every recorded file removed.
@@ -70,7 +71,7 @@ int32_t Updater::RunUninstallCleanup() {
     CleanTemporaryFiles(layout.patchFolder, layout.patchedFilesFolder);
     Uninstaller(PathJoin(folder, kUninstallRecordName)).Remove(folder);
     progressFile.SetDirectory(folder);
-    RemoveFile(progressFile.GetRecordPath());
-    RemoveFile(progressFile.GetAlternativeRecordPath());
+    DiscardFile(progressFile.GetRecordPath());
+    DiscardFile(progressFile.GetAlternativeRecordPath());
     return 1;
 }

@@ -17,8 +17,9 @@
 void Updater::InstallBatch(const PatchBatch& batch, const CheckedDescription& checked, PatchInfoFile& description) {
     LOG_AS("Updater", Info) << "Patch URL:" << batch.location;
     try {
-        MakeDirectories(batch.patchFolder);
-        MakeDirectories(batch.patchedFilesFolder);
+        if (!MakeDirectories(batch.patchFolder) || !MakeDirectories(batch.patchedFilesFolder)) {
+            throw Exception("Failed to create the work folder " + batch.patchedFilesFolder, ErrorCode::StepFailed);
+        }
         // The checked bytes, durable before stage two's first record: a
         // resume reads them back and checks them again.
         const std::string path = PathJoin(batch.patchFolder, configuration.GetPatchInfoFilename());
@@ -58,8 +59,11 @@ void Updater::ResumeBatch(const PatchBatch& batch, const ResumePoint& resumeAt, 
             // next pass finds the installation in change without one, which
             // the complete build finishes.
             LOG_AS("Updater", Error) << error.message << " Installing the complete build.";
-            RemoveFile(progressFile.GetAlternativeRecordPath());
-            RemoveFile(progressFile.GetRecordPath());
+            DiscardFile(progressFile.GetAlternativeRecordPath());
+            if (!RemoveFile(progressFile.GetRecordPath())) {
+                throw Exception("Failed to remove the progress record " + progressFile.GetRecordPath(),
+                                ErrorCode::StepFailed);
+            }
         } else {
             throw;
         }

@@ -55,14 +55,14 @@ std::string Updater::CheckLatestVersion() {
         firstVersionCheck = false;
     }
     if (!downloader.WaitForWorker() || downloader.Entries().front().status != DownloadStatus::Done) {
-        RemoveFile(temp);
+        DiscardFile(temp);
         quitRequested.ThrowIfCancelled("User cancelled during version check.");
         throw Exception("Failed to download latest version file.", ErrorCode::FileNotFound);
     }
     gui.SetProgressTotal(1000);
     std::string text;
     const bool read = ReadFileBytes(temp, kLatestVersionFileLimit, text);
-    RemoveFile(temp);
+    DiscardFile(temp);
     if (!read) throw Exception("Failed to open latest version file.", ErrorCode::FileNotFound);
     const std::string latest = FirstWord(text);
     if (latest.empty()) throw Exception("Failed to read latest version file.", ErrorCode::FileNotFound);
@@ -150,7 +150,7 @@ bool Updater::FetchBytes(const std::string& url, int64_t limit, bool signUrl, st
     downloader.Start({entry}, signUrl);
     const bool arrived = downloader.WaitForWorker() && downloader.Entries().front().status == DownloadStatus::Done &&
                          ReadFileBytes(temp, limit, bytes);
-    RemoveFile(temp);
+    DiscardFile(temp);
     quitRequested.ThrowIfCancelled("User cancelled while fetching the patch description.");
     return arrived;
 }

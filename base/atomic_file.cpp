@@ -21,7 +21,7 @@ bool ReplaceFileAtomically(const std::string& path, const std::string& content) 
     return ReplaceFileAtomically(path, content, TemporaryFor(path));
 }
 
-void RemoveLeftoverReplacement(const std::string& path) { RemoveFile(TemporaryFor(path)); }
+void RemoveLeftoverReplacement(const std::string& path) { DiscardFile(TemporaryFor(path)); }
 
 bool ReplaceFileAtomically(const std::string& path, const std::string& content, const std::string& temporaryPath) {
     try {
@@ -35,11 +35,11 @@ bool ReplaceFileAtomically(const std::string& path, const std::string& content, 
         file.Flush();
         file.Close();
     } catch (const Exception&) {
-        RemoveFile(temporaryPath);
+        DiscardFile(temporaryPath);
         return false;
     }
     if (!MoveFileReplacing(temporaryPath, path)) {
-        RemoveFile(temporaryPath);
+        DiscardFile(temporaryPath);
         return false;
     }
     SyncFolder(GetParentDirectory(path));

@@ -7,7 +7,7 @@
 // the content goes to a temporary file in the same folder, is flushed to
 // disk, and then takes the old file's place in one rename. Returns false
 // (leaving the old file as it was) when any step fails.
-bool ReplaceFileAtomically(const std::string& path, const std::string& content);
+[[nodiscard]] bool ReplaceFileAtomically(const std::string& path, const std::string& content);
 
 // A replacement cut short (a crash, a power cut) leaves its temporary file
 // beside path; this removes it.
@@ -15,4 +15,5 @@ void RemoveLeftoverReplacement(const std::string& path);
 
 // The same with the temporary name chosen by the caller (it must lie in the
 // same folder as path).
-bool ReplaceFileAtomically(const std::string& path, const std::string& content, const std::string& temporaryPath);
+[[nodiscard]] bool ReplaceFileAtomically(const std::string& path, const std::string& content,
+                                         const std::string& temporaryPath);

@@ -10,25 +10,25 @@
 // True when a file or folder exists at path.
 bool FileExists(const std::string& path);
 // Deletes one file (not a folder).
-bool RemoveFile(const std::string& path);
+[[nodiscard]] bool RemoveFile(const std::string& path);
 // Renames a file; fails when something already exists at the new path.
-bool RenameFile(const std::string& from, const std::string& to);
+[[nodiscard]] bool RenameFile(const std::string& from, const std::string& to);
 // Moves a file over whatever is at the new path. On Windows the move is
 // written through to the disk before it returns; on POSIX call SyncFolder
 // on the destination folder to make it durable.
-bool MoveFileReplacing(const std::string& from, const std::string& to);
+[[nodiscard]] bool MoveFileReplacing(const std::string& from, const std::string& to);
 // Makes the entries of a folder (renames, new files) durable. Nothing to do
 // on Windows, where moves are written through.
 void SyncFolder(const std::string& folder);
 // Removes a folder: only an empty one, or with everything in it. A link
 // (a symbolic link, a junction) is removed itself and never entered, at
 // path or anywhere below it.
-bool DeleteDirectory(const std::string& path, bool recursive);
+[[nodiscard]] bool DeleteDirectory(const std::string& path, bool recursive);
 // Creates a folder with every missing parent; true when it exists afterwards.
-bool MakeDirectories(const std::string& path);
+[[nodiscard]] bool MakeDirectories(const std::string& path);
 // The bytes the calling user may still write on the volume of folder;
 // false when the system cannot tell.
-bool GetFreeDiskSpace(const std::string& folder, int64_t& bytes);
+[[nodiscard]] bool GetFreeDiskSpace(const std::string& folder, int64_t& bytes);
 // The names of the files (not folders) directly in folder; empty when it
 // cannot be listed.
 std::vector<std::string> ListFileNames(const std::string& folder);
@@ -36,3 +36,9 @@ std::vector<std::string> ListFileNames(const std::string& folder);
 // first, then everything below each subfolder, in the order the file system
 // lists them. A folder that cannot be listed adds nothing.
 void CollectFiles(const std::string& folder, std::vector<std::string>& list);
+
+// For what only takes room (a temporary file, a leftover of an earlier
+// run): removed when possible. A failure leaves it for a later clean-up,
+// and nothing depends on it being gone.
+inline void DiscardFile(const std::string& path) { static_cast<void>(RemoveFile(path)); }
+inline void DiscardDirectory(const std::string& path) { static_cast<void>(DeleteDirectory(path, true)); }

@@ -54,7 +54,7 @@ private:
 // Reads the whole file at path into bytes, once: what is read is what the
 // caller checks and uses. False when it cannot be read or holds more than
 // limit bytes (then nothing of it is read).
-bool ReadFileBytes(const std::string& path, int64_t limit, std::string& bytes);
+[[nodiscard]] bool ReadFileBytes(const std::string& path, int64_t limit, std::string& bytes);
 
 // The length in bytes of the file at path; -1 when it cannot be opened.
 int64_t GetFileLength(const std::string& path);

@@ -37,13 +37,14 @@ namespace Log {
 void Open(const std::string& name) {
     if (LogFile::IsOpen()) return;
     const std::string folder = GetTempDirectory();
-    MakeDirectories(folder);
+    if (!MakeDirectories(folder)) return;
     const std::string path = PathJoin(folder, name);
     if (!LogFile::Open(path, false)) return;
     int64_t size = 0;
     if (LogFile::Size(size) && size > kMaximumLogSize) {
         LogFile::Close();
-        LogFile::Open(path, true);
+        // Not reopened: the run goes on without a log.
+        static_cast<void>(LogFile::Open(path, true));
     }
 }
 

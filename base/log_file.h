@@ -7,11 +7,11 @@
 namespace LogFile {
 // Opens path for writing, exclusively, creating it when missing; with
 // truncate set any old contents are discarded. Returns false on failure.
-bool Open(const std::string& path, bool truncate);
+[[nodiscard]] bool Open(const std::string& path, bool truncate);
 void Close();
 bool IsOpen();
 // Size of the open file; false when it cannot be read.
-bool Size(int64_t& size);
+[[nodiscard]] bool Size(int64_t& size);
 // Appends the bytes at the end of the file with one write call.
 void Append(const std::string& bytes);
 }  // namespace LogFile

@@ -30,10 +30,10 @@ extern const char kXmlLineBreak[];
 // as the start of a multi-byte character. False when the text is too
 // deep or has too many nodes, holds a NUL, does not parse or has no root
 // element.
-bool ParseXml(std::string text, TiXmlDocument& document);
+[[nodiscard]] bool ParseXml(std::string text, TiXmlDocument& document);
 // Reads and parses a file; false on any failure (missing, unreadable, too
 // large, or as ParseXml).
-bool LoadXmlFile(const std::string& path, TiXmlDocument& document);
+[[nodiscard]] bool LoadXmlFile(const std::string& path, TiXmlDocument& document);
 
 // The document as TinyXML prints it: four spaces per level, one element
 // per line, an element with one text child on one line.
@@ -41,7 +41,8 @@ std::string PrintXml(const TiXmlDocument& document);
 // Replaces the file at path with the printed document atomically (through
 // temporaryPath when given, else a temporary name beside it). A failure
 // is logged at Error level and leaves the old file untouched.
-bool SaveXmlFile(const TiXmlDocument& document, const std::string& path, const std::string& temporaryPath = "");
+[[nodiscard]] bool SaveXmlFile(const TiXmlDocument& document, const std::string& path,
+                               const std::string& temporaryPath = "");
 
 // The text of the first child element called name, when that element
 // exists and its first node is text; false otherwise.

@@ -51,7 +51,7 @@ TransferResult FileCopyTransfer(const DownloadEntry& entry, KeptDownload& kept, 
         result.interrupted = !stopped && !tooLarge;
         if (tooLarge && kept.Allowed()) kept.Forget();
     } else if (!Fits(localPath, sizeLimit)) {
-        RemoveFile(localPath);
+        DiscardFile(localPath);
         result.status = DownloadStatus::Failed;
     }
     if (result.status == DownloadStatus::Failed) LOG(Error) << "Undefined error while downloading. URL: " << entry.url;

@@ -24,11 +24,12 @@ using CopyProgress = std::function<bool(uint64_t done, uint64_t total)>;
 // The platform's file copy: source over destination, progress after every
 // piece. False when the copy failed or was cancelled; it then leaves no
 // partial destination behind.
-bool CopyFileWithProgress(const std::string& source, const std::string& destination, const CopyProgress& progress);
+[[nodiscard]] bool CopyFileWithProgress(const std::string& source, const std::string& destination,
+                                        const CopyProgress& progress);
 
 // Copies source from offset on into destination at the same offset, in
 // pieces, with progress counted from the start of the file. A copy that
 // fails or is cancelled leaves what it copied when keepPart is set, else no
 // destination at all.
-bool CopyFileFrom(const std::string& source, const std::string& destination, uint64_t offset,
-                  const CopyProgress& progress, bool keepPart);
+[[nodiscard]] bool CopyFileFrom(const std::string& source, const std::string& destination, uint64_t offset,
+                                const CopyProgress& progress, bool keepPart);

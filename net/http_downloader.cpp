@@ -226,7 +226,7 @@ DownloadStatus HttpDownloader::Check(const DownloadEntry& entry) {
     // the real thing. One that may be kept stays when a stop cut its check
     // short.
     if (status == DownloadStatus::Corrupt || (status != DownloadStatus::Done && entry.recordPath.empty())) {
-        RemoveFile(entry.localPath);
+        DiscardFile(entry.localPath);
     }
     return status;
 }

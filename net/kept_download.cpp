@@ -54,14 +54,15 @@ bool KeptDownload::Begin(const std::string& newValidator) {
     offset = 0;
     validator = newValidator;
     if (!allowed) return false;
-    MakeDirectories(GetParentDirectory(entry.recordPath));
-    allowed = ReplaceFileAtomically(entry.recordPath, RecordHead(entry) + validator + "\n");
+    allowed = MakeDirectories(GetParentDirectory(entry.recordPath)) &&
+              ReplaceFileAtomically(entry.recordPath, RecordHead(entry) + validator + "\n");
     return allowed;
 }
 
 void KeptDownload::Forget() {
-    RemoveFile(entry.localPath);
-    if (!entry.recordPath.empty()) RemoveFile(entry.recordPath);
+    // What stays without its record is never taken for a kept archive.
+    DiscardFile(entry.localPath);
+    if (!entry.recordPath.empty()) DiscardFile(entry.recordPath);
     length = -1;
     offset = 0;
     validator.clear();
@@ -85,8 +86,8 @@ void KeepDeclaredDownloads(std::list<DownloadEntry>& list, const std::string& fo
         const auto entry = wanted.find(name);
         std::string validator;
         if (entry != wanted.end() && ReadRecord(*entry->second, validator)) continue;
-        RemoveFile(PathJoin(folder, name));
-        RemoveFile(record);
+        DiscardFile(PathJoin(folder, name));
+        DiscardFile(record);
     }
 }
 

@@ -36,5 +36,5 @@ std::string HexDigits(const uint8_t* bytes, size_t count);
 // Hashes the file at path and reports its length in bytes. False when the
 // file cannot be read, or when stop (may be null) was cancelled before the
 // end (a large archive takes seconds).
-bool Sha256OfFile(const std::string& path, Sha256Digest& digest, int64_t& length,
-                  const CancellationToken* stop = nullptr);
+[[nodiscard]] bool Sha256OfFile(const std::string& path, Sha256Digest& digest, int64_t& length,
+                                const CancellationToken* stop = nullptr);

@@ -315,7 +315,9 @@ void PatchApplier::PrepareDiffFile(const std::string& path, const std::string& a
     PatchArchive(PathJoin(batch.patchFolder, archive)).DecodeFile(path, deltaPath, cancel, budget);
     if (IsCancelled(cancel)) throw Exception("", ErrorCode::UserCancelled);
     const std::string folder = PathJoin(batch.patchedFilesFolder, GetParentDirectory(path));
-    if (!FileExists(folder)) MakeDirectories(folder);
+    if (!FileExists(folder) && !MakeDirectories(folder)) {
+        throw Exception("Failed to create " + folder, ErrorCode::StepFailed);
+    }
 
     const std::string sourcePath = PathJoin(batch.installationFolder, path);
     try {
@@ -338,13 +340,15 @@ void PatchApplier::PrepareDiffFile(const std::string& path, const std::string& a
             "Failed to apply delta file " + deltaPath + " on " + sourcePath + ". Source message: " + error.message,
             ErrorCode::DeltaFailed);
     }
-    RemoveFile(deltaPath);
+    DiscardFile(deltaPath);
 }
 
 void PatchApplier::PrepareNewFile(const std::string& path, const std::string& archive, const CancellationToken* cancel,
                                   MemoryBudget* budget) {
     const std::string folder = PathJoin(batch.patchedFilesFolder, GetParentDirectory(path));
-    if (!FileExists(folder)) MakeDirectories(folder);
+    if (!FileExists(folder) && !MakeDirectories(folder)) {
+        throw Exception("Failed to create " + folder, ErrorCode::StepFailed);
+    }
     const std::string target = PathJoin(batch.patchedFilesFolder, path);
     PatchArchive(PathJoin(batch.patchFolder, archive)).DecodeFile(path, target, cancel, budget);
     FlushToDisk(target);

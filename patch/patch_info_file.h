@@ -72,10 +72,11 @@ public:
     // then the hive and registry path. Throws "Hive not supported" for a
     // hive outside the three; a failed write is logged and returns false,
     // leaving any earlier file intact.
-    static bool Save(const std::string& path, const std::vector<std::string>& files,
-                     const std::vector<std::string>& directories, const std::vector<std::string>& registryKeys,
-                     const std::vector<std::string>& registryGroups, RegistryHive hive,
-                     const std::string& registryPath);
+    [[nodiscard]] static bool Save(const std::string& path, const std::vector<std::string>& files,
+                                   const std::vector<std::string>& directories,
+                                   const std::vector<std::string>& registryKeys,
+                                   const std::vector<std::string>& registryGroups, RegistryHive hive,
+                                   const std::string& registryPath);
 
     // "HKEY_LOCAL_MACHINE", "HKEY_CURRENT_USER", "HKEY_USERS", exactly.
     static RegistryHive ParseHive(const std::string& text);

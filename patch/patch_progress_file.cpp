@@ -79,20 +79,23 @@ bool PatchProgressFile::Recover() {
             // A "_PPF.xml" beside a readable record is a write that did not
             // reach its rename: the record it would have replaced is older
             // but names an action that is safe to repeat.
-            if (alternativeExists) RemoveFile(alternativeRecordPath);
+            // One that cannot go is replaced by the next record written.
+            if (alternativeExists) DiscardFile(alternativeRecordPath);
             return true;
         }
         LOG(Error) << "Unreadable patch progress record: " << recordPath;
-        RemoveFile(recordPath);
+        DiscardFile(recordPath);
         if (!alternativeExists) throw unrecoverable;
     }
     if (alternativeExists) {
         if (!TryLoad(alternativeRecordPath)) {
             LOG(Error) << "Unreadable patch progress record: " << alternativeRecordPath;
-            RemoveFile(alternativeRecordPath);
+            DiscardFile(alternativeRecordPath);
             throw unrecoverable;
         }
-        RenameFile(alternativeRecordPath, recordPath);
+        // Loaded either way; a spare left where it is (the unreadable record
+        // would not go) is replaced by stage two's next record.
+        static_cast<void>(RenameFile(alternativeRecordPath, recordPath));
         return true;
     }
     return false;

@@ -29,7 +29,7 @@ public:
     // Writes the fields to "_PPF.xml", flushes it and renames it over
     // "PPF.xml", so a crash at any moment leaves one complete record.
     // A failure is logged at Error level and returns false.
-    bool WriteRecord();
+    [[nodiscard]] bool WriteRecord();
 
     std::string GetRecordPath() const { return recordPath; }
     std::string GetAlternativeRecordPath() const { return alternativeRecordPath; }

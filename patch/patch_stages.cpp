@@ -62,8 +62,10 @@ void PatchStages::Apply(IInstallationRecords* records, const std::optional<Resum
     if (records != nullptr) records->RecordInstalledBatch(work, info);
     if (records != nullptr) records->StoreVersion(work.version);
     // The spare copy first: found alone, it would be taken for the record.
-    RemoveFile(progressFile.GetAlternativeRecordPath());
-    RemoveFile(progressFile.GetRecordPath());
+    // One that cannot go is a leftover beside a settled version, which the
+    // next start removes.
+    DiscardFile(progressFile.GetAlternativeRecordPath());
+    DiscardFile(progressFile.GetRecordPath());
 }
 
 InterruptedBatch FindInterruptedBatch(const std::string& installedVersion, PatchProgressFile& progress) {
@@ -76,7 +78,7 @@ InterruptedBatch FindInterruptedBatch(const std::string& installedVersion, Patch
         for (const std::string& record : {progress.GetAlternativeRecordPath(), progress.GetRecordPath()}) {
             if (FileExists(record)) {
                 LOG(Info) << "Removing the leftover progress record " << record;
-                RemoveFile(record);
+                DiscardFile(record);
             }
         }
         return found;

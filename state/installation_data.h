@@ -22,7 +22,7 @@ public:
     void Load(const std::string& folder);
     // Replaces the record atomically. A failure is logged at Error level
     // and returns false; the old record then stays as it was.
-    bool Save() const;
+    [[nodiscard]] bool Save() const;
     // Stores the number as a default-formatted stream writes it (3 -> "3").
     void SetPatcherVersion(float number);
 

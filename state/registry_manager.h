@@ -45,10 +45,11 @@ private:
 namespace RegistryPlatform {
 // The value's raw data. False when the key cannot be opened for reading or
 // the value is missing or empty.
-bool QueryValue(RegistryHive hive, const std::string& keyPath, const std::string& valueName, std::string& data);
+[[nodiscard]] bool QueryValue(RegistryHive hive, const std::string& keyPath, const std::string& valueName,
+                              std::string& data);
 // Creates the key with its missing parents; true when it exists afterwards.
-bool CreateKey(RegistryHive hive, const std::string& keyPath);
+[[nodiscard]] bool CreateKey(RegistryHive hive, const std::string& keyPath);
 // Stores text plus its terminating zero as REG_SZ in an existing key.
-bool SetStringValue(RegistryHive hive, const std::string& keyPath, const std::string& valueName,
-                    const std::string& text);
+[[nodiscard]] bool SetStringValue(RegistryHive hive, const std::string& keyPath, const std::string& valueName,
+                                  const std::string& text);
 }  // namespace RegistryPlatform

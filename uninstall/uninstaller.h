@@ -42,7 +42,7 @@ public:
     void AddFile(const std::string& path);
     // Writes the record. Throws "Hive not supported" while the hive is not
     // known; a failed write is logged and returns false.
-    bool Save() const;
+    [[nodiscard]] bool Save() const;
     // Deletes the listed files, then removes the listed directories that
     // are empty by then, deepest first. Only what lies inside installDir is
     // touched; what cannot go is remembered and skipped. Registry entries

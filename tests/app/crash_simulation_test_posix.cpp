@@ -250,7 +250,7 @@ public:
     void Install(const PatchBatch& batch, const std::optional<ResumePoint>& resumeAt = std::nullopt) {
         const std::string description = ReadTextFile(PathJoin(batch.location, "patchinfo.xml"));
         if (!resumeAt) {
-            MakeDirectories(batch.patchedFilesFolder);
+            EXPECT_TRUE(MakeDirectories(batch.patchedFilesFolder));
             ASSERT_TRUE(ReplaceFileAtomically(PathJoin(batch.patchFolder, "patchinfo.xml"), description));
         }
         PatchInfoFile info;
@@ -304,7 +304,7 @@ public:
                 RemoveLeftovers(game, layout.patchFolder, layout.patchedFilesFolder, plan.road != Road::UpToDate);
             }
             if (plan.road == Road::Reinstall) {
-                RemoveFile(progress.GetRecordPath());
+                DiscardFile(progress.GetRecordPath());
                 Install(plan.batch);
             }
             if (plan.road != Road::Resume) return;
@@ -312,7 +312,7 @@ public:
                 Install(plan.batch, plan.resumeAt);
             } catch (const Exception& error) {
                 if (error.Code() != ErrorCode::ReinstallRequired) throw;
-                RemoveFile(progress.GetRecordPath());  // the next pass installs the complete build
+                EXPECT_TRUE(RemoveFile(progress.GetRecordPath()));  // the next pass installs the complete build
             }
         }
     }

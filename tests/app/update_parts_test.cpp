@@ -54,7 +54,7 @@ TEST(TemporaryFiles, GoWithTheWorkFolderButNothingElse) {
     EXPECT_EQ(ReadTree(work), TreeOf("Patch1.LZMA=|keep.txt=mine|download-records/Patch1.LZMA=record"));
     CleanTemporaryFiles(work, PathJoin(work, "patched"));
     EXPECT_EQ(ReadTree(work), TreeOf("keep.txt=mine"));
-    RemoveFile(PathJoin(work, "keep.txt"));
+    EXPECT_TRUE(RemoveFile(PathJoin(work, "keep.txt")));
     CleanTemporaryFiles(work, PathJoin(work, "patched"));
     EXPECT_FALSE(FileExists(work));
 }

@@ -47,8 +47,8 @@ protected:
     void SetUp() override {
         setenv("IRONVALE_REGISTRY_ROOT", (temp / "registry").c_str(), 1);
         setenv("IRONVALE_TEST_UPDATE_LOCATION", server.Url("/").c_str(), 1);
-        MakeDirectories(temp / "tmp");
-        MakeDirectories(temp / "server");
+        EXPECT_TRUE(MakeDirectories(temp / "tmp"));
+        EXPECT_TRUE(MakeDirectories(temp / "server"));
         server.ServeFolder("/", temp / "server", {});
         const RegistryManager game(RegistryHive::LocalMachine, "SOFTWARE\\Halvard\\Ironvale");
         game.SetInstallDir(install);
@@ -59,7 +59,7 @@ protected:
     }
 
     void Install(const Tree& tree, const std::string& version) {
-        DeleteDirectory(install, true);
+        DiscardDirectory(install);
         WriteTree(install, tree);
         chmod(PathJoin(install, "IronvaleGame.exe").c_str(), 0755);
         SetVersion(version);
@@ -96,8 +96,8 @@ protected:
         options.fromVersion.clear();
         BuildPatch(options);
         WriteTextFile(temp / "server/version.txt", "  " + version + " and more words\n");
-        DeleteDirectory(temp / "old", true);
-        DeleteDirectory(temp / "new", true);
+        DiscardDirectory(temp / "old");
+        DiscardDirectory(temp / "new");
         published = to;
         return patch;
     }
@@ -167,7 +167,7 @@ TEST_F(UpdateRun, PatchesToTheLatestVersionAndStartsTheGame) {
     WriteTextFile(PathJoin(install, "Uninstall.xml"), "unreadable");
     Run("y\ny\n");
     EXPECT_EQ(ReadTextFile(PathJoin(install, "Uninstall.xml.bad")), "unreadable");  // kept aside, and a new one begun
-    RemoveFile(PathJoin(install, "Uninstall.xml.bad"));
+    EXPECT_TRUE(RemoveFile(PathJoin(install, "Uninstall.xml.bad")));
     EXPECT_EQ(Game(), Version(2));
     EXPECT_EQ(InstalledVersion(), "2");
     ExpectNoLeftovers();
@@ -215,7 +215,7 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
     const auto changed = [&](bool build) {
         Publish(Version(1), rebuilt, "2", nullptr);
         Install(modded, "1");
-        if (!build) DeleteDirectory(temp / "server/build_2", true);
+        if (!build) DiscardDirectory(temp / "server/build_2");
     };
     const std::string corrupt = "The game data is corrupt.";
     const struct {
@@ -240,7 +240,7 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
         {"missing, play", nullptr, "5", "y\ny\n", "play the installed version instead", "1", true, false, 0},
         {"missing, quit", nullptr, "5", "y\nn\n", "play the installed version instead", "1", false, false, 0},
         // What arrived before the missing archive is kept for the next start.
-        {"an archive missing", [&] { RemoveFile(PathJoin(patch, "patch1.lzma")); }, "2", "y\nn\n",
+        {"an archive missing", [&] { EXPECT_TRUE(RemoveFile(PathJoin(patch, "patch1.lzma"))); }, "2", "y\nn\n",
          "could not be downloaded", "1", false, false, 2, "served_updater", true},
         {"no room", replace("<SpaceRequirement>\\d+", "<SpaceRequirement>9000000000000000000"), "2", "y\n",
          "9000000000000 MB of free space is required.", "1", false, false, 0},
@@ -268,8 +268,8 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
          "keyed_updater"},
         {"keyed, signed by another key", [&] { SignPatchDescription(patch, other); }, "2", "y\n", corrupt, "1", false,
          false, 0, "keyed_updater"},
-        {"keyed, unsigned", [&] { RemoveFile(PathJoin(patch, kDescriptionSignatureName)); }, "2", "y\n", corrupt, "1",
-         false, false, 0, "keyed_updater"},
+        {"keyed, unsigned", [&] { EXPECT_TRUE(RemoveFile(PathJoin(patch, kDescriptionSignatureName))); }, "2", "y\n",
+         corrupt, "1", false, false, 0, "keyed_updater"},
         {"keyed, the signed description of version 3 replayed for 2",
          [&] {
              for (const char* name : {"patchinfo.xml", kDescriptionSignatureName}) {
@@ -281,13 +281,13 @@ TEST_F(UpdateRun, EndsAsThePlayerTheServerAndThePublisherDecide) {
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         tmp = temp / "tmp";
-        DeleteDirectory(temp / "server", true);
+        DiscardDirectory(temp / "server");
         Publish(Version(1), Version(2), "2", &signer);
         Install(Version(1), "1");
         if (c.prepare) c.prepare();
         const Tree before = Game();
         const std::string versionBefore = InstalledVersion();
-        RemoveFile(temp / "tmp/started.txt");
+        DiscardFile(temp / "tmp/started.txt");
         const size_t requests = server.Requests().size();
         const std::string output = Run(c.answers, {"-latestVersion", c.latest}, c.program);
         EXPECT_NE(output.find(c.shown), std::string::npos) << output;
@@ -334,10 +334,10 @@ TEST_F(UpdateRun, ResumesAnInterruptedPatchOnlyFromItsOwnCheckedState) {
         {"the description changed since it was checked",
          [&] { Edit(PathJoin(install, "tempPatch/patchinfo.xml"), [](std::string& t) { t += "<!-- -->"; }); },
          "keyed_updater", false},
-        {"an unsigned description", [&] { RemoveFile(PathJoin(install, "tempPatch/patchinfo.xml.sig")); },
+        {"an unsigned description", [&] { EXPECT_TRUE(RemoveFile(PathJoin(install, "tempPatch/patchinfo.xml.sig"))); },
          "keyed_updater", false},
         // No move has run yet: prepared again from the archives kept in the work folder, then resumed.
-        {"the prepared files lost", [&] { DeleteDirectory(PathJoin(install, "tempPatch/patched"), true); },
+        {"the prepared files lost", [&] { EXPECT_TRUE(DeleteDirectory(PathJoin(install, "tempPatch/patched"), true)); },
          "served_updater", true},
     };
     Publish(Version(1), Version(2), "2", &signer);
@@ -378,7 +378,7 @@ TEST_F(UpdateRun, ResumesAnInterruptedPatchOnlyFromItsOwnCheckedState) {
 // refusal's box and log line, and the start without a game, are checked under Wine.)
 TEST_F(UpdateRun, KeepsASecondCopyOutButNotTheElevatedOne) {
     const std::string updater = IRONVALE_BINARY_DIR "/IronvaleUpdater";
-    DeleteDirectory(temp / "registry/HKEY_LOCAL_MACHINE/SOFTWARE/Halvard", true);
+    DiscardDirectory(temp / "registry/HKEY_LOCAL_MACHINE/SOFTWARE/Halvard");
     const int guard = open((temp / "tmp/IronvaleUpdater.lock").c_str(), O_RDWR | O_CREAT | O_CLOEXEC, 0644);
     ASSERT_EQ(flock(guard, LOCK_EX | LOCK_NB), 0);
     EXPECT_EQ(Start("", {"-hostname", "test host"}, updater).Wait(), 255);
@@ -387,7 +387,7 @@ TEST_F(UpdateRun, KeepsASecondCopyOutButNotTheElevatedOne) {
     // The fixed names in the shared temporary folder are never opened through a link someone put there.
     WriteTextFile(temp / "victim.txt", "another user's");
     for (const char* name : {"IronvaleUpdater.log", "IronvaleUpdater.lock"}) {
-        RemoveFile(PathJoin(temp / "tmp", name));
+        DiscardFile(PathJoin(temp / "tmp", name));
         ASSERT_EQ(symlink((temp / "victim.txt").c_str(), PathJoin(temp / "tmp", name).c_str()), 0);
     }
     Start("", {}, updater).Wait();
@@ -434,7 +434,7 @@ TEST_F(UpdateRun, TakesOnlyAConfirmedLatestVersionAndNeverGoesBack) {
     WriteTextFile(log, "");
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
-        DeleteDirectory(temp / "server", true);
+        DiscardDirectory(temp / "server");
         Publish(Version(1), Version(2), "2", c.key);
         Install(Version(1), "1");
         game.WriteString("Latest Version Serial", "100");
@@ -443,7 +443,7 @@ TEST_F(UpdateRun, TakesOnlyAConfirmedLatestVersionAndNeverGoesBack) {
         }
         if (c.prepare) c.prepare();
         const Tree before = Game();
-        RemoveFile(temp / "tmp/started.txt");
+        DiscardFile(temp / "tmp/started.txt");
         const size_t logged = ReadTextFile(log).size();
         std::string output = Run(c.answers, {"-serverDeltaTime", "7200"}, c.program);
         output += ReadTextFile(log).substr(logged);

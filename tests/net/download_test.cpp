@@ -38,7 +38,7 @@ protected:
         // Takes seconds to send, so a stop lands mid-transfer; a stop that is ignored shows as Done (and a slow test).
         server.Serve("/slow", {200, TestBytes(2000000), true, std::string::npos, 1000, 5ms});
     }
-    ~DownloadTest() override { DeleteDirectory(PathJoin(GetProgramFolder(), besideProgram), true); }
+    ~DownloadTest() override { DiscardDirectory(PathJoin(GetProgramFolder(), besideProgram)); }
     void OnApplyProgress(const std::string&, int32_t) override {}
     void OnFileProgress(const std::string&, uint32_t done, uint32_t total) override {
         reports.emplace_back(done, total);
@@ -99,7 +99,7 @@ TEST_F(DownloadTest, EachLocationAndAnswerGivesItsStatusAndOnlyACompleteFileStay
     server.Serve("/short-unsized", {200, body.substr(1), false});
     uint16_t closedPort = 0;
     TestSocket::ListenOnLoopback(closedPort).Close();
-    MakeDirectories(PathJoin(GetProgramFolder(), besideProgram));
+    EXPECT_TRUE(MakeDirectories(PathJoin(GetProgramFolder(), besideProgram)));
     WriteTextFile(PathJoin(GetProgramFolder(), besideProgram + "/a.bin"), body);
     const std::string old = "old", none = "(no file)";
     const auto done = DownloadStatus::Done, failed = DownloadStatus::Failed, corrupt = DownloadStatus::Corrupt;
@@ -204,7 +204,7 @@ TEST_F(DownloadTest, AKeptFileIsContinuedOnlyWhereTheServerProvesIt) {
     };
     for (const auto& item : cases) {
         SCOPED_TRACE(item.what);
-        RemoveFile(target);
+        DiscardFile(target);
         std::list<DownloadEntry> list{Entry(server.Url("/kept"), item.declared)};
         KeepDeclaredDownloads(list, folder.Path());
         HttpTestResponse served{200, body, true, item.complete ? all : 60000};

@@ -38,8 +38,8 @@ TEST(StageOne, EndsEarlyWithAClearErrorAndTheInstallationUntouched) {
         {[](BatchRun& run) { run.state = ArchiveState::Failed; }, ErrorCode::FileNotFound,
          "Failed to download patch file."},
         {[](BatchRun& run) { run.state = ArchiveState::Corrupt; }, ErrorCode::CorruptData, "The patch archive "},
-        {[](BatchRun& run) { RemoveFile(PathJoin(run.work.installationFolder, "game.exe")); }, ErrorCode::DeltaFailed,
-         "Failed to apply delta file "},
+        {[](BatchRun& run) { EXPECT_TRUE(RemoveFile(PathJoin(run.work.installationFolder, "game.exe"))); },
+         ErrorCode::DeltaFailed, "Failed to apply delta file "},
     };
     for (const auto& [cause, code, message] : cases) {  // message: how it starts
         for (const size_t workers : {1, 3}) {
@@ -103,7 +103,9 @@ TEST(Resume, NoActionRunsWithoutItsRecord) {
         int actions = 6;
         run.onReport = [&](const std::string&) {
             if (--actions == 0 && !unwritable) throw std::runtime_error("interrupted");
-            if (actions == 0) MakeDirectories(PathJoin(batch.Root(), "_PPF.xml"));  // no record can be written
+            if (actions == 0) {
+                EXPECT_TRUE(MakeDirectories(PathJoin(batch.Root(), "_PPF.xml")));  // no record can be written
+            }
         };
         EXPECT_ANY_THROW(run.Apply());
         trees[unwritable] = ReadTree(batch.Installation());

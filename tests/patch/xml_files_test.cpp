@@ -136,7 +136,8 @@ TEST(XmlFiles, AreWrittenAsTinyXmlPrintsThem) {
                                "    <RegistryHive>HKEY_USERS</RegistryHive>\n    <RegistryPath></RegistryPath>\n"
                                "</IronvaleWestPatch>\n"));
     // A hive outside the three cannot be written, and nothing is.
-    EXPECT_THROW(PatchInfoFile::Save(folder / "none.xml", {}, {}, {}, {}, RegistryHive::None, ""), Exception);
+    EXPECT_THROW(static_cast<void>(PatchInfoFile::Save(folder / "none.xml", {}, {}, {}, {}, RegistryHive::None, "")),
+                 Exception);
     EXPECT_FALSE(PathExists(folder / "none.xml"));
 }
 

@@ -20,7 +20,7 @@ RegistrySandbox::RegistrySandbox()
 
 RegistrySandbox::~RegistrySandbox() {
     ::unsetenv("IRONVALE_REGISTRY_ROOT");
-    DeleteDirectory(root, true);
+    DiscardDirectory(root);
 }
 
 namespace {
@@ -37,7 +37,7 @@ TEST(RegistryStore, KeysAreFoldersTheirValuesOneEscapedTextFileAndNamesStayInsid
     EXPECT_EQ(registry.GetInstallDir(), "D:\\Spiele\\q");
     EXPECT_EQ(registry.GetLanguage(), "French");
     // A key blocked by a file reads as missing and cannot be created.
-    DeleteDirectory(sandbox.root + "/HKEY_CURRENT_USER/SOFTWARE/Halvard", true);
+    DiscardDirectory(sandbox.root + "/HKEY_CURRENT_USER/SOFTWARE/Halvard");
     WriteTextFile(sandbox.root + "/HKEY_CURRENT_USER/SOFTWARE/Halvard", "not a key");
     EXPECT_EQ(registry.GetLanguage(), "");
     EXPECT_THROW(registry.SetLanguage("English"), Exception);

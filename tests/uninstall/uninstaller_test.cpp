@@ -48,8 +48,8 @@ TEST(Uninstaller, RecordsWhatWasAddedAndNoLaterDescriptionTookAway) {
 
 TEST(Uninstaller, SavesTheRecordThenAContinuedOneRemovesFilesAndDirectoriesDeepestFirst) {
     TempFolder folder;
-    MakeDirectories(folder / "data/x");
-    MakeDirectories(folder / "saves");
+    EXPECT_TRUE(MakeDirectories(folder / "data/x"));
+    EXPECT_TRUE(MakeDirectories(folder / "saves"));
     WriteTextFile(folder / "data/x/a.bin", "a");
     WriteTextFile(folder / "saves/user.sav", "not recorded");
     const std::string recordPath = folder / "Uninstall.xml";
@@ -82,7 +82,7 @@ TEST(Uninstaller, SavesTheRecordThenAContinuedOneRemovesFilesAndDirectoriesDeepe
     EXPECT_EQ(continued.GetRegistryPath(), "S-1\\Software\\Ironvale");
     continued.Remove(folder.Path());
     EXPECT_EQ(ReadTextFile(decoy), "beside the game");
-    RemoveFile(decoy);
+    EXPECT_TRUE(RemoveFile(decoy));
     EXPECT_FALSE(PathExists(folder / "data"));
     EXPECT_FALSE(PathExists(recordPath));
     EXPECT_TRUE(PathExists(folder / "saves/user.sav"));

@@ -36,8 +36,8 @@ void MakeCheckedDelta(const std::string& oldFile, const std::string& newFile, co
     try {
         CheckDelta(oldFile, newFile, deltaFile, scratchFile);
     } catch (const Exception& error) {
-        RemoveFile(scratchFile);
+        DiscardFile(scratchFile);
         throw Exception("Our decoder rejects the delta for " + newFile + ": " + error.message);
     }
-    RemoveFile(scratchFile);
+    DiscardFile(scratchFile);
 }

@@ -33,5 +33,5 @@ void ApplyPatchFolder(const std::string& patchDir, const std::string& installDir
     if (!list.empty()) downloader.Start(list, false);
     stages.Prepare(downloader);
     stages.Apply(nullptr);
-    DeleteDirectory(batch.patchFolder, true);
+    DiscardDirectory(batch.patchFolder);
 }

@@ -63,7 +63,7 @@ public:
         }
         writer->AddStoredMember(name, compressed);
         compressed.Close();
-        RemoveFile(scratchFile);
+        DiscardFile(scratchFile);
         return archiveName;
     }
 
@@ -151,7 +151,7 @@ void BuildInto(const BuildOptions& options, const std::string& folder, const std
             largestDelta = std::max(largestDelta, delta.GetLength());
         }
         description.diffFiles.emplace_back(path, packer.Add(path, deltaFile));
-        RemoveFile(deltaFile);
+        DiscardFile(deltaFile);
         filesSize += static_cast<int64_t>(newTree.files.at(path));
     }
     for (const std::string& path : added) {

@@ -48,4 +48,4 @@ void SignPatchDescription(const std::string& folder, const P256PrivateKey& key);
 
 // Creates path with text, failing if it exists; only the owner may read it
 // where the platform allows. False on any failure.
-bool WritePrivateFile(const std::string& path, const std::string& text);
+[[nodiscard]] bool WritePrivateFile(const std::string& path, const std::string& text);
